@@ -1,0 +1,39 @@
+# What every target of the project is compiled and linked with.
+
+add_library(kiv_compile INTERFACE)
+target_compile_options(kiv_compile INTERFACE
+  -Wall -Wextra -Wpedantic -Wconversion -Wshadow -Werror
+  -fstack-protector-strong
+  "-ffile-prefix-map=${PROJECT_SOURCE_DIR}/=")
+target_link_options(kiv_compile INTERFACE -Wl,-z,relro,-z,now -Wl,-z,noexecstack -Wl,--as-needed)
+
+if(KIV_SANITIZE)
+  target_compile_options(kiv_compile INTERFACE -fsanitize=${KIV_SANITIZE} -fno-omit-frame-pointer -fno-sanitize-recover=all)
+  target_link_options(kiv_compile INTERFACE -fsanitize=${KIV_SANITIZE})
+else()
+  target_link_options(kiv_compile INTERFACE -Wl,--no-undefined)
+  # _FORTIFY_SOURCE needs an optimising build, and sanitizers watch the same calls better.
+  target_compile_options(kiv_compile INTERFACE $<$<NOT:$<CONFIG:Debug>>:-U_FORTIFY_SOURCE$<SEMICOLON>-D_FORTIFY_SOURCE=2>)
+endif()
+
+# Shared libraries hide every symbol that is not exported by name.
+function(kiv_shared_library target)
+  add_library(${target} SHARED ${ARGN})
+  target_link_libraries(${target} PRIVATE kiv_compile)
+  set_target_properties(${target} PROPERTIES
+    CXX_VISIBILITY_PRESET hidden
+    VISIBILITY_INLINES_HIDDEN ON
+    VERSION ${PROJECT_VERSION}
+    SOVERSION ${PROJECT_VERSION_MAJOR}
+    INSTALL_RPATH "$ORIGIN")
+  install(TARGETS ${target} LIBRARY DESTINATION ${CMAKE_INSTALL_LIBDIR})
+endfunction()
+
+# Programs find the libraries beside them, in any prefix.
+function(kiv_program target)
+  add_executable(${target} ${ARGN})
+  target_link_libraries(${target} PRIVATE kiv_compile)
+  file(RELATIVE_PATH to_libraries /prefix/${CMAKE_INSTALL_BINDIR} /prefix/${CMAKE_INSTALL_LIBDIR})
+  set_target_properties(${target} PROPERTIES INSTALL_RPATH "$ORIGIN/${to_libraries}")
+  install(TARGETS ${target} RUNTIME DESTINATION ${CMAKE_INSTALL_BINDIR})
+endfunction()

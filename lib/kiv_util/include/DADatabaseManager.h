@@ -1,0 +1,23 @@
+#ifndef DADATABASEMANAGER_H
+#define DADATABASEMANAGER_H
+
+#include "DASubscriberInfo.h"
+
+#include <list>
+
+/// Who takes push messages of a service.
+class __attribute__((visibility("default"))) DADatabaseManager
+{
+public:
+    DADatabaseManager();
+    ~DADatabaseManager();
+
+    /// Appends the subscribers of one service's pushes in the order in which they subscribed.
+    /// @param kind  "push"
+    /// @param key   service id
+    /// @return whether the store could be asked; one error line in the platform log when not, and nothing is appended
+    /// Any thread; blocks on the store's file.
+    bool GetSubscriber(const char* kind, const char* key, std::list<_SubscriberInfo>& subscribers);
+};
+
+#endif

@@ -1,0 +1,23 @@
+#ifndef DASUBSCRIBEDATAMANAGER_H
+#define DASUBSCRIBEDATAMANAGER_H
+
+#include "DASubscriberInfo.h"
+
+#include <list>
+
+/// Who subscribed to the agent's own events: policy, status, authentication, activation, number changes.
+class __attribute__((visibility("default"))) DASubscribeDataManager
+{
+public:
+    DASubscribeDataManager();
+    ~DASubscribeDataManager();
+
+    /// Appends the subscribers of one event in the order in which they subscribed.
+    /// @param kind  "policy", "status", "auth", "activated" or "number_changed"
+    /// @param key   decimal service id, or "all"; what was recorded under "all" is found by "all" alone
+    /// @return whether the store could be asked; one error line in the platform log when not, and nothing is appended
+    /// Any thread; blocks on the store's file.
+    bool GetSubscriber(const char* kind, const char* key, std::list<_SubscriberInfo>& subscribers);
+};
+
+#endif

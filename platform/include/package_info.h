@@ -1,0 +1,24 @@
+/// @file
+/// What is known of one package. Every function gives 0, else an error code and an untouched out-parameter. Any thread.
+#ifndef KIV_PLATFORM_PACKAGE_INFO_H
+#define KIV_PLATFORM_PACKAGE_INFO_H
+
+#include "platform_decls.h"
+
+PLATFORM_BEGIN_DECLS
+
+typedef struct package_info* package_info_h;
+
+/// Opens what is known of a package; PACKAGE_MANAGER_ERROR_NO_SUCH_PACKAGE when nothing is.
+/// @param package_id    borrowed
+/// @param package_info  receives a handle that is released with package_info_destroy()
+int package_info_create(const char* package_id, package_info_h* package_info);
+
+int package_info_destroy(package_info_h package_info);
+
+/// @param version  receives the version text; free() it
+int package_info_get_version(package_info_h package_info, char** version);
+
+PLATFORM_END_DECLS
+
+#endif

@@ -1,0 +1,43 @@
+/// @file
+/// What the device is doing now, and being told when that changes. Every function gives 0, else an error code and an untouched
+/// out-parameter; a key that is not of the asked type is an error. Any thread.
+#ifndef KIV_PLATFORM_RUNTIME_INFO_H
+#define KIV_PLATFORM_RUNTIME_INFO_H
+
+#include "platform_decls.h"
+
+PLATFORM_BEGIN_DECLS
+
+typedef enum PLATFORM_OPEN_ENUM
+{
+    RUNTIME_INFO_KEY_FLIGHT_MODE_ENABLED = 0,  ///< bool
+    RUNTIME_INFO_KEY_WIFI_STATUS = 1,          ///< int: a runtime_info_wifi_status_e
+    RUNTIME_INFO_KEY_PACKET_DATA_ENABLED = 9,  ///< bool
+    RUNTIME_INFO_KEY_DATA_ROAMING_ENABLED = 10 ///< bool
+} runtime_info_key_e;
+
+typedef enum PLATFORM_OPEN_ENUM
+{
+    RUNTIME_INFO_WIFI_STATUS_DISABLED = 0,
+    RUNTIME_INFO_WIFI_STATUS_UNCONNECTED = 1,
+    RUNTIME_INFO_WIFI_STATUS_CONNECTED = 2
+} runtime_info_wifi_status_e;
+
+/// @param user_data  that of the registration
+typedef void (*runtime_info_changed_cb)(runtime_info_key_e key, void* user_data);
+
+int runtime_info_get_value_int(runtime_info_key_e key, int* value);
+
+int runtime_info_get_value_bool(runtime_info_key_e key, bool* value);
+
+/// Asks to be told of each change of one value, on a thread of the platform's; a second registration for the key replaces the
+/// first. The new value is there to be read when the callback runs.
+int runtime_info_set_changed_cb(runtime_info_key_e key, runtime_info_changed_cb callback, void* user_data);
+
+/// Ends a registration; without one it is an error. When it returns, the callback is not running and will not run any more;
+/// called from within a callback it does not wait for callbacks that run on other threads.
+int runtime_info_unset_changed_cb(runtime_info_key_e key);
+
+PLATFORM_END_DECLS
+
+#endif

@@ -1,0 +1,70 @@
+/// @file
+/// Telephony, one handle per SIM slot.
+/// Every function gives 0 on success, else an error code and, unless it says otherwise, untouched out-parameters. All block on
+/// the modem; any thread.
+#ifndef KIV_PLATFORM_TELEPHONY_H
+#define KIV_PLATFORM_TELEPHONY_H
+
+#include "platform_decls.h"
+
+PLATFORM_BEGIN_DECLS
+
+typedef struct telephony_data telephony_data;
+
+/// The telephony of one SIM slot.
+typedef telephony_data* telephony_h;
+
+/// The handles of all slots: handle[i] is that of slot i.
+typedef struct
+{
+    unsigned int count;  ///< number of SIM slots
+    telephony_h* handle; ///< count handles
+} telephony_handle_list_s;
+
+typedef enum PLATFORM_OPEN_ENUM
+{
+    TELEPHONY_ERROR_NONE = 0,
+    TELEPHONY_ERROR_SIM_NOT_AVAILABLE = -39841791 ///< 0xFDA01001
+} telephony_error_e;
+
+typedef enum PLATFORM_OPEN_ENUM
+{
+    TELEPHONY_SIM_STATE_UNAVAILABLE = 0, ///< no card, or none that works
+    TELEPHONY_SIM_STATE_LOCKED = 1,      ///< the card waits for a code
+    TELEPHONY_SIM_STATE_AVAILABLE = 2,
+    TELEPHONY_SIM_STATE_UNKNOWN = 3 ///< not settled yet
+} telephony_sim_state_e;
+
+typedef enum PLATFORM_OPEN_ENUM
+{
+    TELEPHONY_NETWORK_SERVICE_STATE_IN_SERVICE = 0,
+    TELEPHONY_NETWORK_SERVICE_STATE_OUT_OF_SERVICE = 1,
+    TELEPHONY_NETWORK_SERVICE_STATE_EMERGENCY_ONLY = 2
+} telephony_network_service_state_e;
+
+/// Opens one handle per slot.
+/// @param list  receives the handles, to be released with telephony_deinit(); a device without slots gives a count of 0
+int telephony_init(telephony_handle_list_s* list);
+
+/// Closes every handle of a list; the handles of all copies of the list are closed with it.
+/// @param list  as telephony_init() filled it, or a copy; emptied
+int telephony_deinit(telephony_handle_list_s* list);
+
+/// @param imei  receives the number of the slot's modem; free() it
+int telephony_modem_get_imei(telephony_h handle, char** imei);
+
+/// @param state  receives a telephony_sim_state_e, possibly one that is not named
+int telephony_sim_get_state(telephony_h handle, telephony_sim_state_e* state);
+
+/// @param number  receives the subscriber number, which may be empty or null; free() it
+int telephony_sim_get_subscriber_number(telephony_h handle, char** number);
+
+/// @param state  receives a telephony_network_service_state_e, possibly one that is not named
+int telephony_network_get_service_state(telephony_h handle, telephony_network_service_state_e* state);
+
+/// @param roaming  receives whether the slot is registered with a foreign network; of meaning while in service
+int telephony_network_get_roaming_status(telephony_h handle, bool* roaming);
+
+PLATFORM_END_DECLS
+
+#endif
