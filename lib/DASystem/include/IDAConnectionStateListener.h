@@ -1,0 +1,37 @@
+#ifndef IDACONNECTIONSTATELISTENER_H
+#define IDACONNECTIONSTATELISTENER_H
+
+#include "DATypes.h"
+
+#include <wifi.h>
+
+/// Hears of changes of the connection situation; implemented by the agent, registered with
+/// DASystem::SetConnectionEventListener().
+///
+/// Every operation runs in the thread in which the platform delivers the change, and gets the context pointer of the
+/// registration. None may let an exception out: the platform's C code stands above it. What the library calls are the first
+/// five virtual operations, in this order.
+class KIV_SYSTEM_API IDAConnectionStateListener
+{
+public:
+    /// The Wi-Fi device was switched on or off.
+    virtual void OnWifiDeviceStateChanged(wifi_device_state_e state, void* userData) = 0;
+
+    /// The Wi-Fi connection state changed.
+    /// @param ap  the platform's access point handle; borrowed for the call
+    virtual void OnWifiConnectionStateChanged(wifi_connection_state_e state, void* ap, void* userData) = 0;
+
+    /// Flight mode was switched.
+    virtual void OnFlightModeChanged(bool enabled, void* userData) = 0;
+
+    /// Packet data was switched.
+    virtual void OnPacketDataChanged(bool enabled, void* userData) = 0;
+
+    /// The device joined or left a Wi-Fi network.
+    virtual void OnWifiConnectedChanged(bool connected, void* userData) = 0;
+
+    /// The library never deletes a listener.
+    virtual ~IDAConnectionStateListener() = default;
+};
+
+#endif

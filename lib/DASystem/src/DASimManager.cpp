@@ -1,0 +1,676 @@
+#include "DASimManager.h"
+
+#include "Country.h"
+#include "Handles.h"
+#include "Lookup.h"
+#include "Singleton.h"
+
+#include <DAMutex.h>
+
+#include <cerrno>
+#include <cstdio>
+#include <cstring>
+#include <glib.h>
+#include <optional>
+#include <unistd.h>
+#include <utility>
+
+using kiv::CountryInfo;
+using kiv::CString;
+using kiv::Place;
+
+DASimManager* DASimManager::__pInstance = nullptr;
+
+// Country tables ---------------------------------------------------------------------------------------------------------------
+
+namespace
+{
+
+struct ServiceCountryCode
+{
+    const char* mcc;
+    const char* serviceCountryCode; ///< as "en_GB"
+};
+
+struct CountryCallingCode
+{
+    const char* mcc;
+    const char* countryCallingCode; ///< digits, ITU-T E.164
+};
+
+struct Alpha3CountryCode
+{
+    const char* mcc;
+    const char* alpha3CountryCode; ///< ISO 3166-1 alpha-3, upper case
+};
+
+#define KIV_COUNTRY(mcc, countryCode, countryName) {mcc, countryCode, countryName},
+#define KIV_COUNTRY_MO KIV_COUNTRY
+constexpr CountryInfo CountryInfoTable[] = {
+#include "tables/CountryInfo.inc"
+};
+static_assert(std::size(CountryInfoTable) == 236);
+#undef KIV_COUNTRY_MO
+#undef KIV_COUNTRY
+
+#define KIV_COUNTRY(mcc, countryCode, countryName)
+#define KIV_COUNTRY_MO(mcc, countryCode, countryName) {mcc, countryCode, countryName},
+constexpr CountryInfo MoSupportMccTable[] = {
+#include "tables/CountryInfo.inc"
+};
+static_assert(std::size(MoSupportMccTable) == 48);
+#undef KIV_COUNTRY_MO
+#undef KIV_COUNTRY
+
+constexpr ServiceCountryCode ServiceCountryCodeTable[] = {
+#include "tables/ServiceCountryCode.inc"
+};
+static_assert(std::size(ServiceCountryCodeTable) == 134);
+
+#define KIV_COUNTRY_CODE(mcc, alpha3CountryCode, countryCallingCode) {mcc, countryCallingCode},
+#define KIV_ALPHA3_ONLY(mcc, alpha3CountryCode)
+constexpr CountryCallingCode CountryCallingCodeTable[] = {
+#include "tables/CountryCodes.inc"
+};
+static_assert(std::size(CountryCallingCodeTable) == 236);
+#undef KIV_ALPHA3_ONLY
+#undef KIV_COUNTRY_CODE
+
+#define KIV_COUNTRY_CODE(mcc, alpha3CountryCode, countryCallingCode) {mcc, alpha3CountryCode},
+#define KIV_ALPHA3_ONLY(mcc, alpha3CountryCode) {mcc, alpha3CountryCode},
+constexpr Alpha3CountryCode Alpha3CountryCodeTable[] = {
+#include "tables/CountryCodes.inc"
+};
+static_assert(std::size(Alpha3CountryCodeTable) == 237);
+#undef KIV_ALPHA3_ONLY
+#undef KIV_COUNTRY_CODE
+
+/// A copy of one cell of the first row with this key; null, and the error line, when there is no such row.
+template <const auto& Table, auto Key, class Cell>
+char* Lookup(const char* key, Cell cell, const Place& here, const char* failure)
+{
+    const auto* const row = kiv::FirstRow<Table, Key>(key);
+    if (row != nullptr)
+        return strdup(row->*cell);
+    KIV_ERROR_AT(here, "%s", failure);
+    return nullptr;
+}
+
+} // namespace
+
+DASimManager* DASimManager::GetInstance()
+{
+    return kiv::Singleton(__pInstance, KIV_HERE, "SimManager() failed.");
+}
+
+DASimManager::DASimManager() = default;
+DASimManager::~DASimManager() = default;
+
+bool DASimManager::IsValidMcc(char* mcc)
+{
+    if (kiv::FirstRow<CountryInfoTable, &CountryInfo::mcc>(mcc) != nullptr)
+        return true;
+    KIV_ERROR("mcc is invalid");
+    return false;
+}
+
+bool DASimManager::IsMoSupportMcc(const char* mcc)
+{
+    return kiv::FirstRow<MoSupportMccTable, &CountryInfo::mcc>(mcc) != nullptr;
+}
+
+void DASimManager::GetCountryCodeFromMcc(const char* mcc, char** countryCode)
+{
+    *countryCode = Lookup<CountryInfoTable, &CountryInfo::mcc>(mcc, &CountryInfo::countryCode, KIV_HERE, "fail to get countrycode");
+}
+
+void DASimManager::GetCountryNameFromMcc(const char* mcc, char** countryName)
+{
+    *countryName = Lookup<CountryInfoTable, &CountryInfo::mcc>(mcc, &CountryInfo::countryName, KIV_HERE, "fail to get countryName");
+}
+
+void DASimManager::GetMccFromCountryCode(const char* countryCode, char** mcc)
+{
+    *mcc = Lookup<CountryInfoTable, &CountryInfo::countryCode>(countryCode, &CountryInfo::mcc, KIV_HERE, "fail to get mcc");
+}
+
+void DASimManager::GetMccFromServiceCountryCode(const char* serviceCountryCode, char** mcc)
+{
+    *mcc = Lookup<ServiceCountryCodeTable, &ServiceCountryCode::serviceCountryCode>(
+        serviceCountryCode, &ServiceCountryCode::mcc, KIV_HERE, "fail to get mcc");
+}
+
+void DASimManager::GetMccFromCountryCallingCode(const char* countryCallingCode, char** mcc)
+{
+    *mcc = Lookup<CountryCallingCodeTable, &CountryCallingCode::countryCallingCode>(
+        countryCallingCode, &CountryCallingCode::mcc, KIV_HERE, "fail to get mcc");
+}
+
+void DASimManager::GetServiceCountryCodeFromMcc(const char* mcc, char** serviceCountryCode)
+{
+    *serviceCountryCode = Lookup<ServiceCountryCodeTable, &ServiceCountryCode::mcc>(
+        mcc, &ServiceCountryCode::serviceCountryCode, KIV_HERE, "fail to get serviceCountryCode");
+}
+
+void DASimManager::GetCountryCallingCodeFromMcc(const char* mcc, char** countryCallingCode)
+{
+    *countryCallingCode = Lookup<CountryCallingCodeTable, &CountryCallingCode::mcc>(
+        mcc, &CountryCallingCode::countryCallingCode, KIV_HERE, "fail to get countryCallingCode");
+}
+
+void DASimManager::GetAlpha3CountryCodeFromMcc(const char* mcc, char** alpha3CountryCode)
+{
+    *alpha3CountryCode = Lookup<Alpha3CountryCodeTable, &Alpha3CountryCode::mcc>(
+        mcc, &Alpha3CountryCode::alpha3CountryCode, KIV_HERE, "fail to get alpha3CountryCode");
+}
+
+// Locks and handles ------------------------------------------------------------------------------------------------------------
+
+namespace
+{
+
+constexpr char kSimAccess[] = "CORE_MUTEX_NAME_SIM_ACCESS";
+
+/// Holds the SIM-access lock for the rest of an operation; false when the lock can not be had for want of memory.
+class SimAccess
+{
+public:
+    SimAccess()
+    {
+        kiv::NoThrow(0,
+            [this]
+            {
+                lock_.emplace(kSimAccess);
+                return 0;
+            });
+    }
+
+    explicit operator bool() const { return lock_.has_value(); }
+
+private:
+    std::optional<DAMutexLock> lock_;
+};
+
+/// One platform call under the SIM-access lock.
+/// @return the call's code; an error too when the lock can not be had
+template <class Call>
+int UnderSimAccess(Call&& call)
+{
+    struct Bracket
+    {
+        Bracket() { access.Lock(); }
+        ~Bracket() { access.Unlock(); }
+        DAMutex access{kSimAccess};
+    };
+    return kiv::NoThrow(-ENOMEM,
+        [&]
+        {
+            const Bracket bracket;
+            return call();
+        });
+}
+
+using Tapi = kiv::Owned<TapiHandle, tel_deinit>;
+
+/// The names of the modems.
+class CpNames
+{
+public:
+    CpNames() : names_(tel_get_cp_name_list()) {}
+
+    /// The name of a slot's modem; null when there is none.
+    const char* Of(int slot) const
+    {
+        const guint count = names_ == nullptr ? 0 : g_strv_length(names_.get());
+        return slot >= 0 && static_cast<guint>(slot) < count ? names_.get()[slot] : nullptr;
+    }
+
+    /// Opens a slot's modem; null when there is none or it does not open.
+    Tapi Open(int slot) const
+    {
+        const char* const name = Of(slot);
+        return Tapi(name == nullptr ? nullptr : tel_init(name));
+    }
+
+private:
+    kiv::Owned<char*, g_strfreev> names_;
+};
+
+/// The telephony handles of all slots, for one operation.
+class HandleList
+{
+public:
+    HandleList() : isOpen_(telephony_init(&list_) == 0) {}
+    HandleList(const HandleList&) = delete;
+    HandleList& operator=(const HandleList&) = delete;
+    ~HandleList()
+    {
+        if (isOpen_)
+            telephony_deinit(&list_);
+    }
+
+    /// None when it could not be opened.
+    int Count() const { return isOpen_ ? static_cast<int>(list_.count) : 0; }
+
+    bool Has(int slot) const { return slot >= 0 && slot < Count(); }
+
+    telephony_h operator[](int slot) const { return list_.handle[slot]; }
+
+private:
+    telephony_handle_list_s list_ = {};
+    bool isOpen_;
+};
+
+bool HasSlot(const telephony_handle_list_s& list, int slot)
+{
+    return slot >= 0 && static_cast<unsigned>(slot) < list.count;
+}
+
+/// Reads a card status; the flag that it changed is of no use here.
+int ReadCardStatus(const Tapi& modem, TelSimCardStatus_t* status)
+{
+    int cardChanged = 0;
+    return tel_get_sim_init_info(modem.get(), status, &cardChanged);
+}
+
+} // namespace
+
+bool DASimManager::SuccessToInitTelephonyHandle(telephony_handle_list_s* list)
+{
+    telephony_handle_list_s opened = {};
+    if (telephony_init(&opened) == 0 && opened.count != 0)
+    {
+        *list = opened;
+        return true;
+    }
+    KIV_ERROR("telephony_init Failed.");
+    return false;
+}
+
+void DASimManager::DeleteTelephonyHandle(telephony_handle_list_s list)
+{
+    telephony_deinit(&list);
+}
+
+bool DASimManager::InitHandleList(telephony_handle_list_s* list)
+{
+    const SimAccess access;
+    return access && telephony_init(list) == 0;
+}
+
+bool DASimManager::DeinitHandleList(telephony_handle_list_s* list)
+{
+    const SimAccess access;
+    return access && telephony_deinit(list) == 0;
+}
+
+char** DASimManager::GetCpNameList()
+{
+    const SimAccess access;
+    return access ? tel_get_cp_name_list() : nullptr;
+}
+
+// SIM state --------------------------------------------------------------------------------------------------------------------
+
+namespace
+{
+
+enum class OnPolling
+{
+    Stop,
+    Wait,
+    Usable
+};
+
+/// How a card status is judged.
+struct CardStatus
+{
+    int status;
+    bool isUsable; ///< now
+    OnPolling onPolling;
+    bool isWaiting; ///< may become usable
+};
+
+// clang-format off
+constexpr CardStatus CardStatusTable[] = {
+    // status                           now    on polling         waiting
+    {TAPI_SIM_STATUS_CARD_ERROR,        false, OnPolling::Stop,   false},
+    {TAPI_SIM_STATUS_CARD_NOT_PRESENT,  false, OnPolling::Stop,   false},
+    {TAPI_SIM_STATUS_SIM_INITIALIZING,  false, OnPolling::Wait,   true},
+    {TAPI_SIM_STATUS_SIM_INIT_COMPLETED, true, OnPolling::Usable, false},
+    {TAPI_SIM_STATUS_SIM_PIN_REQUIRED,  false, OnPolling::Wait,   true},
+    {TAPI_SIM_STATUS_SIM_PUK_REQUIRED,  false, OnPolling::Wait,   true},
+    {TAPI_SIM_STATUS_CARD_BLOCKED,      false, OnPolling::Stop,   false},
+    {TAPI_SIM_STATUS_SIM_NCK_REQUIRED,  false, OnPolling::Wait,   true},
+    {TAPI_SIM_STATUS_SIM_NSCK_REQUIRED, false, OnPolling::Wait,   true},
+    {TAPI_SIM_STATUS_SIM_SPCK_REQUIRED, false, OnPolling::Wait,   true},
+    {TAPI_SIM_STATUS_SIM_CCK_REQUIRED,  false, OnPolling::Wait,   true},
+    {TAPI_SIM_STATUS_CARD_REMOVED,      false, OnPolling::Stop,   false},
+    {TAPI_SIM_STATUS_SIM_LOCK_REQUIRED, false, OnPolling::Wait,   true},
+    {TAPI_SIM_STATUS_CARD_CRASHED,      false, OnPolling::Stop,   false},
+    {TAPI_SIM_STATUS_CARD_POWEROFF,     false, OnPolling::Wait,   false},
+    {TAPI_SIM_STATUS_UNKNOWN,           false, OnPolling::Wait,   true},
+};
+// clang-format on
+
+/// The row of a status; one that the platform does not name is a definite failure.
+CardStatus Judge(TelSimCardStatus_t status)
+{
+    for (const CardStatus& row : CardStatusTable)
+    {
+        if (row.status == status)
+            return row;
+    }
+    return {status, false, OnPolling::Stop, false};
+}
+
+/// A SIM state that is not a usable one, as the log tells it.
+const char* NameOf(telephony_sim_state_e state)
+{
+    switch (state)
+    {
+    case TELEPHONY_SIM_STATE_UNAVAILABLE:
+        return "TELEPHONY_SIM_STATE_UNAVAILABLE";
+    case TELEPHONY_SIM_STATE_LOCKED:
+        return "TELEPHONY_SIM_STATE_LOCKED";
+    case TELEPHONY_SIM_STATE_UNKNOWN:
+        return "TELEPHONY_SIM_STATE_UNKNOWN";
+    default:
+        return "-";
+    }
+}
+
+/// Opens a modem that may still be starting; null after 100 attempts a second apart.
+Tapi WaitForModem(const Place& here, int slot)
+{
+    constexpr int kAttempts = 100;
+    const CpNames names;
+    for (int attempt = 1; attempt <= kAttempts; ++attempt)
+    {
+        if (Tapi modem = names.Open(slot))
+            return modem;
+        KIV_ERROR_AT(here, "wait tel_init[%d]", attempt);
+        sleep(1);
+    }
+    KIV_ERROR_AT(here, "TapiHandle is null. fail.");
+    return nullptr;
+}
+
+} // namespace
+
+bool DASimManager::GetSimState(telephony_data** handle, telephony_sim_state_e* state)
+{
+    const SimAccess access;
+    return access && telephony_sim_get_state(*handle, state) == 0;
+}
+
+bool DASimManager::IsSimExist()
+{
+    const SimAccess access;
+    if (!access)
+        return false;
+
+    bool exists = false;
+    const HandleList list;
+    for (int slot = 0; slot < list.Count(); ++slot)
+    {
+        telephony_sim_state_e state = TELEPHONY_SIM_STATE_UNKNOWN;
+        if (telephony_sim_get_state(list[slot], &state) != 0)
+            continue;
+        if (state == TELEPHONY_SIM_STATE_AVAILABLE)
+            exists = true;
+        else
+            KIV_ERROR("SIM STATE[%d] : %s", slot, NameOf(state));
+    }
+    return exists;
+}
+
+bool DASimManager::IsSimAvailable(telephony_handle_list_s list, int slot)
+{
+    telephony_sim_state_e state = TELEPHONY_SIM_STATE_UNKNOWN;
+    const bool isRead =
+        HasSlot(list, slot) && UnderSimAccess([&] { return telephony_sim_get_state(list.handle[slot], &state); }) == 0;
+    if (isRead && state == TELEPHONY_SIM_STATE_AVAILABLE)
+        return true;
+    KIV_ERROR("Sim is not available");
+    return false;
+}
+
+bool DASimManager::IsAvaliableState(int slot, TelSimCardStatus_t* status)
+{
+    const SimAccess access;
+    if (!access)
+        return false;
+    const Tapi modem = CpNames().Open(slot);
+    return modem && ReadCardStatus(modem, status) == 0 && Judge(*status).isUsable;
+}
+
+bool DASimManager::IsAvaliableSimStateOnPolling(int slot, int, TelSimCardStatus_t* status)
+{
+    const Tapi modem = WaitForModem(KIV_HERE, slot);
+    if (!modem)
+        return false;
+
+    int pauses = 0;
+    OnPolling verdict = OnPolling::Wait;
+    for (;;)
+    {
+        if (ReadCardStatus(modem, status) == 0)
+        {
+            KIV_INFO("current SIM Status[%d]", *status);
+            verdict = Judge(*status).onPolling;
+            if (verdict != OnPolling::Wait)
+                break;
+        }
+        ++pauses;
+        sleep(1);
+    }
+    const bool isUsable = verdict == OnPolling::Usable;
+    KIV_INFO("slotNum[%d], result[%d], status[%d], time[%d]", slot, static_cast<int>(isUsable), *status, pauses);
+    return isUsable;
+}
+
+bool DASimManager::IsWaittingSimCheck(TelSimCardStatus_t status)
+{
+    return Judge(status).isWaiting;
+}
+
+// SIM identity -----------------------------------------------------------------------------------------------------------------
+
+namespace
+{
+
+/// Reads the IMSI record of a slot's modem.
+bool ReadImsiRecord(int slot, TelSimImsiInfo_t& record)
+{
+    const Tapi modem = CpNames().Open(slot);
+    return modem && UnderSimAccess([&] { return tel_get_sim_imsi(modem.get(), &record); }) == 0;
+}
+
+/// Reads a text made of the IMSI record of a slot.
+/// @param text  makes the text of a record, with strdup()
+template <class Char, class Text>
+int ReadImsiText(DASimManager& manager, const telephony_handle_list_s& list, int slot, Char** out, Text text, const Place& here,
+    const char* failure)
+{
+    *out = kiv::NoThrow<char*>(nullptr,
+        [&]() -> char*
+        {
+            TelSimImsiInfo_t record = {};
+            return manager.IsSimAvailable(list, slot) && ReadImsiRecord(slot, record) ? text(record) : nullptr;
+        });
+    if (*out != nullptr)
+        return 0;
+    KIV_ERROR_AT(here, "%s", failure);
+    return kiv::kFailure;
+}
+
+} // namespace
+
+int DASimManager::GetMCCFromSim(telephony_handle_list_s list, int slot, const char** mcc)
+{
+    const auto text = [](const TelSimImsiInfo_t& record) { return strdup(record.szMcc); };
+    return ReadImsiText(*this, list, slot, mcc, text, KIV_HERE, "fail to get MCC");
+}
+
+int DASimManager::GetMNCFromSim(telephony_handle_list_s list, int slot, char** mnc)
+{
+    const auto text = [](const TelSimImsiInfo_t& record) { return strdup(record.szMnc); };
+    return ReadImsiText(*this, list, slot, mnc, text, KIV_HERE, "fail to get MNC");
+}
+
+int DASimManager::GetIMSIFromSim(telephony_handle_list_s list, int slot, char** imsi)
+{
+    const auto text = [](const TelSimImsiInfo_t& record)
+    {
+        char joined[sizeof record];
+        std::snprintf(joined, sizeof joined, "%s%s%s", record.szMcc, record.szMnc, record.szMsin);
+        return strdup(joined);
+    };
+    return ReadImsiText(*this, list, slot, imsi, text, KIV_HERE, "fail to get imsi");
+}
+
+int DASimManager::GetPhoneNumberFromSim(telephony_handle_list_s list, int slot, char** number)
+{
+    *number = nullptr;
+    if (IsSimAvailable(list, slot))
+    {
+        char* text = nullptr;
+        const int code = UnderSimAccess([&] { return telephony_sim_get_subscriber_number(list.handle[slot], &text); });
+        const CString owner(text);
+        if (code == 0 && text != nullptr)
+            *number = strdup(text);
+    }
+    if (*number != nullptr)
+        return 0;
+    KIV_ERROR("fail to get phoneNumber");
+    return TELEPHONY_ERROR_SIM_NOT_AVAILABLE;
+}
+
+bool DASimManager::GetPhoneNumber(telephony_data** handle, char** number)
+{
+    KIV_INFO("Enter");
+    const SimAccess access;
+    if (!access)
+        return false;
+
+    KIV_INFO("Before telephony_sim_get_subscriber_number");
+    const int code = telephony_sim_get_subscriber_number(*handle, number);
+    if (code != 0)
+    {
+        KIV_ERROR("telephony_sim_get_subscriber_number errno [%d]", code);
+        return false;
+    }
+    KIV_INFO("After telephony_sim_get_subscriber_number");
+    return true;
+}
+
+bool DASimManager::GetSimInfo(const char* cpName, std::string* mcc, std::string* mnc, std::string* msin)
+{
+    const SimAccess access;
+    if (!access)
+        return false;
+
+    const Tapi modem(tel_init(cpName));
+    if (!modem)
+    {
+        KIV_ERROR("tel_init error");
+        return false;
+    }
+    TelSimImsiInfo_t record = {};
+    const int code = tel_get_sim_imsi(modem.get(), &record);
+    if (code != 0)
+    {
+        KIV_ERROR("tel_get_sim_imsi errno [%d]", code);
+        return false;
+    }
+    // Made first, then moved in: a text that finds no memory leaves all three of the caller's as they were.
+    return kiv::NoThrow(false,
+        [&]
+        {
+            std::string parts[] = {record.szMcc, record.szMnc, record.szMsin};
+            *mcc = std::move(parts[0]);
+            *mnc = std::move(parts[1]);
+            *msin = std::move(parts[2]);
+            return true;
+        });
+}
+
+bool DASimManager::GetRoamingStatus(int slot, bool* roaming)
+{
+    const SimAccess access;
+    if (!access)
+        return false;
+
+    const HandleList list;
+    telephony_network_service_state_e state = TELEPHONY_NETWORK_SERVICE_STATE_OUT_OF_SERVICE;
+    if (!list.Has(slot) || telephony_network_get_service_state(list[slot], &state) != 0 ||
+        state != TELEPHONY_NETWORK_SERVICE_STATE_IN_SERVICE)
+        return false;
+
+    bool isRoaming = false;
+    if (telephony_network_get_roaming_status(list[slot], &isRoaming) != 0)
+        return false;
+    *roaming = isRoaming;
+    return true;
+}
+
+// Subscriptions and SMS readiness ----------------------------------------------------------------------------------------------
+
+namespace
+{
+
+/// Reads one value of a modem, by the modem's name.
+template <class Value>
+bool ReadFromModem(const char* cpName, int (*read)(TapiHandle*, Value*), Value* value)
+{
+    const SimAccess access;
+    if (!access)
+        return false;
+    const Tapi modem(tel_init(cpName));
+    return modem && read(modem.get(), value) == 0;
+}
+
+} // namespace
+
+bool DASimManager::GetMainSimSubscription(char* cpName, TelNetworkDefaultSubs_t* subs)
+{
+    return ReadFromModem(cpName, tel_get_network_default_subscription, subs);
+}
+
+bool DASimManager::GetCallPreferredSubscription(char* cpName, TelCallPreferredVoiceSubs_t* subs)
+{
+    return ReadFromModem(cpName, tel_get_call_preferred_voice_subscription, subs);
+}
+
+bool DASimManager::GetDefaultDataSubscription(char* cpName, TelNetworkDefaultDataSubs_t* subs)
+{
+    return ReadFromModem(cpName, tel_get_network_default_data_subscription, subs);
+}
+
+bool DASimManager::CheckSmsEnabled(char* cpName, int* status)
+{
+    return ReadFromModem(cpName, tel_check_sms_device_status, status);
+}
+
+bool DASimManager::IsAvaliableSendSMS(int slot, TelSimCardStatus_t* status, int* serviceType)
+{
+    constexpr int kSearching = 3; // the service types above it are real service
+    const SimAccess access;
+    if (!access)
+        return false;
+
+    const Tapi modem = CpNames().Open(slot);
+    if (!modem)
+        return false;
+    const int code = ReadCardStatus(modem, status);
+    if (code != 0)
+    {
+        KIV_ERROR("Not available. ret[%d]", code);
+        return false;
+    }
+    if (tel_get_property_int(modem.get(), TAPI_PROP_NETWORK_SERVICE_TYPE, serviceType) != 0)
+        return false;
+    KIV_ERROR("NetworkSvc[%d]", *serviceType);
+    return *serviceType > kSearching;
+}

@@ -1,0 +1,92 @@
+/// @file
+/// One linear pass over a constant table.
+#ifndef KIV_LOOKUP_H
+#define KIV_LOOKUP_H
+
+#include <array>
+#include <cstddef>
+#include <cstdint>
+#include <iterator>
+#include <type_traits>
+
+namespace kiv
+{
+
+/// A text packed into an integer, first byte lowest: equal integers mean equal texts. 0 for a text that is null, empty or longer
+/// than the integer.
+template <class Word>
+constexpr Word Pack(const char* text)
+{
+    Word packed = 0;
+    for (std::size_t i = 0; text != nullptr && i <= sizeof(Word); ++i)
+    {
+        if (text[i] == '\0')
+            return packed;
+        if (i < sizeof(Word))
+            packed |= static_cast<Word>(static_cast<Word>(static_cast<unsigned char>(text[i])) << (8 * i));
+    }
+    return 0;
+}
+
+/// A key column of a table, packed when it is compiled, in row order: what a pass over the table reads.
+template <const auto& Table, auto Key>
+struct KeyColumn
+{
+    static constexpr std::size_t kRows = std::size(Table);
+
+    /// Whether every key of the column can be told in such an integer.
+    template <class Word>
+    static constexpr bool Fits()
+    {
+        for (const auto& row : Table)
+        {
+            if (Pack<Word>(row.*Key) == 0)
+                return false;
+        }
+        return true;
+    }
+
+    using Word = std::conditional_t<Fits<std::uint32_t>(), std::uint32_t, std::uint64_t>;
+    static_assert(Fits<Word>(), "a key is empty, or longer than the widest integer");
+
+    static constexpr std::array<Word, kRows> Packed()
+    {
+        std::array<Word, kRows> column{};
+        for (std::size_t i = 0; i < kRows; ++i)
+            column[i] = Pack<Word>(Table[i].*Key);
+        return column;
+    }
+
+    static constexpr std::array<Word, kRows> kKeys = Packed();
+};
+
+/// The first row whose key equals this one to the letter; null when there is none, as for a null key.
+template <const auto& Table, auto Key>
+auto FirstRow(const char* key) -> decltype(&Table[0])
+{
+    using Column = KeyColumn<Table, Key>;
+    constexpr auto& keys = Column::kKeys;
+    const auto wanted = Pack<typename Column::Word>(key);
+
+    // Whole blocks are compared at once, which the compiler turns into vector instructions; the row is then found in its block.
+    constexpr std::size_t kBlock = 16;
+    std::size_t row = 0;
+    for (; row + kBlock <= Column::kRows; row += kBlock)
+    {
+        unsigned found = 0;
+        for (std::size_t i = 0; i < kBlock; ++i)
+            found |= static_cast<unsigned>(keys[row + i] == wanted);
+        if (found != 0)
+            break;
+    }
+    for (; row < Column::kRows; ++row)
+    {
+        if (keys[row] == wanted)
+            return &Table[row];
+    }
+    return nullptr;
+}
+
+} // namespace kiv
+
+#endif

@@ -1,0 +1,60 @@
+#ifndef KIV_SINGLETON_H
+#define KIV_SINGLETON_H
+
+#include "Log.h"
+#include "NoThrow.h"
+
+#include <DAMutex.h>
+
+#include <cstring>
+#include <new>
+
+namespace kiv
+{
+
+/// What an operation gives that has no code of its own for what went wrong.
+constexpr int kFailure = 4;
+
+/// The creation frame of the four classes: makes the instance on first use, under the lock named "FILE::FUNCTION" after the place.
+/// @param failure  the error line when there is no memory
+/// @return the instance; null without memory, and the next call tries again
+template <class Class>
+Class* Singleton(Class*& instance, const Place& here, const char* failure)
+{
+    char name[128];
+    stpcpy(stpcpy(stpcpy(name, here.file), "::"), here.function); // "%s::%s" of constants, which the compiler writes out
+
+    return NoThrow<Class*>(nullptr,
+        [&]
+        {
+            const DAMutexLock lock(name);
+            if (instance == nullptr)
+            {
+                instance = new (std::nothrow) Class;
+                if (instance == nullptr)
+                    KIV_ERROR_AT(here, "%s", failure);
+            }
+            return instance;
+        });
+}
+
+/// Calls a member of a manager with these arguments: what every forward of the facade does.
+/// @param failure  the result when the manager can not be made
+template <class Manager, class Result, class... Parameters, class... Arguments>
+Result Ask(Result failure, Result (Manager::*member)(Parameters...), Arguments&&... arguments)
+{
+    Manager* const manager = Manager::GetInstance();
+    return manager == nullptr ? failure : (manager->*member)(std::forward<Arguments>(arguments)...);
+}
+
+/// The same for a member without a result.
+template <class Manager, class... Parameters, class... Arguments>
+void Ask(void (Manager::*member)(Parameters...), Arguments&&... arguments)
+{
+    if (Manager* const manager = Manager::GetInstance())
+        (manager->*member)(std::forward<Arguments>(arguments)...);
+}
+
+} // namespace kiv
+
+#endif
