@@ -13,8 +13,11 @@ if(KIV_SANITIZE)
 else()
   target_link_options(kiv_compile INTERFACE -Wl,--no-undefined)
   # _FORTIFY_SOURCE needs an optimising build, and sanitizers watch the same calls better.
-  target_compile_options(kiv_compile INTERFACE $<$<NOT:$<CONFIG:Debug>>:-U_FORTIFY_SOURCE$<SEMICOLON>-D_FORTIFY_SOURCE=2>)
+  set(fortified $<NOT:$<OR:$<CONFIG:Debug>,$<BOOL:$<TARGET_PROPERTY:KIV_UNOPTIMIZED>>>>)
+  target_compile_options(kiv_compile INTERFACE $<${fortified}:-U_FORTIFY_SOURCE$<SEMICOLON>-D_FORTIFY_SOURCE=2>)
 endif()
+# Tests are compiled more often than they run.
+target_compile_options(kiv_compile INTERFACE $<$<BOOL:$<TARGET_PROPERTY:KIV_UNOPTIMIZED>>:-O0$<SEMICOLON>-g1>)
 
 # Shared libraries hide every symbol that is not exported by name.
 function(kiv_shared_library target)

@@ -1,0 +1,210 @@
+#!/bin/bash
+# Builds the library with the simulated device, and shows both at work on a message bus of its own: the device, its SIMs, countries,
+# notifications, push messages, and a change of the network that a watcher hears of. Whatever it starts it stops.
+set -euo pipefail
+here=$(dirname "$(readlink -f "$0")")
+cd "$here"
+
+readonly build=$here/build/demo
+readonly kivctl=$build/tools/kivctl/kivctl
+work=
+declare -A pids=()
+bold= plain=
+[[ -t 1 ]] && bold=$'\033[1m' plain=$'\033[0m'
+
+stop_all()
+{
+    ((${#pids[@]})) && kill "${pids[@]}" 2>/dev/null
+    wait
+    [[ -n $work ]] && rm -rf "$work"
+}
+trap 'stop_all || true' EXIT
+trap 'exit 130' INT
+trap 'exit 143' TERM HUP
+
+build()
+{
+    mkdir -p build
+    exec 9>build/demo.lock # demonstrations at the same time build one after the other
+    flock 9
+    [[ -x $kivctl ]] || echo "Building; the first time it takes a minute or two."
+    local log=build/demo.log
+    if ! { cmake --preset demo && cmake --build --preset demo; } >"$log" 2>&1; then
+        cat "$log" >&2
+        return 1
+    fi
+    exec 9>&-
+}
+
+# Starts a party in the background; what it prints goes to a file of its name.
+start() # name command...
+{
+    local name=$1
+    shift
+    : >"$work/$name"
+    "$@" >>"$work/$name" 2>&1 &
+    pids[$name]=$!
+}
+
+# Waits until a party printed that text.
+await() # name text
+{
+    local deadline=$((SECONDS + 20))
+    until grep --quiet --fixed-strings -- "$2" "$work/$1"; do
+        if ((SECONDS > deadline)) || ! kill -0 "${pids[$1]}" 2>/dev/null; then
+            echo "$1 did not print \"$2\", but:" >&2
+            cat "$work/$1" >&2
+            return 1
+        fi
+        sleep 0.02
+    done
+}
+
+title() # text
+{
+    printf '\n%s== %s%s\n' "$bold" "$1" "$plain"
+}
+
+prompt() # argument...
+{
+    local argument
+    printf '$ kivctl'
+    for argument in "$@"; do
+        [[ $argument == *[[:space:]{]* ]] && argument="'$argument'"
+        printf ' %s' "$argument"
+    done
+}
+
+# Shows a command of the command line and what it answers; an answer of "no" is one too.
+show() # argument...
+{
+    prompt "$@"
+    echo
+    kivctl "$@" || echo "(exit code $?)"
+}
+
+# The same on one line, for an answer of one line.
+tell() # argument...
+{
+    printf '%-70s  ' "$(prompt "$@")"
+    kivctl "$@"
+}
+
+saw() # name
+{
+    sed "s/^/  $1 | /" "$work/$1"
+    : >"$work/$1"
+}
+
+kivctl()
+{
+    "$kivctl" "$@"
+}
+
+start_bus_and_services()
+{
+    export DBUS_SYSTEM_BUS_ADDRESS=unix:path=$work/socket KIV_SUBSCRIBERS=$work/subscribers.db
+    unset KIV_PROFILE KIV_LOG
+    start bus dbus-daemon --config-file="$here"/dbus/private-bus.conf --address="$DBUS_SYSTEM_BUS_ADDRESS" --nofork --print-address
+    await bus "$DBUS_SYSTEM_BUS_ADDRESS"
+    start board "$build/platform/services/kiv-board-daemon"
+    start manager "$build/platform/services/kiv-service-manager"
+    await board ready
+    await manager ready
+}
+
+start_client_services()
+{
+    start mail "$kivctl" subscribe --name org.example.Mail --key 7 --kind policy --kind status --kind auth --kind activated \
+        --kind number_changed --push mail
+    start calls "$kivctl" subscribe --name org.example.Calls --key 8 --kind status --kind auth --push mail
+    await mail ready
+    await calls ready
+}
+
+show_device()
+{
+    title "The device"
+    show device
+    show device id
+}
+
+show_sims()
+{
+    title "Its SIMs"
+    show sim
+
+    title "The SIMs of a device whose first one is locked"
+    show sim --profile dual-first-locked
+
+    title "Waiting for a SIM: of a device that is slow to start, of one that wants its PIN"
+    show sim wait --profile slow-sim
+    show sim wait --profile pin-required --timeout 1
+}
+
+show_countries()
+{
+    title "Countries"
+    show country 450
+    show country +590
+    show country KR
+}
+
+show_notifications()
+{
+    title "Notifications to the client services that subscribed"
+    tell notify auth-success
+    tell notify auth-fail
+    tell notify on --service 7
+    tell notify off on --service 7 --service 8
+    tell notify policy --service 7 --texts on chat 2 http://example.org
+    tell notify activated
+    tell notify deactivated
+    tell notify number-changed --texts a b c d
+    saw mail
+    saw calls
+
+    title "Notifications to the platform's service manager"
+    tell notify auth-success --to manager
+    tell notify auth-fail --to manager
+    tell notify on --service 7 --to manager
+    tell notify off --service 7 --to manager
+    tell notify policy --service 7 --texts on chat 2 http://example.org --to manager
+    tell notify activated --to manager
+    tell notify deactivated --to manager
+    saw manager
+}
+
+show_push()
+{
+    title "A push message"
+    tell push mail --data '{"folder":"inbox"}' --message "You have mail" --time 1764000000
+    saw mail
+    saw calls
+}
+
+show_watch()
+{
+    title "Flight mode goes on while an agent watches"
+    show device set --profile ./phone runtime.flight-mode=false
+    start watcher "$kivctl" watch --profile ./phone
+    await watcher ready
+    show network --profile ./phone
+    show device set --profile ./phone runtime.flight-mode=true network.cellular=1
+    await watcher flight_mode
+    show network --profile ./phone
+    saw watcher
+}
+
+.ci/install-missing build
+build
+work=$(mktemp -d)
+cd "$work"
+start_bus_and_services
+start_client_services
+show_device
+show_sims
+show_countries
+show_notifications
+show_push
+show_watch

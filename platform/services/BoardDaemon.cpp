@@ -1,0 +1,24 @@
+#include "BoardDaemon.h"
+
+#include "BusInterfaces.h"
+
+#include <SimulatedDevice.h>
+
+namespace kiv
+{
+
+BoardDaemon::BoardDaemon(const std::string& serial)
+    : BusParty(kBoardXml, [serial](const BusCall&) { return g_variant_new("(s)", serial.c_str()); })
+{
+    OwnName(kBusName);
+}
+
+std::string BoardDaemon::DeviceSerial()
+{
+    if (const auto serial = sim::GetDevice().serial)
+        return *serial;
+    const std::string trouble = sim::DeviceTrouble();
+    throw std::runtime_error(trouble.empty() ? "the device in use has no serial number; give one with --serial" : trouble);
+}
+
+} // namespace kiv

@@ -1,0 +1,80 @@
+#include "BusParty.h"
+
+#include <utility>
+
+namespace kiv
+{
+namespace
+{
+
+/// Flags and answers of org.freedesktop.DBus.RequestName.
+constexpr guint kDoNotQueue = 4;
+constexpr guint kPrimaryOwner = 1;
+
+/// A private connection, because the process's shared one belongs to the library that may be at work in the same process.
+GDBusConnection* Connect()
+{
+    g_autoptr(GError) error = nullptr;
+    g_autofree char* address = g_dbus_address_get_for_bus_sync(G_BUS_TYPE_SYSTEM, nullptr, &error);
+    GDBusConnection* connection = nullptr;
+    if (address)
+    {
+        const auto flags = static_cast<GDBusConnectionFlags>(
+            G_DBUS_CONNECTION_FLAGS_AUTHENTICATION_CLIENT | G_DBUS_CONNECTION_FLAGS_MESSAGE_BUS_CONNECTION);
+        connection = g_dbus_connection_new_for_address_sync(address, flags, nullptr, nullptr, &error);
+    }
+    if (!connection)
+    {
+        throw BusError(BusError::Reason::NoBus, std::string("the system bus at \"") + (address ? address : "?") +
+                                                    "\" can not be reached: " + error->message +
+                                                    "; DBUS_SYSTEM_BUS_ADDRESS tells where it is");
+    }
+    return connection;
+}
+
+} // namespace
+
+BusParty::BusParty(const char* xml, Handler handler)
+    : connection_(Connect()),
+      node_(g_dbus_node_info_new_for_xml(xml, nullptr)),
+      handler_(std::move(handler)),
+      name_(g_dbus_connection_get_unique_name(connection_.get()))
+{
+    static const GDBusInterfaceVTable vtable = {Called, nullptr, nullptr, {}};
+    registration_ =
+        g_dbus_connection_register_object(connection_.get(), ObjectPath(), node_->interfaces[0], &vtable, this, nullptr, nullptr);
+}
+
+BusParty::~BusParty()
+{
+    g_dbus_connection_unregister_object(connection_.get(), registration_);
+    g_dbus_connection_close_sync(connection_.get(), nullptr, nullptr);
+}
+
+void BusParty::OwnName(const std::string& name)
+{
+    g_autoptr(GError) error = nullptr;
+    g_autoptr(GVariant) reply = g_dbus_connection_call_sync(connection_.get(), "org.freedesktop.DBus", "/org/freedesktop/DBus",
+        "org.freedesktop.DBus", "RequestName", g_variant_new("(su)", name.c_str(), kDoNotQueue), G_VARIANT_TYPE("(u)"),
+        G_DBUS_CALL_FLAGS_NONE, -1, nullptr, &error);
+    if (!reply)
+        throw BusError(BusError::Reason::NameRefused, "the bus does not give the name \"" + name + "\": " + error->message);
+
+    guint answer = 0;
+    g_variant_get(reply, "(u)", &answer);
+    if (answer != kPrimaryOwner)
+    {
+        throw BusError(BusError::Reason::NameRefused,
+            "the bus name \"" + name + "\" is taken: another process on this bus has it and must stop first");
+    }
+    name_ = name;
+}
+
+void BusParty::Called(GDBusConnection*, const char*, const char*, const char*, const char*, GVariant* arguments,
+    GDBusMethodInvocation* invocation, gpointer self)
+{
+    const BusCall call{*g_dbus_method_invocation_get_method_info(invocation), arguments};
+    g_dbus_method_invocation_return_value(invocation, static_cast<BusParty*>(self)->handler_(call));
+}
+
+} // namespace kiv

@@ -1,0 +1,165 @@
+#include "LibraryLog.h"
+#include "Verbs.h"
+
+#include <DASystem.h>
+#include <glib.h>
+
+#include <algorithm>
+#include <array>
+
+namespace
+{
+
+std::string NotTold(int code)
+{
+    return "the platform does not tell" + (code ? ", code " + std::to_string(code) : std::string());
+}
+
+/// @param read  stores a text and gives the platform's code
+template <typename Read>
+Field ReadText(const char* name, Read read)
+{
+    char* text = nullptr;
+    const int code = read(&text);
+    const LibraryText owner(text);
+    return TextOr(name, text, NotTold(code));
+}
+
+Field ReadText(const char* name, int (DASystem::*read)(char**))
+{
+    return ReadText(name, [read](char** text) { return (DASystem::GetInstance()->*read)(text); });
+}
+
+Field Masked(Field field, Identifiers identifiers)
+{
+    if (auto* text = std::get_if<std::string>(&field.value))
+        *text = Mask(*text, 0, 4, identifiers);
+    return field;
+}
+
+/// The device unique ID as the library answers; the text is the owner's, for all that its type says.
+struct DeviceId
+{
+    DeviceId() : code(DASystem::GetInstance()->GetDeviceUniqueID(&text)) {}
+    DeviceId(const DeviceId&) = delete;
+    DeviceId& operator=(const DeviceId&) = delete;
+    ~DeviceId() { g_free(const_cast<char*>(text)); }
+
+    const char* text = nullptr;
+    const int code;
+};
+
+Field Serial()
+{
+    const DeviceId id;
+    return TextOr("serial", id.text, id.code ? MeaningOf(id.code) : "the device daemon tells none");
+}
+
+/// The text that stands in for an IMEI: the local time's offset from UTC, filled up with zeros.
+std::string ImeiFallback()
+{
+    const std::time_t now = std::time(nullptr);
+    std::tm local{};
+    localtime_r(&now, &local);
+    std::string text = std::to_string(local.tm_gmtoff);
+    text.resize(std::max<size_t>(text.size(), 15), '0');
+    return text;
+}
+
+Field Imei(Identifiers identifiers)
+{
+    Field field = ReadText("imei", &DASystem::GetIMEI);
+    if (field.value != Value(ImeiFallback()))
+        return Masked(field, identifiers);
+    field.note = "no modem answered; derived from the UTC offset";
+    return field;
+}
+
+Field FontSize()
+{
+    int size = 0;
+    const int code = DASystem::GetInstance()->GetFontSize(&size);
+    return code ? Missing("font_size", NotTold(code)) : Field{"font_size", std::int64_t{size}};
+}
+
+Field CurrentTime()
+{
+    std::tm now{};
+    if (const int code = DASystem::GetInstance()->GetCurrentTime(&now))
+        return Missing("time", NotTold(code));
+    std::array<char, 32> text{};
+    std::strftime(text.data(), text.size(), "%Y-%m-%d %H:%M:%S", &now);
+    return {"time", std::string(text.data())};
+}
+
+enum class LanguageCode
+{
+    Plain,
+    Iso639
+};
+
+Field Language(const char* name, LanguageCode which)
+{
+    char* text = nullptr;
+    const int code = DASystem::GetInstance()->GetDeviceLanguageCode(&text, which == LanguageCode::Iso639);
+    const LibraryText owner(text);
+    Field field = TextOr(name, text, "the language has no such code here");
+    if (code)
+        field.note = "stands in for a setting that can not be read, code " + std::to_string(code);
+    return field;
+}
+
+void AppendPackage(Record& record, std::string package)
+{
+    DASystem* const system = DASystem::GetInstance();
+    record.push_back({"package", package});
+    record.push_back({"package_installed", system->IsPackageInstalled(package.data())});
+    record.push_back(
+        ReadText("package_version", [&](char** version) { return system->GetPackageVersion(package.c_str(), version); }));
+}
+
+} // namespace
+
+Exit ShowDevice(const DeviceOptions& options, const Command& command)
+{
+    DASystem* const system = DASystem::GetInstance();
+    const auto salesCode = [system](char** code)
+    {
+        *code = system->GetCSC();
+        return 0;
+    };
+    Record record{
+        ReadText("name", &DASystem::GetDeviceName),
+        ReadText("model", &DASystem::GetModelName),
+        ReadText("platform", &DASystem::GetPlatformName),
+        ReadText("platform_version", &DASystem::GetSWVersion),
+        Masked(ReadText("platform_device_id", &DASystem::GetTizenIdN), command.identifiers),
+        Masked(Serial(), command.identifiers),
+        Imei(command.identifiers),
+        ReadText("sales_code", salesCode),
+        Language("language", LanguageCode::Plain),
+        Language("language_iso639", LanguageCode::Iso639),
+        CurrentTime(),
+        FontSize(),
+        {"flight_mode", system->IsFlightMode()},
+        {"mobile_data", system->IsMobileData()},
+        {"data_roaming", system->IsDataRoamingEnabled()},
+        {"storage_needed_mib", options.storageMiB},
+        {"storage_suffices", system->IsSystemMemoryAvailable(options.storageMiB)},
+    };
+    if (options.package)
+        AppendPackage(record, *options.package);
+    Print(record, command.form);
+    return Exit::Done;
+}
+
+Exit ShowDeviceId(const Command& command)
+{
+    const LibraryLog log;
+    const DeviceId id;
+    RequireSuccess(id.code, log.Errors());
+    if (!id.text)
+        throw Failure(Exit::No, "the device daemon replied without a serial number");
+    Print({{"device_id", std::string(id.text)}}, command.form);
+    return Exit::Done;
+}

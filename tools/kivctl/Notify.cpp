@@ -1,0 +1,173 @@
+#include "LibraryLog.h"
+#include "Verbs.h"
+
+#include <DADBusManager.h>
+#include <DASystem.h>
+
+#include <algorithm>
+#include <array>
+#include <map>
+
+namespace
+{
+
+const std::map<std::string, _KIV_NOTI_TYPE_E> kTypes = {
+    {"auth-success", KIV_NOTI_TYPE_AUTH_SUCCESS},
+    {"auth-fail", KIV_NOTI_TYPE_AUTH_FAIL},
+    {"on", KIV_NOTI_TYPE_STATUS_ON},
+    {"off", KIV_NOTI_TYPE_STATUS_OFF},
+    {"policy", KIV_NOTI_TYPE_POLICY},
+    {"activated", KIV_NOTI_TYPE_ACTIVATED},
+    {"deactivated", KIV_NOTI_TYPE_DEACTIVATED},
+    {"number-changed", KIV_NOTI_TYPE_NUMBER_CHANGED},
+};
+
+bool IsSwitch(const std::string& type)
+{
+    return type == "on" || type == "off";
+}
+
+bool TakesTexts(const std::string& type)
+{
+    return type == "policy" || type == "number-changed";
+}
+
+void Require(bool holds, const char* text)
+{
+    if (!holds)
+        throw Failure(Exit::Usage, text);
+}
+
+/// What the options of one line must have to do with each other.
+void Check(const NotifyOptions& options)
+{
+    const std::string& first = options.types.front();
+    const bool areSwitches = std::all_of(options.types.begin(), options.types.end(), IsSwitch);
+    Require(options.types.size() == 1 || areSwitches, "only \"on\" and \"off\" go several at once");
+    Require(options.types.size() == 1 || options.to == "subscribers", "the service manager takes one notification at a time");
+    const size_t services = areSwitches ? options.types.size() : first == "policy" ? 1 : 0;
+    Require(options.services.size() == services, areSwitches ? "each \"on\" and \"off\" needs its --service, in the same order"
+                                                 : services  ? "\"policy\" needs one --service"
+                                                             : "--service belongs to \"on\", \"off\" and \"policy\"");
+    Require(options.texts.size() == (TakesTexts(first) ? 4 : 0),
+        "--texts belongs to \"policy\" and \"number-changed\", which need all four");
+}
+
+/// What became of the call to one subscriber.
+struct Delivery
+{
+    std::string busName;
+    std::string trouble; ///< empty when it was answered
+};
+
+/// Follows the library's walk over the subscribers by the lines that it logs: the record's bus name first, then an error line if it
+/// could not be called. Error lines that are about no record tell why there was no walk.
+class Walk
+{
+public:
+    void Hear(const LibraryLine& line)
+    {
+        static const std::string kBusName = "busname: ";
+        const bool isError = line.level == LibraryLine::Level::Error;
+        if (!isError && line.message.rfind(kBusName, 0) == 0)
+            deliveries_.push_back({line.message.substr(kBusName.size()), ""});
+        else if (isError && deliveries_.empty())
+            refusals_.push_back(line.message);
+        else if (isError && line.message.rfind(' ', 0) != 0) // the lines that begin with a blank repeat the record
+            deliveries_.back().trouble = line.message;
+    }
+
+    const std::vector<Delivery>& Deliveries() const { return deliveries_; }
+    const std::vector<std::string>& Refusals() const { return refusals_; }
+
+private:
+    std::vector<Delivery> deliveries_;
+    std::vector<std::string> refusals_;
+};
+
+/// Sends the notifications through the facade. @return its result code
+int SendToSubscribers(const NotifyOptions& options, std::string imsi, const std::array<const char*, 4>& texts)
+{
+    DASystem* const system = DASystem::GetInstance();
+    if (options.types.size() == 1)
+    {
+        return system->SendNotiToServiceManager(kTypes.at(options.types.front()), imsi.c_str(),
+            options.services.empty() ? 0 : options.services.front(), texts[0], texts[1], texts[2], texts[3]);
+    }
+    std::vector<int> services = options.services;
+    std::vector<std::string> words = options.types;
+    std::vector<char*> statuses(words.size());
+    std::transform(words.begin(), words.end(), statuses.begin(), [](std::string& word) { return word.data(); });
+    return system->SendMultiOnOffNotiToServiceManager(
+        imsi.c_str(), static_cast<int>(statuses.size()), services.data(), statuses.data());
+}
+
+Exit TellSubscribers(const NotifyOptions& options, const std::string& imsi, const std::array<const char*, 4>& texts, Form form)
+{
+    Walk walk;
+    const LibraryLog log([&walk](const LibraryLine& line) { walk.Hear(line); });
+
+    // The facade's result tells nothing of the bus, so its connection is asked for first, and kept for the walk.
+    int code = 0;
+    g_autoptr(GDBusConnection) connection = DADBusManager::GetInstance()->InitDbusConnection(&code);
+    RequireSuccess(connection ? 0 : code, log.Errors());
+
+    code = SendToSubscribers(options, imsi, texts);
+    log.RequireStore();
+    RequireSuccess(code == 0 && !walk.Refusals().empty() ? 4 : code, walk.Refusals());
+
+    std::int64_t delivered = 0;
+    for (const Delivery& delivery : walk.Deliveries())
+    {
+        if (delivery.trouble.empty())
+            ++delivered;
+        else
+            Note("not delivered to " + delivery.busName + ": " + delivery.trouble);
+    }
+    const auto subscribers = static_cast<std::int64_t>(walk.Deliveries().size());
+    PrintLine({{"event", "sent"}, {"subscribers", subscribers}, {"delivered", delivered}}, form);
+    if (subscribers == 0)
+        Note("nobody has subscribed to that (kivctl subscribers list)");
+    return subscribers > 0 && delivered == subscribers ? Exit::Done : Exit::No;
+}
+
+Exit TellManager(const NotifyOptions& options, const std::string& imsi, const std::array<const char*, 4>& texts, Form form)
+{
+    const LibraryLog log;
+    const int code = DADBusManager::GetInstance()->SendNotiToServiceManager(kTypes.at(options.types.front()), imsi.c_str(),
+        options.services.empty() ? 0 : options.services.front(), texts[0], texts[1], texts[2], texts[3]);
+    RequireSuccess(code, log.Errors());
+    PrintLine({{"event", "sent"}, {"delivered", std::int64_t{1}}}, form);
+    return Exit::Done;
+}
+
+/// The IMSI given, or else, as an agent has it, that of the first SIM that answers.
+std::string Imsi(const NotifyOptions& options)
+{
+    if (!options.imsi.empty())
+        return options.imsi;
+    char* imsi = nullptr;
+    DASystem::GetInstance()->GetIMSIFromSim(&imsi);
+    const LibraryText owner(imsi);
+    if (!imsi)
+        throw Failure(Exit::No, "no SIM of this device tells its IMSI; give one with --imsi");
+    return imsi;
+}
+
+} // namespace
+
+std::vector<std::string> NotificationTypes()
+{
+    std::vector<std::string> words(kTypes.size());
+    std::transform(kTypes.begin(), kTypes.end(), words.begin(), [](const auto& type) { return type.first; });
+    return words;
+}
+
+Exit Notify(const NotifyOptions& options, const Command& command)
+{
+    Check(options);
+    std::array<const char*, 4> texts{};
+    std::transform(options.texts.begin(), options.texts.end(), texts.begin(), [](const std::string& text) { return text.c_str(); });
+    const auto tell = options.to == "manager" ? TellManager : TellSubscribers;
+    return tell(options, Imsi(options), texts, command.form);
+}

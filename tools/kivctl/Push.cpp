@@ -1,0 +1,82 @@
+#include "LibraryLog.h"
+#include "Verbs.h"
+
+#include <DADBusManager.h>
+
+namespace
+{
+
+/// Follows the library's deliveries by the lines that it logs. One begins with its record's bus name and ends with the line of a
+/// proxy that could not be made, or with the "end" of the call's completion, before which the failure stands if it failed.
+class Deliveries
+{
+public:
+    void Hear(const LibraryLine& line)
+    {
+        const bool isError = line.level == LibraryLine::Level::Error;
+        const bool isStart = line.function == "DeliverPushMessage";
+        if (!isError && isStart && line.message.rfind("busname: ", 0) == 0)
+            ++started_;
+        else if (isError && line.message.rfind("Unable to create proxy: ", 0) == 0)
+            End(line.message);
+        else if (isError && isStart)
+            refusals_.push_back(line.message);
+        else if (isError)
+            trouble_ = line.message;
+        else if (line.function == "proxy_call_cb" && line.message == "end")
+            End(trouble_);
+    }
+
+    bool AreUnderWay() const { return ended_ < started_; }
+    size_t Started() const { return started_; }
+    const std::vector<std::string>& Troubles() const { return troubles_; }
+    const std::vector<std::string>& Refusals() const { return refusals_; }
+
+private:
+    void End(const std::string& trouble)
+    {
+        ++ended_;
+        if (!trouble.empty())
+            troubles_.push_back(trouble);
+        trouble_.clear();
+    }
+
+    size_t started_ = 0;
+    size_t ended_ = 0;
+    std::string trouble_; ///< of the call whose completion is being logged
+    std::vector<std::string> troubles_;
+    std::vector<std::string> refusals_;
+};
+
+void RequireBus(const LibraryLog& log)
+{
+    int code = 0;
+    g_autoptr(GDBusConnection) connection = DADBusManager::GetInstance()->InitDbusConnection(&code);
+    RequireSuccess(connection ? 0 : code, log.Errors());
+}
+
+} // namespace
+
+Exit Push(const PushOptions& options, const Command& command)
+{
+    Deliveries deliveries;
+    const LibraryLog log([&deliveries](const LibraryLine& line) { deliveries.Hear(line); });
+    RequireBus(log);
+
+    DADBusManager::GetInstance()->DeliverPushMessage(
+        options.service.c_str(), options.data.c_str(), options.message.c_str(), options.time);
+    log.RequireStore();
+    RequireSuccess(deliveries.Refusals().empty() ? 0 : 4, deliveries.Refusals());
+    while (deliveries.AreUnderWay())
+        g_main_context_iteration(nullptr, TRUE);
+
+    const size_t failed = deliveries.Troubles().size();
+    for (const std::string& trouble : deliveries.Troubles())
+        Note("a delivery failed: " + trouble);
+    PrintLine({{"event", "sent"}, {"subscribers", static_cast<std::int64_t>(deliveries.Started())},
+                  {"delivered", static_cast<std::int64_t>(deliveries.Started() - failed)}},
+        command.form);
+    if (deliveries.Started() == 0)
+        Note("nobody has subscribed to pushes of \"" + options.service + "\" (kivctl subscribers list)");
+    return deliveries.Started() > 0 && failed == 0 ? Exit::Done : Exit::No;
+}

@@ -1,0 +1,17 @@
+#include "CallRecord.h"
+#include "Verbs.h"
+
+#include <BoardDaemon.h>
+#include <ServiceManager.h>
+#include <StopSignals.h>
+
+Exit RunServices(const ServicesOptions& options, const Command& command)
+{
+    kiv::StopSignals signals;
+    const kiv::BoardDaemon board(options.serial.empty() ? kiv::BoardDaemon::DeviceSerial() : options.serial);
+    const kiv::ServiceManager manager([form = command.form](const kiv::BusCall& call) { PrintLine(CallRecord(call), form); });
+    PrintLine({{"event", "ready"}, {"bus_names", std::vector{board.Name(), manager.Name()}}}, command.form);
+    if (signals.IterateWhile([&] { return board.IsConnected() && manager.IsConnected(); }))
+        return Exit::Done;
+    throw Failure(Exit::NoBus, "the bus went away");
+}

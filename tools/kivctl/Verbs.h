@@ -1,0 +1,124 @@
+#ifndef VERBS_H
+#define VERBS_H
+
+#include "Kivctl.h"
+
+#include <ctime>
+#include <optional>
+#include <string>
+#include <vector>
+
+/// @file
+/// What kivctl can do: the verbs, each family in the source file of its name, and what each takes from the command line.
+
+/// @name Country.cpp
+/// @{
+struct CountryOptions
+{
+    std::string key;
+    std::string kind; ///< one of CountryKeyKinds(); empty to guess
+};
+std::vector<std::string> CountryKeyKinds();
+Exit ShowCountry(const CountryOptions& options, const Command& command);
+/// @}
+
+/// @name Device.cpp
+/// @{
+struct DeviceOptions
+{
+    std::optional<std::string> package;
+    double storageMiB = 100;
+};
+Exit ShowDevice(const DeviceOptions& options, const Command& command);
+Exit ShowDeviceId(const Command& command);
+/// @}
+
+/// @name DeviceFile.cpp
+/// @{
+Exit SetInDeviceFile(const std::vector<std::string>& assignments, const Command& command);
+Exit ShowDeviceKeys(const Command& command);
+Exit ShowProfiles(const Command& command);
+/// @}
+
+/// @name Sim.cpp, SimWait.cpp
+/// @{
+struct SimOptions
+{
+    int slot = -1; ///< all slots when below 0
+    std::optional<double> timeout;
+};
+Exit ShowSims(const SimOptions& options, const Command& command);
+Exit WaitForSim(const SimOptions& options, const Command& command);
+/// @}
+
+/// @name Network.cpp, Watch.cpp
+/// @{
+struct NetworkOptions
+{
+    bool countsWifi = false;
+    bool countsBluetooth = false;
+};
+Exit ShowNetwork(const NetworkOptions& options, const Command& command);
+Exit Watch(const Command& command);
+/// @}
+
+/// @name Notify.cpp
+/// @{
+struct NotifyOptions
+{
+    std::vector<std::string> types; ///< of NotificationTypes()
+    std::string to = "subscribers"; ///< or "manager"
+    std::string imsi;               ///< empty for that of the first SIM that answers
+    std::vector<int> services;
+    std::vector<std::string> texts;
+};
+std::vector<std::string> NotificationTypes();
+Exit Notify(const NotifyOptions& options, const Command& command);
+/// @}
+
+/// @name Push.cpp
+/// @{
+struct PushOptions
+{
+    std::string service;
+    std::string data;
+    std::string message;
+    long long time = std::time(nullptr);
+};
+Exit Push(const PushOptions& options, const Command& command);
+/// @}
+
+/// @name Services.cpp
+/// @{
+struct ServicesOptions
+{
+    std::string serial; ///< empty for the device's own
+};
+Exit RunServices(const ServicesOptions& options, const Command& command);
+/// @}
+
+/// @name Subscribe.cpp
+/// @{
+struct SubscribeOptions
+{
+    std::vector<std::string> kinds; ///< of SubscriptionKinds()
+    std::string key;
+    std::vector<std::string> pushes;
+    std::string name; ///< empty for the connection's unique name alone
+};
+std::vector<std::string> SubscriptionKinds();
+Exit Subscribe(const SubscribeOptions& options, const Command& command);
+/// @}
+
+/// @name Subscribers.cpp
+/// @{
+struct SubscriptionOptions
+{
+    std::string kind, key, busName, objectPath, interface;
+};
+Exit ListSubscribers(const Command& command);
+Exit AddSubscriber(const SubscriptionOptions& options, const Command& command);
+Exit RemoveSubscriber(const SubscriptionOptions& options, const Command& command);
+/// @}
+
+#endif
