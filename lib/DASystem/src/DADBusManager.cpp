@@ -10,7 +10,7 @@
 #include <cstring>
 #include <initializer_list>
 #include <list>
-#include <memory>
+#include <mutex>
 
 using kiv::Place;
 
@@ -76,7 +76,7 @@ private:
 /// Where the shared connection is made, and the lock under which it is. GDBus tells that a connection closed through a source in
 /// the context in which it was made, and until that source has run, the dead connection stays the shared one; so that context
 /// lives as long as the process. The lock is recursive for an agent whose own "closed" handler calls the library.
-GRecMutex connectLock;
+std::recursive_mutex connectLock;
 GMainContext* ConnectContext()
 {
     static GMainContext* const context = g_main_context_new();
@@ -97,7 +97,7 @@ void Adopt(GDBusConnection* connection)
 /// new one unless somebody else still holds it; then the closed one comes back.
 GDBusConnection* TakeConnection(GError** error)
 {
-    g_autoptr(GRecMutexLocker) locker = g_rec_mutex_locker_new(&connectLock);
+    const std::lock_guard<std::recursive_mutex> lock(connectLock);
     GMainContext* const context = ConnectContext();
     const auto take = [&]
     {
@@ -122,12 +122,13 @@ GDBusConnection* TakeConnection(GError** error)
 GDBusConnection* SeenConnection()
 {
     g_autoptr(GDBusConnection) connection = static_cast<GDBusConnection*>(g_weak_ref_get(&lastConnection));
-    if (connection == nullptr || !g_dbus_connection_is_closed(connection) || !g_rec_mutex_trylock(&connectLock))
+    if (connection == nullptr || !g_dbus_connection_is_closed(connection))
         return static_cast<GDBusConnection*>(g_steal_pointer(&connection));
 
     g_clear_object(&connection);
-    Drain(ConnectContext());
-    g_rec_mutex_unlock(&connectLock);
+    const std::unique_lock<std::recursive_mutex> lock(connectLock, std::try_to_lock);
+    if (lock.owns_lock())
+        Drain(ConnectContext());
     return static_cast<GDBusConnection*>(g_weak_ref_get(&lastConnection));
 }
 
@@ -619,12 +620,12 @@ void connection_cb(GObject*, GAsyncResult* result, gpointer)
 /// one that the agent made has to be adopted in the agent's own, before it can close there.
 void RequestConnection()
 {
-    if (g_rec_mutex_trylock(&connectLock)) // whoever holds it is making the connection at this moment
+    const std::unique_lock<std::recursive_mutex> lock(connectLock, std::try_to_lock);
+    if (lock.owns_lock()) // whoever else holds it is making the connection at this moment
     {
         Drain(ConnectContext());
         const ThreadDefault isDefault(ConnectContext());
         g_bus_get(G_BUS_TYPE_SYSTEM, nullptr, connection_cb, nullptr);
-        g_rec_mutex_unlock(&connectLock);
     }
     g_bus_get(G_BUS_TYPE_SYSTEM, nullptr, connection_cb, nullptr);
 }

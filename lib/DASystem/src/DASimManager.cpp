@@ -326,30 +326,30 @@ enum class OnPolling
 struct CardStatus
 {
     int status;
-    bool isUsable; ///< now
     OnPolling onPolling;
+    bool isUsable;  ///< now
     bool isWaiting; ///< may become usable
 };
 
 // clang-format off
 constexpr CardStatus CardStatusTable[] = {
-    // status                           now    on polling         waiting
-    {TAPI_SIM_STATUS_CARD_ERROR,        false, OnPolling::Stop,   false},
-    {TAPI_SIM_STATUS_CARD_NOT_PRESENT,  false, OnPolling::Stop,   false},
-    {TAPI_SIM_STATUS_SIM_INITIALIZING,  false, OnPolling::Wait,   true},
-    {TAPI_SIM_STATUS_SIM_INIT_COMPLETED, true, OnPolling::Usable, false},
-    {TAPI_SIM_STATUS_SIM_PIN_REQUIRED,  false, OnPolling::Wait,   true},
-    {TAPI_SIM_STATUS_SIM_PUK_REQUIRED,  false, OnPolling::Wait,   true},
-    {TAPI_SIM_STATUS_CARD_BLOCKED,      false, OnPolling::Stop,   false},
-    {TAPI_SIM_STATUS_SIM_NCK_REQUIRED,  false, OnPolling::Wait,   true},
-    {TAPI_SIM_STATUS_SIM_NSCK_REQUIRED, false, OnPolling::Wait,   true},
-    {TAPI_SIM_STATUS_SIM_SPCK_REQUIRED, false, OnPolling::Wait,   true},
-    {TAPI_SIM_STATUS_SIM_CCK_REQUIRED,  false, OnPolling::Wait,   true},
-    {TAPI_SIM_STATUS_CARD_REMOVED,      false, OnPolling::Stop,   false},
-    {TAPI_SIM_STATUS_SIM_LOCK_REQUIRED, false, OnPolling::Wait,   true},
-    {TAPI_SIM_STATUS_CARD_CRASHED,      false, OnPolling::Stop,   false},
-    {TAPI_SIM_STATUS_CARD_POWEROFF,     false, OnPolling::Wait,   false},
-    {TAPI_SIM_STATUS_UNKNOWN,           false, OnPolling::Wait,   true},
+    // status                           on polling          now    waiting
+    {TAPI_SIM_STATUS_CARD_ERROR,         OnPolling::Stop,    false, false},
+    {TAPI_SIM_STATUS_CARD_NOT_PRESENT,   OnPolling::Stop,    false, false},
+    {TAPI_SIM_STATUS_SIM_INITIALIZING,   OnPolling::Wait,    false, true},
+    {TAPI_SIM_STATUS_SIM_INIT_COMPLETED, OnPolling::Usable,  true,  false},
+    {TAPI_SIM_STATUS_SIM_PIN_REQUIRED,   OnPolling::Wait,    false, true},
+    {TAPI_SIM_STATUS_SIM_PUK_REQUIRED,   OnPolling::Wait,    false, true},
+    {TAPI_SIM_STATUS_CARD_BLOCKED,       OnPolling::Stop,    false, false},
+    {TAPI_SIM_STATUS_SIM_NCK_REQUIRED,   OnPolling::Wait,    false, true},
+    {TAPI_SIM_STATUS_SIM_NSCK_REQUIRED,  OnPolling::Wait,    false, true},
+    {TAPI_SIM_STATUS_SIM_SPCK_REQUIRED,  OnPolling::Wait,    false, true},
+    {TAPI_SIM_STATUS_SIM_CCK_REQUIRED,   OnPolling::Wait,    false, true},
+    {TAPI_SIM_STATUS_CARD_REMOVED,       OnPolling::Stop,    false, false},
+    {TAPI_SIM_STATUS_SIM_LOCK_REQUIRED,  OnPolling::Wait,    false, true},
+    {TAPI_SIM_STATUS_CARD_CRASHED,       OnPolling::Stop,    false, false},
+    {TAPI_SIM_STATUS_CARD_POWEROFF,      OnPolling::Wait,    false, false},
+    {TAPI_SIM_STATUS_UNKNOWN,            OnPolling::Wait,    false, true},
 };
 // clang-format on
 
@@ -361,7 +361,7 @@ CardStatus Judge(TelSimCardStatus_t status)
         if (row.status == status)
             return row;
     }
-    return {status, false, OnPolling::Stop, false};
+    return {status, OnPolling::Stop, false, false};
 }
 
 /// A SIM state that is not a usable one, as the log tells it.
