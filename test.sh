@@ -1,0 +1,91 @@
+#!/bin/bash
+# Installs what is missing, then builds and runs the tests: plain, and under the sanitizers. Ends with CTest's summary of the
+# plain run.
+set -euo pipefail
+cd "$(dirname "$(readlink -f "$0")")"
+
+usage()
+{
+    cat <<'TEXT'
+usage: ./test.sh [--all]
+  Builds into build/ and runs the tests under AddressSanitizer with UBSan, under ThreadSanitizer, and plain.
+  --all  the same with clang++ too, and clang-format over all sources, and clang-tidy over all but the tests
+TEXT
+}
+
+all=
+case "${1-}" in
+    "") ;;
+    --all) all=yes ;;
+    -h | --help) usage; exit 0 ;;
+    *) usage >&2; exit 2 ;;
+esac
+
+say()
+{
+    printf '\n== %s\n' "$*"
+}
+
+# Runs a command whose output matters only when it fails.
+quietly() # command...
+{
+    local log
+    log=$(mktemp)
+    if ! "$@" >"$log" 2>&1; then
+        cat "$log"
+        rm -f "$log"
+        return 1
+    fi
+    rm -f "$log"
+}
+
+build() # preset
+{
+    say "$1: build"
+    quietly cmake --preset "$1"
+    quietly cmake --build --preset "$1"
+}
+
+# ThreadSanitizer of this compiler does not know the address space of kernels that randomise it more: none at all where allowed.
+fixed_addresses=()
+if setarch "$(uname -m)" --addr-no-randomize true 2>/dev/null; then
+    fixed_addresses=(setarch "$(uname -m)" --addr-no-randomize)
+fi
+
+run_tests() # preset
+{
+    say "$1: tests"
+    "${fixed_addresses[@]}" ctest --preset "$1" --parallel "$(nproc)"
+}
+
+sources()
+{
+    git ls-files --cached --others --exclude-standard -- '*.cpp' '*.h'
+}
+
+check_format()
+{
+    say "clang-format"
+    sources | xargs clang-format --dry-run -Werror
+}
+
+check_tidy()
+{
+    say "clang-tidy"
+    quietly run-clang-tidy -quiet -p build/clang -j "$(nproc)" "^$PWD/(lib|platform|tools|bench)/"
+}
+
+if [[ $all ]]; then
+    .ci/install-missing
+    check_format
+    build clang
+    check_tidy
+    run_tests clang
+else
+    .ci/install-missing build test
+fi
+
+for preset in asan tsan dev; do
+    build "$preset"
+    run_tests "$preset"
+done

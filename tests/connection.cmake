@@ -1,0 +1,1 @@
+kiv_test(connection_test connection/connection_test.cpp)

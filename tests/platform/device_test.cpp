@@ -1,0 +1,96 @@
+#include <ITapiSim.h>
+#include <SimulatedDevice.h>
+#include <net_connection.h>
+#include <telephony.h>
+
+#include <gmock/gmock.h>
+
+using namespace kiv::sim;
+using testing::StartsWith;
+
+namespace
+{
+
+class DeviceTest : public testing::Test
+{
+protected:
+    ~DeviceTest() override { ResetDevice(); }
+};
+
+TEST_F(DeviceTest, OfEachProfileIsWhatItsDescriptionSays)
+{
+    const std::map<std::string, std::vector<int>> simStates = {{"dual", {2, 2}}, {"dual-first-locked", {1, 2}}, {"single", {2}},
+        {"pin-required", {1}}, {"slow-sim", {3}}, {"roaming", {2}}, {"none", {0, 0}}, {"no-telephony", {}}};
+    std::map<std::string, std::vector<int>> told;
+    for (const Profile& profile : ListProfiles())
+    {
+        EXPECT_EQ("", UseProfile(profile.name));
+        telephony_handle_list_s list{};
+        EXPECT_EQ(profile.name != "no-telephony", telephony_init(&list) == 0);
+        std::vector<int>& states = told[profile.name];
+        for (unsigned slot = 0; slot < list.count; ++slot)
+        {
+            telephony_sim_state_e state{};
+            EXPECT_EQ(0, telephony_sim_get_state(list.handle[slot], &state));
+            states.push_back(state);
+        }
+        EXPECT_EQ(0, telephony_deinit(&list));
+    }
+    EXPECT_EQ(simStates, told);
+}
+
+TEST_F(DeviceTest, TellsWhatIsOpenAndWhatWasUsedWrongly)
+{
+    telephony_handle_list_s list{};
+    connection_h connection = nullptr;
+    ASSERT_EQ(0, telephony_init(&list));
+    TapiHandle* const modem = tel_init("modem1");
+    ASSERT_EQ(0, connection_create(&connection));
+    EXPECT_THAT(OpenHandles(),
+        testing::UnorderedElementsAre(StartsWith("handle list, opened by telephony_init call 1 from platform_test+0x"),
+            StartsWith("TAPI handle of slot 1, opened by tel_init call 1 from platform_test+0x"),
+            StartsWith("connection handle, opened by connection_create call 1")));
+
+    telephony_handle_list_s copy = list;
+    const telephony_h second = list.handle[1];
+    telephony_sim_state_e state{};
+    EXPECT_NE(0, tel_deinit(reinterpret_cast<TapiHandle*>(second)));
+    EXPECT_EQ(0, connection_destroy(connection));
+    EXPECT_EQ(0, tel_deinit(modem));
+    EXPECT_EQ(0, telephony_deinit(&list));
+    EXPECT_EQ(0, telephony_deinit(&list)) << "an empty list closes nothing";
+    const int refusals[] = {telephony_deinit(&copy), telephony_sim_get_state(second, &state), tel_deinit(modem),
+        tel_deinit(nullptr), connection_destroy(&state)};
+    EXPECT_THAT(refusals, testing::Each(testing::Ne(0)));
+    EXPECT_THAT(OpenHandles(), testing::IsEmpty());
+    EXPECT_THAT(TakeMisuses(),
+        testing::ElementsAre(
+            StartsWith("tel_deinit: needs a TAPI handle, got a telephony handle of slot 1, opened by telephony_init call 1"),
+            StartsWith("telephony_deinit: closed twice: handle list, opened by telephony_init call 1 from "),
+            StartsWith("telephony_sim_get_state: used after closing: telephony handle of slot 1, opened by telephony_init call 1"),
+            StartsWith("tel_deinit: closed twice: TAPI handle of slot 1"), "tel_deinit: needs a TAPI handle, got null",
+            "connection_destroy: needs a connection handle, got what never was a handle"));
+}
+
+TEST_F(DeviceTest, FailsTheCallsThatItIsToldToAndWritesDownWhatTheyGave)
+{
+    // The hook's own calls go without it.
+    SetCallHook([](Call /*call*/, int /*slot*/) { return std::to_string(tel_deinit(tel_init("modem0"))); });
+    FailCall(Call::tel_get_sim_imsi, -5, Only(2), 1);
+    StartJournal();
+    TapiHandle* const modems[] = {tel_init("modem0"), tel_init("modem1")};
+    TelSimImsiInfo_t imsi{};
+    for (const int slot : {1, 0, 1, 1})
+        tel_get_sim_imsi(modems[slot], &imsi);
+    StopJournal();
+    tel_deinit(modems[0]);
+
+    std::vector<std::string> told;
+    for (const JournalEntry& entry : TakeJournal())
+        if (!entry.note.empty())
+            told.push_back(NameOf(entry.call) + std::to_string(entry.slot) + " gave " + std::to_string(entry.result));
+    EXPECT_THAT(told, testing::ElementsAre("tel_init0 gave 0", "tel_init1 gave 0", "tel_get_sim_imsi1 gave 0",
+                          "tel_get_sim_imsi0 gave 0", "tel_get_sim_imsi1 gave -5", "tel_get_sim_imsi1 gave 0"));
+}
+
+} // namespace

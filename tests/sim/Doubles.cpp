@@ -1,0 +1,40 @@
+// The named locks and sleep() of this program stand in front of those that the library links.
+#include "sim/SimTest.h"
+
+#include <DAMutex.h>
+
+#include <unistd.h>
+#include <utility>
+
+using namespace kiv::test;
+
+DAMutex::DAMutex(const char* name) : lock_(const_cast<char*>(name)) {}
+DAMutex::~DAMutex() {}
+
+void DAMutex::Lock()
+{
+    EXPECT_STREQ("", std::exchange(heldLock, static_cast<char*>(lock_)));
+}
+
+void DAMutex::Unlock()
+{
+    EXPECT_EQ(lock_, std::exchange(heldLock, ""));
+}
+
+DAMutexLock::DAMutexLock(const char* name) : lock_(const_cast<char*>(name))
+{
+    EXPECT_STREQ("", std::exchange(heldLock, name));
+}
+
+DAMutexLock::~DAMutexLock()
+{
+    EXPECT_EQ(lock_, std::exchange(heldLock, ""));
+}
+
+extern "C" unsigned sleep(unsigned seconds)
+{
+    EXPECT_EQ(1U, seconds);
+    EXPECT_STREQ("", heldLock) << "in a pause";
+    ++pauses;
+    return 0;
+}

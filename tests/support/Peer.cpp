@@ -1,0 +1,162 @@
+#include "support/Peer.h"
+
+#include <gtest/gtest.h>
+
+#include <chrono>
+#include <condition_variable>
+#include <list>
+#include <mutex>
+#include <utility>
+
+namespace kiv::test
+{
+
+namespace
+{
+
+/// Guards the state of all peers. One of the program's own, because what a peer made is handed to the reading thread by GLib, whose
+/// locks ThreadSanitizer does not see.
+std::mutex mutex;
+
+/// A call in one line: "/object/path an.interface.Method (signature) (body)".
+std::string Describe(GDBusMessage* message)
+{
+    GVariant* const body = g_dbus_message_get_body(message);
+    g_autofree gchar* values = body == nullptr ? g_strdup("()") : g_variant_print(body, FALSE);
+    return std::string(g_dbus_message_get_path(message)) + ' ' + g_dbus_message_get_interface(message) + '.' +
+           g_dbus_message_get_member(message) + " (" + g_dbus_message_get_signature(message) + ") " + values;
+}
+
+} // namespace
+
+struct Peer::State
+{
+    std::condition_variable changed;
+    Answer answer;
+    std::vector<std::string> calls;
+    std::size_t count = 0;
+    int busy = 0; ///< answers being worked at
+    bool forgetful = false;
+};
+
+Peer::Peer(const PrivateBus& bus, const std::string& name, Answer answer) : connection_(bus.Connect())
+{
+    // The thread that reads the connection may enter the filter when the peer is gone already, so what the filter uses stays.
+    static auto& states = *new std::list<State>;
+    {
+        const std::lock_guard lock(mutex);
+        state_ = &states.emplace_back();
+    }
+    Set(std::move(answer));
+    g_dbus_connection_add_filter(connection_.get(), Filter, state_, nullptr);
+    name_ = name.empty() ? g_dbus_connection_get_unique_name(connection_.get()) : name;
+    if (name.empty())
+        return;
+    g_autoptr(GVariant) reply =
+        g_dbus_connection_call_sync(connection_.get(), "org.freedesktop.DBus", "/org/freedesktop/DBus", "org.freedesktop.DBus",
+            "RequestName", g_variant_new("(su)", name.c_str(), 0), nullptr, G_DBUS_CALL_FLAGS_NONE, 10'000, nullptr, nullptr);
+    EXPECT_NE(nullptr, reply);
+}
+
+Peer::~Peer()
+{
+    Close();
+}
+
+GDBusMessage* Peer::Filter(GDBusConnection* connection, GDBusMessage* message, gboolean incoming, gpointer data)
+{
+    if (!incoming || g_dbus_message_get_message_type(message) != G_DBUS_MESSAGE_TYPE_METHOD_CALL)
+        return message;
+    const Message call(message);
+    auto& state = *static_cast<State*>(data);
+    std::unique_lock lock(mutex);
+    Answer answer = state.answer;
+    if (g_strcmp0(g_dbus_message_get_interface(message), "org.freedesktop.DBus.Properties") == 0)
+        answer = Reply("(@a{sv} {},)"); // which every proxy asks for when it is made
+    else
+    {
+        ++state.count;
+        if (!state.forgetful)
+            state.calls.push_back(Describe(message));
+        state.changed.notify_all();
+    }
+    ++state.busy;
+    lock.unlock();
+
+    if (const Message reply{answer ? answer(message) : g_dbus_message_new_method_reply(message)})
+        g_dbus_connection_send_message(connection, reply.get(), G_DBUS_SEND_MESSAGE_FLAGS_NONE, nullptr, nullptr);
+
+    lock.lock();
+    --state.busy;
+    state.changed.notify_all();
+    return nullptr;
+}
+
+Peer::Answer Peer::Reply(const char* body)
+{
+    return [body](GDBusMessage* call)
+    {
+        GDBusMessage* const reply = g_dbus_message_new_method_reply(call);
+        g_autoptr(GVariant) values = g_variant_parse(nullptr, body, nullptr, nullptr, nullptr);
+        g_dbus_message_set_body(reply, values);
+        return reply;
+    };
+}
+
+Peer::Answer Peer::Refuse()
+{
+    return [](GDBusMessage* call) { return g_dbus_message_new_method_error_literal(call, "org.example.Refused", "not today"); };
+}
+
+Peer::Answer Peer::Silence()
+{
+    return [](GDBusMessage*) { return nullptr; };
+}
+
+Peer::Answer Peer::After(std::function<void()> action, Answer answer)
+{
+    return [action = std::move(action), answer = std::move(answer)](GDBusMessage* call)
+    {
+        action();
+        return answer(call);
+    };
+}
+
+Peer::Answer Peer::Leave()
+{
+    return After([this] { g_dbus_connection_close(connection_.get(), nullptr, nullptr, nullptr); }, Silence());
+}
+
+void Peer::Set(Answer answer)
+{
+    const std::lock_guard lock(mutex);
+    state_->answer = std::move(answer);
+}
+
+std::vector<std::string> Peer::Calls() const
+{
+    const std::lock_guard lock(mutex);
+    return state_->calls;
+}
+
+void Peer::AwaitCalls(std::size_t count)
+{
+    std::unique_lock lock(mutex);
+    EXPECT_TRUE(state_->changed.wait_for(lock, std::chrono::seconds(10), [&] { return state_->count >= count; }))
+        << state_->count << " calls of " << count;
+}
+
+void Peer::Forget()
+{
+    const std::lock_guard lock(mutex);
+    state_->forgetful = true;
+}
+
+void Peer::Close()
+{
+    g_dbus_connection_close_sync(connection_.get(), nullptr, nullptr);
+    std::unique_lock lock(mutex);
+    state_->changed.wait(lock, [this] { return state_->busy == 0; });
+}
+
+} // namespace kiv::test

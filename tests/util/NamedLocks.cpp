@@ -1,0 +1,65 @@
+#include <DAMutex.h>
+
+#include <gtest/gtest.h>
+
+#include <atomic>
+#include <cstdlib>
+#include <deque>
+#include <future>
+#include <string>
+#include <thread>
+#include <vector>
+
+namespace
+{
+
+/// Counts one visit more, but not those that others make meanwhile.
+void Visit(int& visits)
+{
+    const int before = visits;
+    std::this_thread::yield();
+    visits = before + 1;
+}
+
+TEST(NamedLocks, EqualTextsAreOneLockInEveryBufferAndKindFromTheirFirstUseOn)
+{
+    constexpr int kThreads = 8;
+    std::vector<std::atomic<int>> arrived(3000);
+    std::vector<int> visits(arrived.size());
+    const auto visitAll = [&]
+    {
+        for (std::size_t i = 0; i < arrived.size(); ++i)
+        {
+            const std::string name = "first use " + std::to_string(i);
+            for (++arrived[i]; arrived[i] < kThreads;)
+                std::this_thread::yield();
+            DAMutex mutex(name.c_str());
+            mutex.Lock();
+            Visit(visits[i]);
+            mutex.Unlock();
+            const DAMutexLock lock(name.c_str());
+            Visit(visits[i]);
+        }
+    };
+    std::vector<std::future<void>> threads(kThreads);
+    for (std::future<void>& thread : threads)
+        thread = std::async(std::launch::async, visitAll);
+    threads.clear(); // waits for them
+    EXPECT_EQ(std::vector<int>(visits.size(), 2 * kThreads), visits);
+}
+
+// A thread that met one lock under two of the names it holds would wait for itself.
+TEST(NamedLocks, ManyNamesAreAsManyLocksAlsoWhileTheProcessEnds)
+{
+    testing::FLAGS_gtest_death_test_style = "threadsafe"; // a new process, whose first lock comes behind atexit
+    const auto holdMany = []
+    {
+        std::deque<DAMutexLock> held;
+        for (int i = 0; i < 60; ++i)
+            held.emplace_back(i == 0 ? nullptr : ("name " + std::to_string(i)).c_str());
+    };
+    std::atexit(holdMany);
+    EXPECT_EXIT(holdMany(); std::exit(0), testing::ExitedWithCode(0), "");
+}
+
+} // namespace
