@@ -3,12 +3,26 @@
 
 #include <DAMutex.h>
 
+#include <cstring>
+#include <new>
 #include <unistd.h>
 #include <utility>
 
 using namespace kiv::test;
 
-DAMutex::DAMutex(const char* name) : lock_(const_cast<char*>(name)) {}
+namespace
+{
+
+char* Make(const char* name)
+{
+    if (refusedLock > 0 && std::strcmp(name, kSimAccess) == 0 && --refusedLock == 0)
+        throw std::bad_alloc();
+    return const_cast<char*>(name);
+}
+
+} // namespace
+
+DAMutex::DAMutex(const char* name) : lock_(Make(name)) {}
 DAMutex::~DAMutex() {}
 
 void DAMutex::Lock()
@@ -21,7 +35,7 @@ void DAMutex::Unlock()
     EXPECT_EQ(lock_, std::exchange(heldLock, ""));
 }
 
-DAMutexLock::DAMutexLock(const char* name) : lock_(const_cast<char*>(name))
+DAMutexLock::DAMutexLock(const char* name) : lock_(Make(name))
 {
     EXPECT_STREQ("", std::exchange(heldLock, name));
 }

@@ -26,6 +26,7 @@ constexpr char kSimAccess[] = "CORE_MUTEX_NAME_SIM_ACCESS";
 // What the doubles of the named locks and of sleep() keep. One thread only.
 inline const char* heldLock = ""; ///< its name, empty for none
 inline int pauses = 0;            ///< the seconds that were to be slept
+inline int refusedLock = 0;       ///< the lock on SIM access of that number from now on can not be made; 0 for none
 
 constexpr Call kNoCall = Call::connection_create; ///< one that no operation on SIMs makes
 const Calls kWhole{kNoCall};                      ///< the lock is held at every call

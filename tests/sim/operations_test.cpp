@@ -7,6 +7,8 @@
 #include <glib.h>
 #include <map>
 #include <tuple>
+#include <utility>
+#include <utility>
 
 namespace
 {
@@ -187,6 +189,21 @@ TEST_F(SimOperations, FailWithoutAPlatformCallOnASlotThatIsNotThere)
         {
             EXPECT_EQ(StoryOf(operation, operation.likeBadSlot), Try(operation, nullptr, slot)) << slot;
             EXPECT_THAT(made, testing::Each(testing::AnyOfArray(allowed)));
+        }
+    }
+}
+
+TEST_F(SimOperations, FailWhenTheirLockCanNotBeMade)
+{
+    for (const Operation& operation : kOperations)
+    {
+        const std::string good = Try(operation)[0];
+        bool isRefused = !operation.locked.empty() && operation.name != "InitHandleList"; // the list would stay open for a retry
+        for (int number = 1; isRefused; ++number)
+        {
+            const std::string result = Try(operation, [&] { refusedLock = number; })[0];
+            isRefused = std::exchange(refusedLock, 0) == 0;
+            EXPECT_EQ(isRefused, result != good) << operation.name << " at its lock " << number;
         }
     }
 }
