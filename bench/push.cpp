@@ -42,7 +42,7 @@ int underWay = 0;
 void BareCallDone(GObject* source, GAsyncResult* result, gpointer)
 {
     g_autoptr(GDBusProxy) proxy = G_DBUS_PROXY(source);
-    g_autoptr(GVariant) reply = g_dbus_proxy_call_finish(proxy, result, nullptr);
+    [[maybe_unused]] g_autoptr(GVariant) reply = g_dbus_proxy_call_finish(proxy, result, nullptr);
     --underWay;
 }
 
@@ -70,7 +70,7 @@ void CompareFor(int count)
     const auto library = [count](benchmark::State& state)
     {
         Subscribe("push", count);
-        g_autoptr(GDBusConnection) connection = g_bus_get_sync(G_BUS_TYPE_SYSTEM, nullptr, nullptr);
+        [[maybe_unused]] g_autoptr(GDBusConnection) connection = g_bus_get_sync(G_BUS_TYPE_SYSTEM, nullptr, nullptr);
         const std::string service = std::to_string(count);
         for (auto _ : state)
         {
@@ -86,7 +86,7 @@ void CompareFor(int count)
         paths.reserve(static_cast<std::size_t>(count));
         for (int number = 0; number < count; ++number)
             paths.push_back(SubscriberPath(number));
-        g_autoptr(GDBusConnection) connection = g_bus_get_sync(G_BUS_TYPE_SYSTEM, nullptr, nullptr);
+        [[maybe_unused]] g_autoptr(GDBusConnection) connection = g_bus_get_sync(G_BUS_TYPE_SYSTEM, nullptr, nullptr);
         for (auto _ : state)
             PushBare(paths);
     };
