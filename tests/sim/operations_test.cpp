@@ -8,7 +8,6 @@
 #include <map>
 #include <tuple>
 #include <utility>
-#include <utility>
 
 namespace
 {
