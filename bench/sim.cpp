@@ -3,8 +3,26 @@
 
 #include <DASystem.h>
 
+#include <cstdio>
 #include <cstdlib>
+#include <cstring>
 #include <glib.h>
+
+namespace
+{
+
+int copies = 0;
+
+} // namespace
+
+/// In front of the C library's, to count the texts that the library copies.
+extern "C" char* strdup(const char* text) noexcept
+{
+    ++copies;
+    const std::size_t size = std::strlen(text) + 1;
+    void* const copy = std::malloc(size);
+    return copy == nullptr ? nullptr : static_cast<char*>(std::memcpy(copy, text, size));
+}
 
 namespace kiv::bench
 {
@@ -33,10 +51,24 @@ void ImsiCallsBare()
     telephony_deinit(&list);
 }
 
+/// Tells how many copies one query makes: two an answer, the reader's and the one handed out.
+void CountCopies()
+{
+    std::vector<char*> imsis;
+    int count = 0;
+    DASystem::GetInstance()->GetIMSIFromSim(&imsis, &count); // what is made once is made
+    copies = 0;
+    DASystem::GetInstance()->GetIMSIFromSim(&imsis, &count);
+    std::printf("copies that an IMSI query over two slots makes: %d for %d answers\n", copies, count);
+    for (char* const imsi : imsis)
+        std::free(imsi);
+}
+
 } // namespace
 
 void AddSimQueries()
 {
+    CountCopies();
     const auto library = [](benchmark::State& state)
     {
         std::vector<char*> imsis;
