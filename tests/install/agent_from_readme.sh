@@ -16,6 +16,7 @@ LD_LIBRARY_PATH=$(dirname "$(find "$scratch/moved" -name libkiv_system.so)")
 read -ra flags <<<"$(pkg-config --cflags --libs kiv_system)"
 "$cxx" -std=c++17 -Wall -Wextra -Werror "$scratch/agent.cpp" "${flags[@]}" -o "$scratch/agent"
 
+read -ra flags <<<"$(pkg-config --cflags kiv_system)"
 for header in DASystem DASimManager DADBusManager DAConnectionManager IDAConnectionStateListener; do
     echo "#include <$header.h>" | "$cxx" -std=c++17 -fsyntax-only -Wall -Wextra -Wpedantic -Werror -x c++ - "${flags[@]}"
 done
