@@ -140,6 +140,13 @@ TEST_F(ConnectionTest, ListenerIsRegisteredForFiveChangesAndUnregisteredFromThem
     for (unsigned number = 1; number <= 3; ++number)
     {
         kiv::sim::ClearFaults();
+        Register(nullptr, "a");
+        kiv::sim::SetDevice(before);
+        kiv::sim::FailCall(kSet, -1, kiv::sim::Only(number));
+        Register(&listener, "a");
+        kiv::sim::SetDevice(after);
+        EXPECT_THAT(listener.Take(), testing::AllOf(testing::SizeIs(4), testing::Not(testing::Contains(values[number - 1]))));
+
         kiv::sim::SetDevice(before);
         Register(&listener, "a");
         kiv::sim::FailCall(kUnset, -1, kiv::sim::Only(number));

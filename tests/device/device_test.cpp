@@ -34,7 +34,7 @@ TEST_F(DeviceFacts, ThatAreTextsGoThroughWithThePlatformsCode)
         {&DASystem::GetSWVersion, Call::system_info_get_platform_string, &Device::platformVersion, {}},
         {&DASystem::GetModelName, Call::system_info_get_platform_string, &Device::modelName, {}},
         {&DASystem::GetTizenIdN, Call::system_info_get_platform_string, &Device::tizenId,
-            {Line("GetTizenIdN > system_info_get_platform_string failed [-77]")}},
+            {Line("GetTizenIdN > system_info_get_platform_string failed [77]")}},
     };
     for (const auto& row : reads)
     {
@@ -48,10 +48,10 @@ TEST_F(DeviceFacts, ThatAreTextsGoThroughWithThePlatformsCode)
         expect(0, "its own");
         Fail(row.call, 0);
         expect(0, "null");
-        Fail(row.call, -77);
-        expect(-77, row.whenItFails.empty() ? "null" : "untouched");
-        Fail(row.call, -77, Leavings::kItsResults);
-        expect(-77, row.whenItFails.empty() ? "its own" : "untouched");
+        Fail(row.call, 77);
+        expect(77, row.whenItFails.empty() ? "null" : "untouched");
+        Fail(row.call, 77, Leavings::kItsResults);
+        expect(77, row.whenItFails.empty() ? "its own" : "untouched");
     }
 }
 
