@@ -77,6 +77,23 @@ TEST_F(Outage, InTheMiddleOfAWalkIsReportedForTheRestAndOverWithTheNextCall)
     EXPECT_THAT(log.TakeErrors(), testing::IsEmpty());
 }
 
+TEST_F(Outage, ThatIsOverWhileASubscriberIsCalledIsOverForTheRestOfTheWalk)
+{
+    for (int round = 0; round < 10; ++round)
+    {
+        const auto restart = [this]
+        {
+            bus.Stop();
+            bus.Start();
+        };
+        Peer killing(bus, "", Peer::After(restart, Peer::Silence()));
+        store.records = {Record(killing), Record(killing), Record(killing)};
+        EXPECT_EQ(0, NotifyAuth());
+        // The new bus was asked for the other two, whom it does not know.
+        EXPECT_THAT(log.TakeErrors(), testing::Each(StartsWith(Line("SendAuthNotification", "no call result: ")))) << round;
+    }
+}
+
 TEST_F(Outage, AfterAPushIsOverWithTheNextCallOfAThreadWithoutALoopThoughTheContextOfThePushIsIteratedNoMore)
 {
     Peer client(bus);

@@ -66,7 +66,10 @@ public:
     OperationContext() : context_(g_main_context_new()), isDefault_(context_.get()) {}
     OperationContext(const OperationContext&) = delete;
     OperationContext& operator=(const OperationContext&) = delete;
-    ~OperationContext() { Drain(context_.get()); }
+    ~OperationContext() { LetGo(); }
+
+    /// Dispatches what the proxies left behind so far, which may hold the connection.
+    void LetGo() const { Drain(context_.get()); }
 
 private:
     kiv::Owned<GMainContext, g_main_context_unref> context_;
@@ -93,6 +96,18 @@ void Adopt(GDBusConnection* connection)
     g_weak_ref_set(&lastConnection, connection);
 }
 
+/// The closed connection that outlasted the wait for a new one, as long as somebody holds it.
+GWeakRef heldConnection;
+
+/// Whether a connection closed, and may still be let go: GDBus's own thread holds one for a moment after it closed.
+bool IsPassing(GDBusConnection* connection)
+{
+    if (connection == nullptr || !g_dbus_connection_is_closed(connection))
+        return false;
+    g_autoptr(GObject) held = static_cast<GObject*>(g_weak_ref_get(&heldConnection));
+    return held != G_OBJECT(connection);
+}
+
 /// Takes the process's shared system-bus connection: a new reference, or null and a GError. A connection that closed is left for a
 /// new one unless somebody else still holds it; then the closed one comes back.
 GDBusConnection* TakeConnection(GError** error)
@@ -107,9 +122,18 @@ GDBusConnection* TakeConnection(GError** error)
     };
 
     g_autoptr(GDBusConnection) connection = take();
-    if (connection != nullptr && g_dbus_connection_is_closed(connection))
+    constexpr int kTries = 20;
+    constexpr gulong kPauseUs = 1000;
+    for (int tries = 1; IsPassing(connection); ++tries)
     {
+        if (tries == kTries)
+        {
+            g_weak_ref_set(&heldConnection, connection);
+            break;
+        }
         g_clear_object(&connection);
+        if (tries > 1)
+            g_usleep(kPauseUs);
         connection = take();
     }
     if (connection != nullptr)
@@ -254,7 +278,8 @@ void LogRecord(const Place& here, const _SubscriberInfo& subscriber)
 
 /// Makes the proxy for one subscriber: null, and a GError where GDBus gives one, when it can not be made.
 /// @param connection  the walk's reference to the shared connection; taken here for the first subscriber, and again after it closed
-GDBusProxy* MakeProxy(GDBusConnection*& connection, const _SubscriberInfo& subscriber, GError** error)
+GDBusProxy* MakeProxy(
+    const OperationContext& context, GDBusConnection*& connection, const _SubscriberInfo& subscriber, GError** error)
 {
     if (const char* const flaw = Flaw(subscriber))
     {
@@ -264,6 +289,7 @@ GDBusProxy* MakeProxy(GDBusConnection*& connection, const _SubscriberInfo& subsc
     if (connection == nullptr || g_dbus_connection_is_closed(connection))
     {
         g_clear_object(&connection);
+        context.LetGo();
         connection = TakeConnection(error);
     }
     if (connection == nullptr || !IsUsable(connection, error))
@@ -282,7 +308,7 @@ void CallEach(const Place& here, const std::list<_SubscriberInfo>& subscribers, 
     {
         LogRecord(here, subscriber);
         g_autoptr(GError) error = nullptr;
-        g_autoptr(GDBusProxy) proxy = MakeProxy(connection, subscriber, &error);
+        g_autoptr(GDBusProxy) proxy = MakeProxy(context, connection, subscriber, &error);
         if (proxy == nullptr)
         {
             KIV_ERROR_AT(here, "Unable to create proxy: %s", Reason(error));
