@@ -82,7 +82,7 @@ public:
 
     /// @name SIM identity
     /// Of one slot of an open handle list, which is borrowed and stays open. The texts are copies released with free(); null on
-    /// failure. Each holds the lock around the one read.
+    /// failure. Each holds the lock around each of its reads, not between them.
     /// @{
 
     /// Reads the mobile country code.

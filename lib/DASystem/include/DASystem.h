@@ -17,10 +17,10 @@
 
 /// The facade of the library: what the agent asks about device, SIMs, countries and network, and what it has to tell.
 ///
-/// It keeps no state; every call asks the platform and returns. Results are copies that the caller releases with free() unless a
-/// member says otherwise. Any thread may call any member, SetConnectionEventListener() as told there. When a manager behind the
-/// facade can not be made for want of memory, a member gives its failure result: false, null, a code of 4, a connection state of
-/// 0; what always returns 0 still does.
+/// It keeps no state: nothing is remembered from one call to the next. Results are copies that the caller releases with free()
+/// unless a member says otherwise. Any thread may call any member, SetConnectionEventListener() as told there. When a manager
+/// behind the facade can not be made for want of memory, a member gives its failure result: false, null, a code of 4, a connection
+/// state of 0; what always returns 0 still does.
 class KIV_SYSTEM_API DASystem
 {
 public:
@@ -73,7 +73,8 @@ public:
     /// @return whether an SMS can be sent on a slot
     bool IsAvaliableSendSMS(int slot, TelSimCardStatus_t* status, int* serviceType);
 
-    /// Waits, without a bound, until a card is usable or never will be; the second argument is not read.
+    /// Waits until a card is usable or never will be, without a bound once its modem is open; the second argument is not read.
+    /// @return whether it is usable
     bool IsAvaliableSimStateOnPolling(int slot, int, TelSimCardStatus_t* status);
 
     /// @return whether a card of that status may become usable by waiting
@@ -112,7 +113,8 @@ public:
     bool IsDualSimAvailable();
 
     /// The MCC of the first SIM that answers.
-    /// @return 0; 4 when no SIM answers, telephony can not be opened or memory is refused, and the out-parameter is untouched
+    /// @return 0; 4 when no SIM answers, telephony can not be opened or there is no memory for the copy, and the out-parameter is
+    ///         untouched
     int GetMCCFromSim(char** mcc);
 
     /// The MNC of the first SIM that answers. @return as GetMCCFromSim()
@@ -122,8 +124,8 @@ public:
     int GetIMSIFromSim(char** imsi);
 
     /// The subscriber number of the first SIM that answers.
-    /// @return 0; 4 when telephony can not be opened or memory is refused, TELEPHONY_ERROR_SIM_NOT_AVAILABLE when no SIM answers,
-    ///         and the out-parameter is untouched
+    /// @return 0; 4 when telephony can not be opened or there is no memory for the copy, TELEPHONY_ERROR_SIM_NOT_AVAILABLE when no
+    ///         SIM answers, and the out-parameter is untouched
     int GetPhoneNumberFromSim(char** number);
 
     /// Appends the MCC of every SIM that answers; a SIM that does not leaves no gap.
@@ -256,11 +258,11 @@ public:
     /// @return whether mobile data is on; false when the platform does not tell
     bool IsMobileData();
 
-    /// @return whether a package of that name is installed
+    /// @return whether a package of that name is installed; false for a null or empty name, and when the platform does not tell
     bool IsPackageInstalled(char* packageName);
 
     /// @param requiredMiB  in mebibytes of 1,048,576 bytes
-    /// @return whether more than that is free in the internal storage
+    /// @return whether more than that is free in the internal storage; false when the platform does not tell
     bool IsSystemMemoryAvailable(double requiredMiB);
 
     /// @return the sales code; null when it can not be read

@@ -1,5 +1,5 @@
 /// @file
-/// The rows of the country tables: CountryInfoTable of DASimManager and its copy in DASystem.
+/// The row of the country tables: CountryInfoTable and MoSupportMccTable of DASimManager, and DASystem's copy of the first.
 #ifndef KIV_COUNTRY_H
 #define KIV_COUNTRY_H
 

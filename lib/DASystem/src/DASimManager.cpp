@@ -493,12 +493,8 @@ template <class Char, class Text>
 int ReadImsiText(DASimManager& manager, const telephony_handle_list_s& list, int slot, Char** out, Text text, const Place& here,
     const char* failure)
 {
-    *out = kiv::NoThrow<char*>(nullptr,
-        [&]() -> char*
-        {
-            TelSimImsiInfo_t record = {};
-            return manager.IsSimAvailable(list, slot) && ReadImsiRecord(slot, record) ? text(record) : nullptr;
-        });
+    TelSimImsiInfo_t record = {};
+    *out = manager.IsSimAvailable(list, slot) && ReadImsiRecord(slot, record) ? text(record) : nullptr;
     if (*out != nullptr)
         return 0;
     KIV_ERROR_AT(here, "%s", failure);

@@ -541,7 +541,7 @@ int CopyOut(const char* text, char** out)
 {
     char* const copy = text == nullptr ? nullptr : strdup(text);
     if (text != nullptr && copy == nullptr)
-        return -ENOMEM; // as the platform's services tell it
+        return -ENOMEM;
     *out = copy;
     return 0;
 }
@@ -689,6 +689,7 @@ bool DASystem::IsPackageInstalled(char* packageName)
 bool DASystem::IsSystemMemoryAvailable(double requiredMiB)
 {
     struct statvfs stats = {};
+    static_assert(sizeof stats.f_bavail == sizeof(std::uint64_t), "the platform writes the record with 64-bit counts");
     if (storage_get_internal_memory_size64(&stats) < 0)
     {
         KIV_ERROR("Fail to get internal memory size");
