@@ -36,6 +36,9 @@ public:
     /// Kills it; it is gone on return. Any thread.
     void Stop();
 
+    /// Lets GLib say this after all.
+    static void Tolerate(const char* message);
+
     /// A new connection that nobody else uses.
     Connection Connect() const;
 

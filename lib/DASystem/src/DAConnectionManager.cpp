@@ -17,7 +17,7 @@ template <class State>
 int ReadState(int (*read)(connection_h, State*))
 {
     connection_h created = nullptr;
-    if (connection_create(&created) != 0)
+    if (connection_create(&created) != 0 || created == nullptr)
         return 0;
     const kiv::Owned<void, connection_destroy> connection(created);
 

@@ -58,22 +58,25 @@ void Drain(GMainContext* context)
     }
 }
 
-/// A main context for one operation: what its proxies leave behind is dispatched here at the end, and the caller's context, which
-/// may never be iterated, sees nothing of it.
+/// A main context for the proxies of one operation: what they leave behind is dispatched here at the end, and the caller's
+/// context, which may never be iterated, sees nothing of it.
 class OperationContext
 {
 public:
-    OperationContext() : context_(g_main_context_new()), isDefault_(context_.get()) {}
+    OperationContext() : context_(g_main_context_new()) {}
     OperationContext(const OperationContext&) = delete;
     OperationContext& operator=(const OperationContext&) = delete;
     ~OperationContext() { LetGo(); }
+
+    /// Makes it the thread's default one for a scope: for making proxies and calling over them, not for taking the connection,
+    /// within which a handler of the agent's may run.
+    ThreadDefault Use() const { return ThreadDefault(context_.get()); }
 
     /// Dispatches what the proxies left behind so far, which may hold the connection.
     void LetGo() const { Drain(context_.get()); }
 
 private:
     kiv::Owned<GMainContext, g_main_context_unref> context_;
-    ThreadDefault isDefault_;
 };
 
 /// Where the shared connection is made, and the lock under which it is. GDBus tells that a connection closed through a source in
@@ -99,29 +102,36 @@ void Adopt(GDBusConnection* connection)
 /// The closed connection that outlasted the wait for a new one, as long as somebody holds it.
 GWeakRef heldConnection;
 
-/// Whether a connection closed, and may still be let go: GDBus's own thread holds one for a moment after it closed.
+/// Whether a connection closed, and may still be let go: GDBus's own thread holds one for a moment after it closed. One whose
+/// "closed" handler is running is held until that returns.
 bool IsPassing(GDBusConnection* connection)
 {
     if (connection == nullptr || !g_dbus_connection_is_closed(connection))
         return false;
+    GSource* const dispatched = g_main_current_source();
+    if (dispatched != nullptr && g_source_get_context(dispatched) == ConnectContext())
+        return false;
     g_autoptr(GObject) held = static_cast<GObject*>(g_weak_ref_get(&heldConnection));
     return held != G_OBJECT(connection);
+}
+
+/// Takes what GDBus shares at the moment, a new one where nobody holds any: a new reference, or null and a GError.
+GDBusConnection* TakeShared(GError** error)
+{
+    const std::lock_guard<std::recursive_mutex> lock(connectLock);
+    Drain(ConnectContext());
+    const ThreadDefault isDefault(ConnectContext());
+    GDBusConnection* const connection = g_bus_get_sync(G_BUS_TYPE_SYSTEM, nullptr, error);
+    if (connection != nullptr)
+        Adopt(connection);
+    return connection;
 }
 
 /// Takes the process's shared system-bus connection: a new reference, or null and a GError. A connection that closed is left for a
 /// new one unless somebody else still holds it; then the closed one comes back.
 GDBusConnection* TakeConnection(GError** error)
 {
-    const std::lock_guard<std::recursive_mutex> lock(connectLock);
-    GMainContext* const context = ConnectContext();
-    const auto take = [&]
-    {
-        Drain(context);
-        const ThreadDefault isDefault(context);
-        return g_bus_get_sync(G_BUS_TYPE_SYSTEM, nullptr, error);
-    };
-
-    g_autoptr(GDBusConnection) connection = take();
+    g_autoptr(GDBusConnection) connection = TakeShared(error);
     constexpr int kTries = 20;
     constexpr gulong kPauseUs = 1000;
     for (int tries = 1; IsPassing(connection); ++tries)
@@ -134,15 +144,20 @@ GDBusConnection* TakeConnection(GError** error)
         g_clear_object(&connection);
         if (tries > 1)
             g_usleep(kPauseUs);
-        connection = take();
+        connection = TakeShared(error);
     }
-    if (connection != nullptr)
-        Adopt(connection);
     return static_cast<GDBusConnection*>(g_steal_pointer(&connection));
 }
 
-/// The shared connection that was seen last; null when nobody holds it any more. Lets go of one that closed first, for operations
-/// that may not wait; whoever is connecting at the moment does so as well.
+/// Dispatches what GDBus has to say of the shared connection, unless somebody is at it: for operations that may not wait.
+void DrainIfFree()
+{
+    const std::unique_lock<std::recursive_mutex> lock(connectLock, std::try_to_lock);
+    if (lock.owns_lock())
+        Drain(ConnectContext());
+}
+
+/// The shared connection that was seen last; null when nobody holds it any more. Lets go of one that closed first.
 GDBusConnection* SeenConnection()
 {
     g_autoptr(GDBusConnection) connection = static_cast<GDBusConnection*>(g_weak_ref_get(&lastConnection));
@@ -150,9 +165,7 @@ GDBusConnection* SeenConnection()
         return static_cast<GDBusConnection*>(g_steal_pointer(&connection));
 
     g_clear_object(&connection);
-    const std::unique_lock<std::recursive_mutex> lock(connectLock, std::try_to_lock);
-    if (lock.owns_lock())
-        Drain(ConnectContext());
+    DrainIfFree();
     return static_cast<GDBusConnection*>(g_weak_ref_get(&lastConnection));
 }
 
@@ -276,15 +289,14 @@ void LogRecord(const Place& here, const _SubscriberInfo& subscriber)
     KIV_INFO_AT(here, "interface: %s", subscriber.interface.c_str());
 }
 
-/// Makes the proxy for one subscriber: null, and a GError where GDBus gives one, when it can not be made.
+/// Whether a proxy can be made for a subscriber.
 /// @param connection  the walk's reference to the shared connection; taken here for the first subscriber, and again after it closed
-GDBusProxy* MakeProxy(
-    const OperationContext& context, GDBusConnection*& connection, const _SubscriberInfo& subscriber, GError** error)
+bool IsReachable(const OperationContext& context, GDBusConnection*& connection, const _SubscriberInfo& subscriber, GError** error)
 {
     if (const char* const flaw = Flaw(subscriber))
     {
         g_set_error_literal(error, G_IO_ERROR, G_IO_ERROR_INVALID_ARGUMENT, flaw);
-        return nullptr;
+        return false;
     }
     if (connection == nullptr || g_dbus_connection_is_closed(connection))
     {
@@ -292,9 +304,12 @@ GDBusProxy* MakeProxy(
         context.LetGo();
         connection = TakeConnection(error);
     }
-    if (connection == nullptr || !IsUsable(connection, error))
-        return nullptr;
+    return connection != nullptr && IsUsable(connection, error);
+}
 
+/// Makes the proxy for one subscriber; null and a GError when it can not be made.
+GDBusProxy* MakeProxy(const _SubscriberInfo& subscriber, GError** error)
+{
     return g_dbus_proxy_new_for_bus_sync(G_BUS_TYPE_SYSTEM, G_DBUS_PROXY_FLAGS_NONE, nullptr, subscriber.busname.c_str(),
         subscriber.objectpath.c_str(), subscriber.interface.c_str(), nullptr, error);
 }
@@ -308,7 +323,9 @@ void CallEach(const Place& here, const std::list<_SubscriberInfo>& subscribers, 
     {
         LogRecord(here, subscriber);
         g_autoptr(GError) error = nullptr;
-        g_autoptr(GDBusProxy) proxy = MakeProxy(context, connection, subscriber, &error);
+        const bool isReachable = IsReachable(context, connection, subscriber, &error);
+        const ThreadDefault isDefault = context.Use();
+        g_autoptr(GDBusProxy) proxy = isReachable ? MakeProxy(subscriber, &error) : nullptr;
         if (proxy == nullptr)
         {
             KIV_ERROR_AT(here, "Unable to create proxy: %s", Reason(error));
@@ -507,7 +524,6 @@ int DADBusManager::SendNotiToServiceManager(_KIV_NOTI_TYPE_E type, const char* i
     if (!AreUtf8(KIV_HERE, isPolicy ? policy : Values{{"imsi", imsi}}))
         return kInvalidArgument;
 
-    const OperationContext context;
     int code = kSuccess;
     g_autoptr(GDBusConnection) connection = InitDbusConnection(&code);
     if (connection == nullptr)
@@ -515,6 +531,8 @@ int DADBusManager::SendNotiToServiceManager(_KIV_NOTI_TYPE_E type, const char* i
         KIV_ERROR("dbus connection error occured");
         return code;
     }
+    const OperationContext context;
+    const ThreadDefault isDefault = context.Use();
     g_autoptr(GError) error = nullptr;
     g_autoptr(GDBusProxy) proxy = MakeServiceManagerProxy(connection, &error);
     if (proxy == nullptr)
@@ -608,6 +626,7 @@ void proxy_call_cb(GObject* source, GAsyncResult* result, gpointer user_data)
         if (error != nullptr)
             KIV_ERROR("g_dbus_proxy_call_finish error (%s)", Reason(error));
     }
+    DrainIfFree(); // the request for the connection holds it until it is told of
     KIV_INFO("end");
 }
 
@@ -642,12 +661,13 @@ void connection_cb(GObject*, GAsyncResult* result, gpointer)
         Adopt(connection);
 }
 
-/// Asks for the shared connection without waiting for it. One that is not there yet is made in the context where it always is;
-/// one that the agent made has to be adopted in the agent's own, before it can close there.
+/// Asks for the shared connection without waiting for it. One that is not there yet is made in the context where it always is,
+/// unless another thread is about to make it at this very moment: then it may be made in the caller's. One that the agent made has
+/// to be adopted in the agent's own, before it can close there.
 void RequestConnection()
 {
     const std::unique_lock<std::recursive_mutex> lock(connectLock, std::try_to_lock);
-    if (lock.owns_lock()) // whoever else holds it is making the connection at this moment
+    if (lock.owns_lock())
     {
         Drain(ConnectContext());
         const ThreadDefault isDefault(ConnectContext());
@@ -658,14 +678,16 @@ void RequestConnection()
 
 /// Whether a delivery can be started; asks for the connection where nobody holds one. A record that can not be called never would
 /// be called back for, and over a closed connection that somebody still holds GDBus would print warnings.
-bool PrepareDelivery(const _SubscriberInfo& subscriber, bool& isRequested, GError** error)
+/// @param connection  receives the shared connection, to be held until the delivery has started: the last reference would take it
+///                    along; null when it was asked for
+bool PrepareDelivery(const _SubscriberInfo& subscriber, GDBusConnection*& connection, bool& isRequested, GError** error)
 {
     if (const char* const flaw = Flaw(subscriber))
     {
         g_set_error_literal(error, G_IO_ERROR, G_IO_ERROR_INVALID_ARGUMENT, flaw);
         return false;
     }
-    g_autoptr(GDBusConnection) connection = SeenConnection();
+    connection = SeenConnection();
     if (connection != nullptr)
         return IsUsable(connection, error);
     if (!isRequested)
@@ -696,7 +718,8 @@ int DADBusManager::DeliverPushMessage(const char* service_id, const char* noti_d
             {
                 LogRecord(here, subscriber);
                 g_autoptr(GError) error = nullptr;
-                if (!PrepareDelivery(subscriber, isRequested, &error))
+                g_autoptr(GDBusConnection) connection = nullptr;
+                if (!PrepareDelivery(subscriber, connection, isRequested, &error))
                 {
                     KIV_ERROR_AT(here, "Unable to create proxy: %s", Reason(error));
                     continue;

@@ -1,0 +1,142 @@
+// A bus that is killed at random moments in every operation that uses it. More rounds, or those of an earlier run once more:
+//   KIV_KILL_ROUNDS=1000 KIV_KILL_SEED=7 bus_kill_test
+#include "bus/BusTest.h"
+
+#include <atomic>
+#include <cstdlib>
+#include <random>
+#include <thread>
+
+namespace
+{
+
+using namespace kiv::test;
+using testing::AnyOf;
+using testing::IsEmpty;
+
+unsigned long Wish(const char* variable, unsigned long otherwise)
+{
+    const char* const value = g_getenv(variable);
+    return value == nullptr ? otherwise : std::strtoul(value, nullptr, 10);
+}
+
+struct Kill : BusTest
+{
+    /// A bus operation, and whether what came back is one of its results.
+    using Operation = std::function<void()>;
+
+    const std::vector<std::pair<const char*, Operation>> operations = {
+        {"serial",
+            [this]
+            {
+                const char* id = nullptr;
+                const int code = manager.GetDeviceUniqueID(id);
+                EXPECT_THAT(code, AnyOf(0, 1, 2));
+                EXPECT_EQ(code == 0, id != nullptr);
+                g_free(const_cast<char*>(id));
+            }},
+        {"service manager", [this] { EXPECT_THAT(NotifyServiceManager(KIV_NOTI_TYPE_POLICY), AnyOf(0, 1, 2, 5)); }},
+        {"walk", [this] { EXPECT_EQ(0, NotifySubscribers(KIV_NOTI_TYPE_NUMBER_CHANGED)); }},
+        {"several",
+            [this]
+            {
+                int ids[] = {1, 2};
+                char on[] = "on";
+                char* statuses[] = {on, on};
+                EXPECT_EQ(0, facade.SendMultiOnOffNotiToServiceManager(imsi, 2, ids, statuses));
+            }},
+        {"push", [this] { EXPECT_EQ(0, manager.DeliverPushMessage("7", "data", "message", 1)); }},
+    };
+
+    /// Counts the deliveries that were started and those whose list was given back.
+    void Count()
+    {
+        for (const std::string& line : log.Take())
+        {
+            open += line.rfind("I DADBusManager.cpp DeliverPushMessage > busname: ", 0) == 0;
+            open -= line.rfind("E DADBusManager.cpp DeliverPushMessage > Unable to create proxy: ", 0) == 0;
+            open -= line == "I DADBusManager.cpp free_user_data > end";
+        }
+    }
+
+    /// Iterates the thread's loop until every delivery has ended.
+    void Settle()
+    {
+        const gint64 deadline = g_get_monotonic_time() + 20 * G_TIME_SPAN_SECOND;
+        for (Count(); open != 0 && g_get_monotonic_time() < deadline; Count())
+        {
+            if (!g_main_context_iteration(nullptr, FALSE))
+                std::this_thread::yield();
+        }
+        EXPECT_EQ(0, open) << "deliveries did not end";
+        while (g_main_context_iteration(nullptr, FALSE)) // what the proxies left behind holds the connection
+        {
+        }
+    }
+
+    int open = 0;
+};
+
+TEST_F(Kill, AtAnyMomentLeavesTheProcessAliveNothingOwnedAndTheNextCallGoesToTheNewBus)
+{
+    const unsigned long rounds = Wish("KIV_KILL_ROUNDS", 50), seed = Wish("KIV_KILL_SEED", std::random_device{}());
+    std::printf("%lu rounds, seed %lu\n", rounds, seed);
+    // "Error while sending AddMatch()", and the like, is what GDBus prints when the bus dies while a proxy is being made.
+    PrivateBus::Tolerate(" message: The connection is closed");
+    std::mt19937 random(static_cast<std::mt19937::result_type>(seed));
+    for (unsigned long round = 0; round < rounds && !HasFailure(); ++round)
+    {
+        const auto& [name, operation] = operations[random() % operations.size()];
+        SCOPED_TRACE(std::string(name) + ", round " + std::to_string(round));
+        const gulong delayUs = random() % 3000;
+        {
+            Peer first(bus), second(bus), daemon(bus, kBoardDaemon, Peer::Reply("('KIV1',)")), serviceManager(bus, kServiceManager);
+            store.records = {Record(first), {"org.example.Nobody", "/", "a.b"}, Record(second)};
+            std::atomic<bool> killed{false};
+            std::thread killer(
+                [&]
+                {
+                    g_usleep(delayUs);
+                    bus.Stop();
+                    killed = true;
+                });
+            while (!killed)
+            {
+                operation();
+                g_main_context_iteration(nullptr, FALSE);
+            }
+            killer.join();
+            operation();
+            Settle();
+        }
+        bus.Start();
+        log.Take();
+        Peer serviceManager(bus, kServiceManager);
+        EXPECT_EQ(0, NotifyServiceManager(KIV_NOTI_TYPE_ACTIVATED));
+        std::thread([this] { EXPECT_EQ(0, NotifyServiceManager(KIV_NOTI_TYPE_ACTIVATED)); }).join();
+        EXPECT_EQ(2U, serviceManager.Calls().size());
+        EXPECT_THAT(log.TakeErrors(), IsEmpty());
+    }
+}
+
+TEST_F(Kill, IsFoundByEveryCallAsLongAsTheAgentHoldsTheDeadConnection)
+{
+    const Connection agents(g_bus_get_sync(G_BUS_TYPE_SYSTEM, nullptr, nullptr));
+    EXPECT_EQ(2, NotifyServiceManager(KIV_NOTI_TYPE_ACTIVATED)) << "there is no service manager";
+    bus.Stop();
+    bus.Start();
+    Peer client(bus), serviceManager(bus, kServiceManager);
+    store.records = {Record(client)};
+    while (!g_dbus_connection_is_closed(agents.get()))
+        std::this_thread::yield();
+    for (const auto& [name, operation] : operations)
+    {
+        operation();
+        EXPECT_THAT(log.TakeErrors(), testing::Not(IsEmpty())) << name;
+    }
+    EXPECT_EQ(5, NotifyServiceManager(KIV_NOTI_TYPE_ACTIVATED));
+    EXPECT_THAT(client.Calls(), IsEmpty());
+    EXPECT_THAT(serviceManager.Calls(), IsEmpty());
+}
+
+} // namespace
