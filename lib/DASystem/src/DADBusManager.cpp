@@ -83,10 +83,33 @@ private:
 /// the context in which it was made, and until that source has run, the dead connection stays the shared one; so that context
 /// lives as long as the process. The lock is recursive for an agent whose own "closed" handler calls the library.
 std::recursive_mutex connectLock;
+gboolean OutliveBus(GSignalInvocationHint* hint, guint count, const GValue* values, gpointer context);
 GMainContext* ConnectContext()
 {
-    static GMainContext* const context = g_main_context_new();
+    static GMainContext* const context = []
+    {
+        GMainContext* const made = g_main_context_new();
+        g_type_class_ref(G_TYPE_DBUS_CONNECTION); // which brings its signals into being, and stays
+        g_signal_add_emission_hook(g_signal_lookup("closed", G_TYPE_DBUS_CONNECTION), 0, OutliveBus, made, nullptr);
+        return made;
+    }();
     return context;
+}
+
+/// Whether the calling thread is dispatching something of a context.
+bool IsDispatching(GMainContext* context)
+{
+    GSource* const source = g_main_current_source();
+    return source != nullptr && g_source_get_context(source) == context;
+}
+
+/// Runs before anything else that a closed connection does. One that was made here may have closed before the request for it was
+/// told of: it does not end the process either.
+gboolean OutliveBus(GSignalInvocationHint*, guint, const GValue* values, gpointer context)
+{
+    if (IsDispatching(static_cast<GMainContext*>(context)))
+        g_dbus_connection_set_exit_on_close(G_DBUS_CONNECTION(g_value_get_object(values)), FALSE);
+    return TRUE;
 }
 
 /// The shared connection that was seen last, as long as somebody holds it.
@@ -108,8 +131,7 @@ bool IsPassing(GDBusConnection* connection)
 {
     if (connection == nullptr || !g_dbus_connection_is_closed(connection))
         return false;
-    GSource* const dispatched = g_main_current_source();
-    if (dispatched != nullptr && g_source_get_context(dispatched) == ConnectContext())
+    if (IsDispatching(ConnectContext()))
         return false;
     g_autoptr(GObject) held = static_cast<GObject*>(g_weak_ref_get(&heldConnection));
     return held != G_OBJECT(connection);
