@@ -1,22 +1,22 @@
 #include "PrivateSystemBus.h"
 
+#include "BareBus.h"
+#include "Ratios.h"
+
 #include <DASubscriberStore.h>
 
+#include <csignal>
 #include <cstdio>
 #include <cstdlib>
-#include <filesystem>
+#include <ctime>
+#include <sys/prctl.h>
+#include <vector>
 
 namespace kiv::bench
 {
 
 namespace
 {
-
-[[noreturn]] void GiveUp(const char* what, const std::string& reason)
-{
-    std::fprintf(stderr, "benchmark: %s: %s\n", what, reason.c_str());
-    std::exit(2);
-}
 
 GDBusMessage* AnswerCall(GDBusConnection* connection, GDBusMessage* message, gboolean incoming, gpointer)
 {
@@ -28,68 +28,125 @@ GDBusMessage* AnswerCall(GDBusConnection* connection, GDBusMessage* message, gbo
     return nullptr;
 }
 
+/// Starts a process that says in a line when it is ready, and dies with this one.
+std::unique_ptr<GSubprocess, Unref> Start(std::vector<const char*> command)
+{
+    constexpr auto kFlags = static_cast<GSubprocessFlags>(G_SUBPROCESS_FLAGS_STDOUT_PIPE | G_SUBPROCESS_FLAGS_STDERR_SILENCE);
+    const std::unique_ptr<GSubprocessLauncher, Unref> launcher(g_subprocess_launcher_new(kFlags));
+    g_subprocess_launcher_set_child_setup(
+        launcher.get(), [](gpointer) { prctl(PR_SET_PDEATHSIG, SIGKILL); }, nullptr, nullptr);
+    g_autoptr(GError) error = nullptr;
+    command.push_back(nullptr);
+    std::unique_ptr<GSubprocess, Unref> process(g_subprocess_launcher_spawnv(launcher.get(), command.data(), &error));
+    char ready = 0;
+    if (!process || g_input_stream_read(g_subprocess_get_stdout_pipe(process.get()), &ready, 1, nullptr, &error) != 1)
+        throw std::runtime_error(std::string(command[0]) + ": " + (error == nullptr ? "ended" : error->message));
+    return process;
+}
+
+double ProcessNs(GSubprocess* process)
+{
+    clockid_t clock{};
+    timespec used{};
+    clock_getcpuclockid(std::atoi(g_subprocess_get_identifier(process)), &clock);
+    clock_gettime(clock, &used);
+    return static_cast<double>(used.tv_sec) * 1e9 + static_cast<double>(used.tv_nsec);
+}
+
 } // namespace
+
+OneProcessor::OneProcessor() : before_{}
+{
+    sched_getaffinity(0, sizeof before_, &before_);
+    cpu_set_t one;
+    CPU_ZERO(&one);
+    CPU_SET(static_cast<unsigned>(sched_getcpu()), &one);
+    sched_setaffinity(0, sizeof one, &one);
+}
+
+OneProcessor::~OneProcessor()
+{
+    sched_setaffinity(0, sizeof before_, &before_);
+}
 
 int Serve()
 {
     g_autoptr(GError) error = nullptr;
     g_autoptr(GDBusConnection) connection = g_bus_get_sync(G_BUS_TYPE_SYSTEM, nullptr, &error);
     if (connection == nullptr)
-        GiveUp("bus", error->message);
+        throw std::runtime_error(error->message);
     g_dbus_connection_add_filter(connection, AnswerCall, nullptr, nullptr);
-    g_autoptr(GVariant) owned =
-        g_dbus_connection_call_sync(connection, "org.freedesktop.DBus", "/org/freedesktop/DBus", "org.freedesktop.DBus",
-            "RequestName", g_variant_new("(su)", kServiceName, 0U), nullptr, G_DBUS_CALL_FLAGS_NONE, -1, nullptr, &error);
-    if (owned == nullptr)
-        GiveUp("name", error->message);
+    for (const char* const name : {kServiceName, "org.tizen.system.deviced"})
+    {
+        g_autoptr(GVariant) owned =
+            g_dbus_connection_call_sync(connection, "org.freedesktop.DBus", "/org/freedesktop/DBus", "org.freedesktop.DBus",
+                "RequestName", g_variant_new("(su)", name, 0U), nullptr, G_DBUS_CALL_FLAGS_NONE, -1, nullptr, &error);
+        if (owned == nullptr)
+            throw std::runtime_error(error->message);
+    }
     std::puts("ready");
     std::fflush(stdout);
     g_main_loop_run(g_main_loop_new(nullptr, FALSE));
     return 0;
 }
 
-PrivateSystemBus::PrivateSystemBus(const char* self) : bus_(g_test_dbus_new(G_TEST_DBUS_NONE))
+PrivateSystemBus::PrivateSystemBus() : address_("unix:path=" + folder_.File("bus"))
 {
-    g_test_dbus_up(bus_);
-    g_setenv("DBUS_SYSTEM_BUS_ADDRESS", g_test_dbus_get_bus_address(bus_), TRUE);
+    const std::string address = "--address=" + address_;
+    bus_ = Start({"dbus-daemon", "--config-file=" KIV_PRIVATE_BUS_CONF, "--nofork", "--print-address", address.c_str()});
+    g_setenv("DBUS_SYSTEM_BUS_ADDRESS", address_.c_str(), TRUE);
+    g_setenv("KIV_SUBSCRIBERS", folder_.File("subscribers.db").c_str(), TRUE);
 
+    service_ = Start({"/proc/self/exe", kServe});
     g_autoptr(GError) error = nullptr;
-    g_autofree char* folder = g_dir_make_tmp("kiv-bench-XXXXXX", &error);
-    if (folder == nullptr)
-        GiveUp("store", error->message);
-    storeFolder_ = folder;
-    g_setenv("KIV_SUBSCRIBERS", (storeFolder_ + "/subscribers.db").c_str(), TRUE);
-
-    service_ = g_subprocess_new(G_SUBPROCESS_FLAGS_STDOUT_PIPE, &error, self, kServe, nullptr);
-    char ready = 0;
-    if (service_ == nullptr || g_input_stream_read(g_subprocess_get_stdout_pipe(service_), &ready, 1, nullptr, &error) != 1)
-        GiveUp("client service", error == nullptr ? "ended" : error->message);
+    shared_.reset(g_bus_get_sync(G_BUS_TYPE_SYSTEM, nullptr, &error));
+    if (!shared_)
+        throw std::runtime_error(error->message);
+    g_dbus_connection_set_exit_on_close(shared_.get(), FALSE);
 }
 
 PrivateSystemBus::~PrivateSystemBus()
 {
-    g_subprocess_force_exit(service_);
-    g_subprocess_wait(service_, nullptr, nullptr);
-    g_object_unref(service_);
-    g_test_dbus_stop(bus_);
-    g_object_unref(bus_);
-    std::filesystem::remove_all(storeFolder_);
+    for (GSubprocess* const process : {service_.get(), bus_.get()})
+    {
+        g_subprocess_force_exit(process);
+        g_subprocess_wait(process, nullptr, nullptr);
+    }
 }
 
-std::string SubscriberPath(int number)
+double PrivateSystemBus::WorkNs() const
 {
-    return "/org/example/Bench/" + std::to_string(number);
+    return CpuNs() + ProcessNs(bus_.get()) + ProcessNs(service_.get());
+}
+
+Connection PrivateSystemBus::Connect() const
+{
+    constexpr auto kFlags = static_cast<GDBusConnectionFlags>(
+        G_DBUS_CONNECTION_FLAGS_AUTHENTICATION_CLIENT | G_DBUS_CONNECTION_FLAGS_MESSAGE_BUS_CONNECTION);
+    g_autoptr(GError) error = nullptr;
+    Connection connection(g_dbus_connection_new_for_address_sync(address_.c_str(), kFlags, nullptr, nullptr, &error));
+    if (!connection)
+        throw std::runtime_error(error->message);
+    return connection;
+}
+
+void Find(const char* kind, const char* key)
+{
+    std::list<_SubscriberInfo> subscribers;
+    std::string reason;
+    if (DASubscriberStore().Find(kind, key, subscribers, reason) != DASubscriberStore::Outcome::Done || subscribers.empty())
+        throw std::runtime_error("nothing is found " + reason);
 }
 
 void Subscribe(const char* kind, int count)
 {
     DASubscriberStore store;
-    for (int number = 0; number < count; ++number)
+    for (const std::string& path : SubscriberPaths(count))
     {
         std::string reason;
-        const auto outcome = store.Add({kind, std::to_string(count), {kServiceName, SubscriberPath(number), kServiceName}}, reason);
+        const auto outcome = store.Add({kind, std::to_string(count), {kServiceName, path, kServiceName}}, reason);
         if (outcome == DASubscriberStore::Outcome::Refused || outcome == DASubscriberStore::Outcome::Failed)
-            GiveUp("store", reason);
+            throw std::runtime_error(reason);
     }
 }
 

@@ -1,28 +1,63 @@
 #ifndef KIV_BENCH_PRIVATESYSTEMBUS_H
 #define KIV_BENCH_PRIVATESYSTEMBUS_H
 
-#include <gio/gio.h>
+#include "TemporaryFolder.h"
 
-#include <string>
+#include <gio/gio.h>
+#include <sched.h>
+
+#include <memory>
 
 namespace kiv::bench
 {
 
+/// Keeps this thread, and every thread and process that it starts from now on, on one processor; the thread may go where it
+/// could before at the end.
+class OneProcessor
+{
+public:
+    OneProcessor();
+    OneProcessor(const OneProcessor&) = delete;
+    OneProcessor& operator=(const OneProcessor&) = delete;
+    ~OneProcessor();
+
+private:
+    cpu_set_t before_;
+};
+
+struct Unref
+{
+    void operator()(gpointer object) const { g_object_unref(object); }
+};
+using Connection = std::unique_ptr<GDBusConnection, Unref>;
+
 /// A bus of the benchmark's own as the system bus, a client service in a process of its own that answers every call, and a place
-/// for the subscriber store. All of it is gone at the end.
+/// for the subscriber store. All of it is gone at the end. Program, bus and service share one processor, so that no processor is
+/// idle between a message and its reply.
 class PrivateSystemBus
 {
 public:
-    /// @param self  the benchmark's own program, which serves with kServe as its argument
-    explicit PrivateSystemBus(const char* self);
+    PrivateSystemBus();
     PrivateSystemBus(const PrivateSystemBus&) = delete;
     PrivateSystemBus& operator=(const PrivateSystemBus&) = delete;
     ~PrivateSystemBus();
 
+    /// The program's shared connection, held from beginning to end: without that the bare loops would connect anew for each
+    /// proxy, and the library for each notification.
+    GDBusConnection* Shared() const { return shared_.get(); }
+
+    /// The processor time, in nanoseconds, that program, bus and service have used so far.
+    double WorkNs() const;
+
+    /// Another connection.
+    Connection Connect() const;
+
 private:
-    GTestDBus* bus_;
-    GSubprocess* service_ = nullptr;
-    std::string storeFolder_;
+    OneProcessor processor_;
+    TemporaryFolder folder_;
+    std::string address_;
+    std::unique_ptr<GSubprocess, Unref> bus_, service_;
+    Connection shared_;
 };
 
 constexpr char kServe[] = "--serve";
@@ -30,14 +65,11 @@ constexpr char kServe[] = "--serve";
 /// The client service: answers every call until it is killed.
 int Serve();
 
-/// Where the client service is; it answers on every path.
-constexpr char kServiceName[] = "org.example.Bench";
-
-/// The path of one of several subscribers, all of the one service.
-std::string SubscriberPath(int number);
-
-/// Records that many subscribers of a kind, under that number as the key, unless they are there.
+/// Records that many subscribers of a kind, under their number as the key.
 void Subscribe(const char* kind, int count);
+
+/// Looks up the subscribers of a kind and a key, as the library does for each event.
+void Find(const char* kind, const char* key);
 
 } // namespace kiv::bench
 

@@ -2,8 +2,8 @@
 
 #include <algorithm>
 #include <cstdio>
-#include <map>
-#include <vector>
+#include <ctime>
+#include <optional>
 
 namespace kiv::bench
 {
@@ -11,29 +11,44 @@ namespace kiv::bench
 namespace
 {
 
-constexpr int kRounds = 9;
-
-struct Pair
+double Read(clockid_t clock)
 {
-    std::string item;
-    Goal goal;
-    std::vector<double> libraryNs, bareNs; ///< a call, one value a round
-};
-
-std::vector<Pair>& Pairs()
-{
-    static std::vector<Pair> pairs;
-    return pairs;
+    timespec now{};
+    clock_gettime(clock, &now);
+    return static_cast<double>(now.tv_sec) * 1e9 + static_cast<double>(now.tv_nsec);
 }
 
-double Median(std::vector<double> values)
+double RunOnce(const Side& side, const Clock& clock)
 {
-    std::nth_element(values.begin(), values.begin() + static_cast<long>(values.size() / 2), values.end());
-    return values[values.size() / 2];
+    if (side.prepare)
+        side.prepare();
+    const double start = clock();
+    side.run();
+    return clock() - start;
 }
 
-/// Sorts what the benchmark library measured into the pairs.
-class Collector : public benchmark::BenchmarkReporter
+/// One round. What the machine does meanwhile meets both sides alike, since they take turns every few milliseconds, and neither
+/// always goes first.
+void Round(benchmark::State& state, const Pair& pair)
+{
+    double library = 0, bare = 0;
+    for (auto _ : state)
+    {
+        const double before = library + bare;
+        library += RunOnce(pair.library, pair.clock);
+        bare += RunOnce(pair.bare, pair.clock);
+        bare += RunOnce(pair.bare, pair.clock);
+        library += RunOnce(pair.library, pair.clock);
+        state.SetIterationTime((library + bare - before) / 1e9);
+    }
+    const double calls = 2 * pair.calls * static_cast<double>(state.iterations());
+    state.counters["library"] = library / calls;
+    state.counters["bare"] = bare / calls;
+    state.counters["ratio"] = library / bare;
+}
+
+/// Takes what the benchmark library made of the rounds.
+class Summary : public benchmark::BenchmarkReporter
 {
 public:
     bool ReportContext(const Context&) override { return true; }
@@ -42,73 +57,67 @@ public:
     {
         for (const Run& run : runs)
         {
-            if (run.error_occurred)
-                std::fprintf(stderr, "%s: %s\n", run.benchmark_name().c_str(), run.error_message.c_str());
-            if (run.run_type != Run::RT_Iteration || run.error_occurred)
-                continue;
-            const std::string& name = run.run_name.function_name;
-            const bool isWall = name.find("|wall|") != std::string::npos;
-            const double ns = isWall ? run.GetAdjustedRealTime() : run.GetAdjustedCPUTime();
-            Pair& pair = Pairs()[std::stoul(name)];
-            (name.find("|library") != std::string::npos ? pair.libraryNs : pair.bareNs).push_back(ns);
+            if (run.run_type == Run::RT_Aggregate)
+                aggregates_[run.aggregate_name] = run.counters;
         }
     }
+
+    double Of(const char* aggregate, const char* counter) { return aggregates_[aggregate][counter]; }
+
+private:
+    std::map<std::string, benchmark::UserCounters> aggregates_;
 };
 
-bool Report(const Pair& pair)
+std::string Text(const Goal& goal)
 {
-    if (pair.libraryNs.empty() || pair.libraryNs.size() != pair.bareNs.size())
-    {
-        std::printf("%-52s not measured\n", pair.item.c_str());
-        return false;
-    }
-    std::vector<double> ratios;
-    for (std::size_t i = 0; i < pair.bareNs.size(); ++i)
-        ratios.push_back(pair.libraryNs[i] / pair.bareNs[i]);
-
-    const double library = Median(pair.libraryNs);
-    const double bare = Median(pair.bareNs);
-    const double ratio = Median(ratios);
-    const bool isMet = ratio * bare <= pair.goal.factor * bare + pair.goal.slackNs;
-    const auto [least, most] = std::minmax_element(ratios.begin(), ratios.end());
-    char goal[32];
-    std::snprintf(goal, sizeof goal, pair.goal.slackNs > 0 ? "%.2f + %.1f us" : "%.2f", pair.goal.factor, pair.goal.slackNs / 1e3);
-    std::printf("%-52s %-14s %6.3f (%.3f to %.3f)  %10.0f ns to %10.0f ns  %s\n", pair.item.c_str(), goal, ratio, *least, *most,
-        library, bare, isMet ? "met" : "MISSED");
-    return isMet;
+    char text[32];
+    std::snprintf(text, sizeof text, goal.slackNs > 0 ? "<= %.2f + %.1fus" : "<= %.2f", goal.factor, goal.slackNs / 1e3);
+    return text;
 }
 
 } // namespace
 
-void Compare(const std::string& item, Goal goal, Clock clock, const Body& library, const Body& bare, int threads)
+double CpuNs()
 {
-    const std::string prefix = std::to_string(Pairs().size()) + (clock == Clock::Wall ? "|wall|" : "|cpu|");
-    Pairs().push_back({item, goal, {}, {}});
-    for (const auto& [side, body] : {std::pair(prefix + "library", library), std::pair(prefix + "bare", bare)})
-    {
-        auto* const registered = benchmark::RegisterBenchmark(side.c_str(), body)->Repetitions(kRounds)->Threads(threads);
-        if (clock == Clock::Wall)
-            registered->UseRealTime();
-    }
+    return Read(CLOCK_PROCESS_CPUTIME_ID);
 }
 
-bool RunAll(int argc, char** argv)
+double WallNs()
 {
-    // Rounds of all pairs in a random order, so that what the machine does meanwhile meets both sides alike.
-    std::vector<char*> arguments(argv, argv + argc);
-    char interleave[] = "--benchmark_enable_random_interleaving=true";
-    char shortRounds[] = "--benchmark_min_time=0.1";
-    arguments.insert(arguments.begin() + 1, {interleave, shortRounds});
-    int count = static_cast<int>(arguments.size());
-    benchmark::Initialize(&count, arguments.data());
+    return Read(CLOCK_MONOTONIC);
+}
 
-    Collector collector;
-    benchmark::RunSpecifiedBenchmarks(&collector);
-    std::printf("%-52s %-14s %-25s %s\n", "item", "goal", "measured (least to most)", "a call, library to bare");
-    bool isMet = true;
-    for (const Pair& pair : Pairs())
-        isMet = Report(pair) && isMet;
-    return isMet;
+double Quantile(std::vector<double> values, std::size_t quarters)
+{
+    const auto at = values.begin() + static_cast<std::ptrdiff_t>((values.size() - 1) * quarters / 4);
+    std::nth_element(values.begin(), at, values.end());
+    return *at;
+}
+
+void Compare(Table& table, const Pair& pair)
+{
+    if (!table.Wants(pair.item))
+        return;
+    benchmark::RegisterBenchmark(pair.item.c_str(), [&](benchmark::State& state) { Round(state, pair); })
+        ->UseManualTime()
+        ->MinTime(pair.roundSeconds)
+        ->Repetitions(kRounds)
+        ->ComputeStatistics("low", [](const std::vector<double>& all) { return Quantile(all, 1); })
+        ->ComputeStatistics("high", [](const std::vector<double>& all) { return Quantile(all, 3); });
+    Summary summary;
+    benchmark::RunSpecifiedBenchmarks(&summary, ".");
+    benchmark::ClearRegisteredBenchmarks();
+
+    const double library = summary.Of("median", "library"), bare = summary.Of("median", "bare");
+    const double ratio = summary.Of("median", "ratio");
+    const bool isMet = ratio * bare <= pair.goal.factor * bare + pair.goal.slackNs;
+    char times[64];
+    std::snprintf(times, sizeof times, "%.4g ns to %.4g ns", library, bare);
+    Row row{pair.item, Text(pair.goal), isMet ? Outcome::Met : Outcome::Missed, ratio, summary.Of("low", "ratio"),
+        summary.Of("high", "ratio"), {}, times, {{"library_ns", library}, {"bare_ns", bare}}};
+    if (!pair.more.is_null())
+        row.more.update(pair.more);
+    table.Add(std::move(row));
 }
 
 } // namespace kiv::bench

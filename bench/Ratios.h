@@ -1,10 +1,13 @@
 #ifndef KIV_BENCH_RATIOS_H
 #define KIV_BENCH_RATIOS_H
 
+#include "Table.h"
+
 #include <benchmark/benchmark.h>
 
 #include <functional>
 #include <string>
+#include <vector>
 
 namespace kiv::bench
 {
@@ -16,20 +19,51 @@ struct Goal
     double slackNs = 0;
 };
 
-enum class Clock
+/// Nanoseconds since whenever.
+using Clock = std::function<double()>;
+
+double CpuNs();  ///< processor time of this process, for what it computes
+double WallNs(); ///< for what threads do side by side
+
+/// A few calls in a row, long enough for the clock.
+using Batch = std::function<void()>;
+
+struct Side
 {
-    Cpu, ///< for what one thread computes
-    Wall ///< for what waits for others
+    Batch run;
+    Batch prepare = {}; ///< before each run, not timed
 };
 
-using Body = std::function<void(benchmark::State&)>;
+struct Pair
+{
+    std::string item;
+    Goal goal;
+    Clock clock;
+    double calls; ///< in a batch, by which its time is divided
+    Side library; ///< the library's way
+    Side bare;    ///< the bare or naive way to the same
+    nlohmann::json more = {};
+    double roundSeconds = 0.1;
+};
 
-/// Registers a pair: the library's way, and the bare or naive way, each run nine times in turns.
-void Compare(const std::string& item, Goal goal, Clock clock, const Body& library, const Body& bare, int threads = 1);
+constexpr int kRounds = 11;
 
-/// Runs every pair and prints a line each: goal, what was measured, and how far the nine rounds lay apart.
-/// @return whether every goal was met
-bool RunAll(int argc, char** argv);
+/// What so many quarters of the values are not above.
+double Quantile(std::vector<double> values, std::size_t quarters);
+
+/// Runs a pair in rounds, batches of the two sides in turns within each round, and adds the median of the rounds to the table.
+void Compare(Table& table, const Pair& pair);
+
+/// A batch of that many calls.
+template <class Call>
+Batch Times(int count, Call call)
+{
+    return [count, call]
+    {
+        for (int i = 0; i < count; ++i)
+            call();
+    };
+}
 
 } // namespace kiv::bench
 

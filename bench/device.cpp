@@ -23,53 +23,48 @@ public:
     void OnWifiConnectedChanged(bool, void*) override {}
 };
 
-void Language(benchmark::State& state)
+void Language()
 {
-    for (auto _ : state)
-    {
-        char* code = nullptr;
-        DASystem::GetInstance()->GetDeviceLanguageCode(&code, true);
-        benchmark::DoNotOptimize(code);
-        std::free(code);
-    }
+    char* code = nullptr;
+    DASystem::GetInstance()->GetDeviceLanguageCode(&code, true);
+    benchmark::DoNotOptimize(code);
+    std::free(code);
 }
 
-void LanguageSetting(benchmark::State& state)
+void LanguageSetting()
 {
-    for (auto _ : state)
-    {
-        char* setting = nullptr;
-        system_settings_get_value_string(SYSTEM_SETTINGS_KEY_LOCALE_LANGUAGE, &setting);
-        benchmark::DoNotOptimize(setting);
-        std::free(setting);
-    }
+    char* setting = nullptr;
+    system_settings_get_value_string(SYSTEM_SETTINGS_KEY_LOCALE_LANGUAGE, &setting);
+    benchmark::DoNotOptimize(setting);
+    std::free(setting);
 }
 
-void Change(benchmark::State& state)
+void Change()
 {
-    SilentListener listener;
-    DAConnectionManager::__pListener = &listener;
-    for (auto _ : state)
-        DAConnectionManager::OnConnectionStateChanged(RUNTIME_INFO_KEY_FLIGHT_MODE_ENABLED, nullptr);
-    DAConnectionManager::__pListener = nullptr;
+    DAConnectionManager::OnConnectionStateChanged(RUNTIME_INFO_KEY_FLIGHT_MODE_ENABLED, nullptr);
 }
 
-void FlightMode(benchmark::State& state)
+void FlightMode()
 {
-    for (auto _ : state)
-    {
-        bool enabled = false;
-        runtime_info_get_value_bool(RUNTIME_INFO_KEY_FLIGHT_MODE_ENABLED, &enabled);
-        benchmark::DoNotOptimize(enabled);
-    }
+    bool enabled = false;
+    runtime_info_get_value_bool(RUNTIME_INFO_KEY_FLIGHT_MODE_ENABLED, &enabled);
+    benchmark::DoNotOptimize(enabled);
 }
+
+constexpr int kCalls = 1000;
 
 } // namespace
 
-void AddDeviceQueries()
+void MeasureDeviceQueries(Table& table)
 {
-    Compare("device language, against its platform call", {1.2, 500}, Clock::Cpu, Language, LanguageSetting);
-    Compare("change notification, against its platform call", {1.0, 2000}, Clock::Cpu, Change, FlightMode);
+    Compare(table, {"device language, against its platform call", {1.2, 500}, CpuNs, kCalls, {Times(kCalls, Language)},
+                       {Times(kCalls, LanguageSetting)}});
+
+    SilentListener listener;
+    DAConnectionManager::__pListener = &listener;
+    Compare(table, {"change notification, against its platform call", {1.0, 2000}, CpuNs, kCalls, {Times(kCalls, Change)},
+                       {Times(kCalls, FlightMode)}});
+    DAConnectionManager::__pListener = nullptr;
 }
 
 } // namespace kiv::bench

@@ -5,8 +5,13 @@
 #include <DASystem.h>
 #include <Naive.h>
 
+#if KIV_HAVE_PHONENUMBER
+#include <phonenumbers/phonenumberutil.h>
+#endif
+
 #include <cstdlib>
 #include <iterator>
+#include <thread>
 
 namespace kiv::bench
 {
@@ -38,46 +43,128 @@ void NaiveLookup(const char* mcc)
     std::free(name);
 }
 
-Body WorstKey(void (*lookup)(const char*))
+Side WorstKey(void (*lookup)(const char*))
 {
-    return [lookup](benchmark::State& state)
-    {
-        for (auto _ : state)
-            lookup(kLastMcc);
-    };
+    return {Times(1000, [lookup] { lookup(kLastMcc); })};
 }
 
-Body EveryKey(void (*lookup)(const char*))
+Side EveryKey(void (*lookup)(const char*))
 {
-    return [lookup](benchmark::State& state)
-    {
-        for (auto _ : state)
+    return {[lookup]
         {
             for (const char* mcc : kMccs)
                 lookup(mcc);
-        }
-    };
+        }};
 }
 
+constexpr int kInstances = 10'000;
+
 template <class Class>
-Body Instance()
+Batch Instances(int count = kInstances)
 {
-    return [](benchmark::State& state)
-    {
-        for (auto _ : state)
-            benchmark::DoNotOptimize(Class::GetInstance());
-    };
+    return Times(count, [] { benchmark::DoNotOptimize(Class::GetInstance()); });
 }
+
+/// In two threads at once, so long that to start one does not count.
+template <class Class>
+Side InstancesInTwoThreads()
+{
+    return {[batch = Instances<Class>(50 * kInstances)]
+        {
+            std::thread other(batch);
+            batch();
+            other.join();
+        }};
+}
+
+constexpr const char* kByMcc = "facade lookup by MCC, all keys, against libphonenumber";
+constexpr const char* kByCallingCode = "facade lookup by calling code, all keys, against libphonenumber";
+
+#if KIV_HAVE_PHONENUMBER
+
+/// The calling codes of all countries.
+std::vector<std::string> CallingCodes()
+{
+    std::vector<std::string> codes;
+    for (const char* mcc : kMccs)
+    {
+        char* code = nullptr;
+        DASystem::GetInstance()->GetCountryCallingCodeFromMcc(mcc, &code);
+        if (code != nullptr)
+            codes.emplace_back(code);
+        std::free(code);
+    }
+    return codes;
+}
+
+/// Alpha-2 code by alpha-2 code, each from the number or text that the one or the other is asked with.
+void CompareRegions(Table& table)
+{
+    DASystem* const facade = DASystem::GetInstance();
+    const std::vector<std::string> codes = CallingCodes();
+    std::vector<int> numbers;
+    for (const std::string& code : codes)
+        numbers.push_back(std::stoi(code));
+
+    const auto byMcc = [&]
+    {
+        for (std::size_t i = 0; i < codes.size(); ++i)
+        {
+            char* region = nullptr;
+            facade->GetCountryCodeFromMcc(kMccs[i], &region);
+            benchmark::DoNotOptimize(region);
+            std::free(region);
+        }
+    };
+    const auto byCallingCode = [&]
+    {
+        for (const std::string& code : codes)
+        {
+            char* region = nullptr;
+            facade->GetCountryNameAlpha2FromCountryCallingCode(code.c_str(), &region);
+            benchmark::DoNotOptimize(region);
+        }
+    };
+    const auto other = [&]
+    {
+        for (const int number : numbers)
+        {
+            std::string region;
+            i18n::phonenumbers::PhoneNumberUtil::GetInstance()->GetRegionCodeForCountryCode(number, &region);
+            benchmark::DoNotOptimize(region);
+        }
+    };
+    const auto calls = static_cast<double>(codes.size());
+    Compare(table, {kByMcc, {0.85}, CpuNs, calls, {byMcc}, {other}});
+    Compare(table, {kByCallingCode, {0.85}, CpuNs, calls, {byCallingCode}, {other}});
+}
+
+#else
+
+void CompareRegions(Table& table)
+{
+    for (const char* const item : {kByMcc, kByCallingCode})
+    {
+        if (table.Wants(item))
+            table.Add({item, "<= 0.85", Outcome::NotMeasured, 0, 0, 0, {}, "libphonenumber-dev is not installed"});
+    }
+}
+
+#endif
 
 } // namespace
 
-void AddLookups()
+void MeasureLookups(Table& table)
 {
-    Compare("facade lookup, worst key, against naive", {0.12}, Clock::Cpu, WorstKey(LibraryLookup), WorstKey(NaiveLookup));
-    Compare("facade lookup, all keys, against naive", {0.15}, Clock::Cpu, EveryKey(LibraryLookup), EveryKey(NaiveLookup));
-    Compare("GetInstance(), one thread, against naive", {0.25}, Clock::Cpu, Instance<DASimManager>(), Instance<naive::Manager>());
     Compare(
-        "GetInstance(), two threads, against naive", {0.35}, Clock::Wall, Instance<DASimManager>(), Instance<naive::Manager>(), 2);
+        table, {"facade lookup, worst key, against naive", {0.12}, CpuNs, 1000, WorstKey(LibraryLookup), WorstKey(NaiveLookup)});
+    Compare(table, {"facade lookup, all keys, against naive", {0.15}, CpuNs, std::size(kMccs), EveryKey(LibraryLookup),
+                       EveryKey(NaiveLookup)});
+    CompareRegions(table);
+    Compare(table, {"GetInstance(), one thread, against naive", {0.25}, CpuNs, kInstances, {Instances<DASimManager>()},
+                       {Instances<naive::Manager>()}});
+    Compare(table, {"GetInstance(), two threads, against naive", {0.35}, WallNs, 100 * kInstances,
+                       InstancesInTwoThreads<DASimManager>(), InstancesInTwoThreads<naive::Manager>()});
 }
 
 } // namespace kiv::bench

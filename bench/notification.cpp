@@ -1,5 +1,6 @@
+#include "BareBus.h"
+#include "BusMonitor.h"
 #include "Items.h"
-#include "PrivateSystemBus.h"
 #include "Ratios.h"
 
 #include <DASystem.h>
@@ -10,55 +11,41 @@ namespace kiv::bench
 namespace
 {
 
-constexpr char kImsi[] = "450050123456789";
+constexpr double kRoundSeconds = 1;
 
-/// The same proxies and calls, one after the other, in the loop that one would write first.
-void NotifyBare(const std::vector<std::string>& paths)
+void CompareFor(Table& table, const PrivateSystemBus& bus, int count)
 {
-    for (const std::string& path : paths)
+    Subscribe("status", count);
+    const std::string number = std::to_string(count);
+    const auto work = [&] { return bus.WorkNs(); };
+    const auto library = [count] {
+        DASystem::GetInstance()->SendNotiToServiceManager(
+            KIV_NOTI_TYPE_STATUS_ON, kImsi, count, nullptr, nullptr, nullptr, nullptr);
+    };
+    const auto bare = [count, paths = SubscriberPaths(count)] { NotifyBare(paths, count); };
+
+    Compare(table, {"notification to " + number + ", a subscriber, against bare", {1.03}, work, static_cast<double>(count),
+                       {library, Drain}, {bare, Drain}, {{"series", "notification"}, {"subscribers", count}}, kRoundSeconds});
+    CompareMessages(table, bus, "notification to " + number + ", messages on the bus", Order::Same, library, bare);
+    if (count == 1)
     {
-        g_autoptr(GError) error = nullptr;
-        g_autoptr(GDBusProxy) proxy = g_dbus_proxy_new_for_bus_sync(
-            G_BUS_TYPE_SYSTEM, G_DBUS_PROXY_FLAGS_NONE, nullptr, kServiceName, path.c_str(), kServiceName, nullptr, &error);
-        g_autoptr(GVariant) reply =
-            g_dbus_proxy_call_sync(proxy, "status", g_variant_new("((sis))", kImsi, static_cast<int>(paths.size()), "on"),
-                G_DBUS_CALL_FLAGS_NONE, G_MAXINT, nullptr, &error);
-        if (reply == nullptr)
-            g_error("no answer: %s", error->message);
+        const auto findAndBare = [&]
+        {
+            Find("status", "1");
+            bare();
+        };
+        Compare(table, {"notification to 1, against a store lookup and bare", {1.03}, work, 1, {library, Drain},
+                           {findAndBare, Drain}, {}, kRoundSeconds});
     }
-}
-
-void CompareFor(int count)
-{
-    // On both sides the agent holds the shared connection: without it the bare loop would connect anew for each proxy, and the
-    // library for each notification.
-    const auto library = [count](benchmark::State& state)
-    {
-        Subscribe("status", count);
-        [[maybe_unused]] g_autoptr(GDBusConnection) connection = g_bus_get_sync(G_BUS_TYPE_SYSTEM, nullptr, nullptr);
-        for (auto _ : state)
-            DASystem::GetInstance()->SendNotiToServiceManager(
-                KIV_NOTI_TYPE_STATUS_ON, kImsi, count, nullptr, nullptr, nullptr, nullptr);
-    };
-    const auto bare = [count](benchmark::State& state)
-    {
-        std::vector<std::string> paths;
-        paths.reserve(static_cast<std::size_t>(count));
-        for (int number = 0; number < count; ++number)
-            paths.push_back(SubscriberPath(number));
-        [[maybe_unused]] g_autoptr(GDBusConnection) connection = g_bus_get_sync(G_BUS_TYPE_SYSTEM, nullptr, nullptr);
-        for (auto _ : state)
-            NotifyBare(paths);
-    };
-    Compare("notification, subscribers: " + std::to_string(count) + ", against bare", {1.03}, Clock::Wall, library, bare);
+    Drain();
 }
 
 } // namespace
 
-void AddNotifications()
+void MeasureNotifications(Table& table, const PrivateSystemBus& bus)
 {
     for (const int count : {1, 10, 100, 1000})
-        CompareFor(count);
+        CompareFor(table, bus, count);
 }
 
 } // namespace kiv::bench

@@ -1,5 +1,6 @@
+#include "BareBus.h"
+#include "BusMonitor.h"
 #include "Items.h"
-#include "PrivateSystemBus.h"
 #include "Ratios.h"
 
 #include <DADBusManager.h>
@@ -34,71 +35,35 @@ namespace kiv::bench
 namespace
 {
 
-constexpr gint64 kTime = 1'700'000'000;
+constexpr double kRoundSeconds = 1;
 
-/// Counts the bare deliveries under way.
-int underWay = 0;
-
-void BareCallDone(GObject* source, GAsyncResult* result, gpointer)
+void CompareFor(Table& table, const PrivateSystemBus& bus, int count)
 {
-    g_autoptr(GDBusProxy) proxy = G_DBUS_PROXY(source);
-    [[maybe_unused]] g_autoptr(GVariant) reply = g_dbus_proxy_call_finish(proxy, result, nullptr);
-    --underWay;
-}
+    Subscribe("push", count);
+    const std::string number = std::to_string(count);
+    const auto library = [&] { PushByLibrary(number, count); };
+    const auto bare = [&, paths = SubscriberPaths(count)] { PushBare(paths, number.c_str()); };
 
-void BareProxyDone(GObject*, GAsyncResult* result, gpointer)
-{
-    GDBusProxy* const proxy = g_dbus_proxy_new_for_bus_finish(result, nullptr);
-    g_dbus_proxy_call(proxy, "push", g_variant_new("((sssx))", "7", "data", "message", kTime), G_DBUS_CALL_FLAGS_NONE, -1, nullptr,
-        BareCallDone, nullptr);
-}
-
-void PushBare(const std::vector<std::string>& paths)
-{
-    for (const std::string& path : paths)
-    {
-        ++underWay;
-        g_dbus_proxy_new_for_bus(G_BUS_TYPE_SYSTEM, G_DBUS_PROXY_FLAGS_NONE, nullptr, kServiceName, path.c_str(), kServiceName,
-            nullptr, BareProxyDone, nullptr);
-    }
-    while (underWay > 0)
-        g_main_context_iteration(nullptr, TRUE);
-}
-
-void CompareFor(int count)
-{
-    const auto library = [count](benchmark::State& state)
-    {
-        Subscribe("push", count);
-        [[maybe_unused]] g_autoptr(GDBusConnection) connection = g_bus_get_sync(G_BUS_TYPE_SYSTEM, nullptr, nullptr);
-        const std::string service = std::to_string(count);
-        for (auto _ : state)
-        {
-            endedDeliveries = 0;
-            DADBusManager::GetInstance()->DeliverPushMessage(service.c_str(), "data", "message", kTime);
-            while (endedDeliveries < count)
-                g_main_context_iteration(nullptr, TRUE);
-        }
-    };
-    const auto bare = [count](benchmark::State& state)
-    {
-        std::vector<std::string> paths;
-        paths.reserve(static_cast<std::size_t>(count));
-        for (int number = 0; number < count; ++number)
-            paths.push_back(SubscriberPath(number));
-        [[maybe_unused]] g_autoptr(GDBusConnection) connection = g_bus_get_sync(G_BUS_TYPE_SYSTEM, nullptr, nullptr);
-        for (auto _ : state)
-            PushBare(paths);
-    };
-    Compare("push, subscribers: " + std::to_string(count) + ", against bare", {1.05}, Clock::Wall, library, bare);
+    Compare(table,
+        {"push to " + number + ", a subscriber, against bare", {1.05}, [&] { return bus.WorkNs(); }, static_cast<double>(count),
+            {library, Drain}, {bare, Drain}, {{"series", "push"}, {"subscribers", count}}, kRoundSeconds});
+    CompareMessages(table, bus, "push to " + number + ", messages on the bus", Order::Any, library, bare);
 }
 
 } // namespace
 
-void AddPushes()
+void PushByLibrary(const std::string& service, int count)
+{
+    endedDeliveries = 0;
+    DADBusManager::GetInstance()->DeliverPushMessage(service.c_str(), "data", "message", kPushTime);
+    while (endedDeliveries < count)
+        g_main_context_iteration(nullptr, TRUE);
+}
+
+void MeasurePushes(Table& table, const PrivateSystemBus& bus)
 {
     for (const int count : {1, 10, 100})
-        CompareFor(count);
+        CompareFor(table, bus, count);
 }
 
 } // namespace kiv::bench

@@ -3,7 +3,6 @@
 
 #include <DASystem.h>
 
-#include <cstdio>
 #include <cstdlib>
 #include <cstring>
 #include <glib.h>
@@ -30,8 +29,7 @@ namespace kiv::bench
 namespace
 {
 
-/// The platform calls of one IMSI query over two slots, in its order. What is allocated beyond them by the query: for each answer
-/// the reader's copy and the one handed out.
+/// The platform calls of one IMSI query over two slots, in its order.
 void ImsiCallsBare()
 {
     telephony_handle_list_s list = {};
@@ -51,45 +49,37 @@ void ImsiCallsBare()
     telephony_deinit(&list);
 }
 
-/// Tells how many copies one query makes: two an answer, the reader's and the one handed out.
-void CountCopies()
+/// One query as the library makes it.
+/// @return how many answers it gave
+int ImsiQuery(std::vector<char*>& imsis)
 {
-    std::vector<char*> imsis;
     int count = 0;
-    DASystem::GetInstance()->GetIMSIFromSim(&imsis, &count); // what is made once is made
-    copies = 0;
     DASystem::GetInstance()->GetIMSIFromSim(&imsis, &count);
-    std::printf("copies that an IMSI query over two slots makes: %d for %d answers\n", copies, count);
     for (char* const imsi : imsis)
         std::free(imsi);
+    imsis.clear();
+    return count;
 }
 
 } // namespace
 
-void AddSimQueries()
+void MeasureSimQueries(Table& table)
 {
-    CountCopies();
-    const auto library = [](benchmark::State& state)
+    constexpr int kQueries = 100;
+    std::vector<char*> imsis;
+    imsis.reserve(2);
+    ImsiQuery(imsis); // what is made once is made
+    copies = 0;
+    const int answers = ImsiQuery(imsis);
+    if (const char* const item = "copies that an IMSI query over two slots makes"; table.Wants(item))
     {
-        std::vector<char*> imsis;
-        imsis.reserve(2);
-        for (auto _ : state)
-        {
-            int count = 0;
-            DASystem::GetInstance()->GetIMSIFromSim(&imsis, &count);
-            if (count != 2)
-                state.SkipWithError("the profile must have two SIMs that answer");
-            for (char* const imsi : imsis)
-                std::free(imsi);
-            imsis.clear();
-        }
-    };
-    const auto bare = [](benchmark::State& state)
-    {
-        for (auto _ : state)
-            ImsiCallsBare();
-    };
-    Compare("IMSI query over two slots, against platform calls", {1.1, 1000}, Clock::Cpu, library, bare);
+        // The reader's and the one handed out, for each slot.
+        const Outcome outcome = answers != 2 ? Outcome::NotMeasured : copies <= 4 ? Outcome::Met : Outcome::Missed;
+        table.Add({item, "<= 4", outcome, static_cast<double>(copies), 0, 0, " texts",
+            answers == 2 ? "" : "the device must have two SIMs that answer"});
+    }
+    Compare(table, {"IMSI query over two slots, against platform calls", {1.1, 1000}, CpuNs, kQueries,
+                       {Times(kQueries, [&] { ImsiQuery(imsis); })}, {Times(kQueries, ImsiCallsBare)}});
 }
 
 } // namespace kiv::bench

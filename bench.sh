@@ -1,0 +1,41 @@
+#!/bin/bash
+# Installs what is missing, builds what is shipped, measures it, prints the table, and draws what a subscriber costs.
+set -euo pipefail
+cd "$(dirname "$(readlink -f "$0")")"
+
+usage()
+{
+    cat <<'TEXT'
+usage: ./bench.sh [--json FILE] [--only TEXT]
+  Prints a row an item: goal, what was measured, where the middle half of the rounds lies. Takes about four minutes.
+  --json FILE  writes the table there as well (otherwise to build/bench.json)
+  --only TEXT  measures the items whose text holds this, and draws nothing
+  Exit codes: 0 every goal met, 1 one missed, 2 trouble
+TEXT
+}
+
+json=$PWD/build/bench.json
+only=
+while (($#)); do
+    case "$1" in
+        --json) json=$(realpath -m "${2:?a file is needed}"); shift 2 ;;
+        --only) only=${2:?a text is needed}; shift 2 ;;
+        -h | --help) usage; exit 0 ;;
+        *) usage >&2; exit 2 ;;
+    esac
+done
+
+build()
+{
+    .ci/install-missing build bench && cmake --preset release && cmake --build --preset release --target kiv_bench
+}
+build >&2 || exit 2
+
+code=0
+build/release/bench/kiv_bench --json "$json" ${only:+--only "$only"} || code=$?
+((code < 2)) && [[ -z $only ]] || exit "$code"
+
+jq --raw-output '.[] | select(.series) | [.series, .subscribers, .library_ns, .bare_ns] | @tsv' "$json" >build/bench.tsv
+gnuplot -e 'data = "build/bench.tsv"; picture = "build/bench.svg"' bench/cost.gnuplot
+printf '\n%s\n' "Table: $json" "Picture: $PWD/build/bench.svg"
+exit "$code"
