@@ -444,13 +444,9 @@ void DASystem::GetCountryNameAlpha2FromCountryCallingCode(const char* countryCal
     const CString mcc = MccOfCallingCode(countryCallingCode, KIV_HERE);
     if (!mcc)
         return;
-    const char* found = nullptr;
-    for (const CountryInfo& row : SystemCountryInfoTable)
-    {
-        if (std::strcmp(row.mcc, mcc.get()) == 0)
-            found = row.countryCode; // an MCC that two countries share is answered by the last of them
-    }
-    *countryCode = const_cast<char*>(found);
+    // An MCC that two countries share is answered by the last of them.
+    const auto* const row = kiv::LastRow<SystemCountryInfoTable, &CountryInfo::mcc>(mcc.get());
+    *countryCode = row == nullptr ? nullptr : const_cast<char*>(row->countryCode);
 }
 
 // Notifications ----------------------------------------------------------------------------------------------------------------

@@ -60,29 +60,52 @@ struct KeyColumn
     static constexpr std::array<Word, kRows> kKeys = Packed();
 };
 
+/// A pass looks at blocks of so many keys at once, which the compiler turns into vector instructions, and then finds the row in its
+/// block.
+constexpr std::size_t kBlock = 16;
+
+/// Whether one of the keys in the block from a row on is the wanted one.
+template <class Column>
+bool BlockHolds(std::size_t row, typename Column::Word wanted)
+{
+    unsigned found = 0;
+    for (std::size_t i = 0; i < kBlock; ++i)
+        found |= static_cast<unsigned>(Column::kKeys[row + i] == wanted);
+    return found != 0;
+}
+
 /// The first row whose key equals this one to the letter; null when there is none, as for a null key.
 template <const auto& Table, auto Key>
 auto FirstRow(const char* key) -> decltype(&Table[0])
 {
     using Column = KeyColumn<Table, Key>;
-    constexpr auto& keys = Column::kKeys;
     const auto wanted = Pack<typename Column::Word>(key);
 
-    // Whole blocks are compared at once, which the compiler turns into vector instructions; the row is then found in its block.
-    constexpr std::size_t kBlock = 16;
     std::size_t row = 0;
-    for (; row + kBlock <= Column::kRows; row += kBlock)
-    {
-        unsigned found = 0;
-        for (std::size_t i = 0; i < kBlock; ++i)
-            found |= static_cast<unsigned>(keys[row + i] == wanted);
-        if (found != 0)
-            break;
-    }
+    while (row + kBlock <= Column::kRows && !BlockHolds<Column>(row, wanted))
+        row += kBlock;
     for (; row < Column::kRows; ++row)
     {
-        if (keys[row] == wanted)
+        if (Column::kKeys[row] == wanted)
             return &Table[row];
+    }
+    return nullptr;
+}
+
+/// The last row whose key equals this one; the same otherwise.
+template <const auto& Table, auto Key>
+auto LastRow(const char* key) -> decltype(&Table[0])
+{
+    using Column = KeyColumn<Table, Key>;
+    const auto wanted = Pack<typename Column::Word>(key);
+
+    std::size_t end = Column::kRows;
+    while (end >= kBlock && !BlockHolds<Column>(end - kBlock, wanted))
+        end -= kBlock;
+    for (; end > 0; --end)
+    {
+        if (Column::kKeys[end - 1] == wanted)
+            return &Table[end - 1];
     }
     return nullptr;
 }
