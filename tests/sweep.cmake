@@ -1,0 +1,7 @@
+add_library(kiv_test_operations STATIC sweep/Operations.cpp)
+target_include_directories(kiv_test_operations PUBLIC ${CMAKE_CURRENT_SOURCE_DIR} ${PROJECT_SOURCE_DIR}/platform/simulated)
+target_link_libraries(kiv_test_operations PRIVATE kiv_compile PUBLIC kiv_test_bus kiv_system ${CMAKE_DL_LIBS})
+set_property(TARGET kiv_test_operations PROPERTY KIV_UNOPTIMIZED ON)
+
+kiv_test(sweep_test sweep/Doubles.cpp sweep/Sweep.cpp sweep/platform_sweep.cpp sweep/memory_sweep.cpp)
+target_link_libraries(sweep_test PRIVATE kiv_test_operations)
