@@ -9,9 +9,3 @@ foreach(subject IN ITEMS notification outage connection)
   target_link_libraries(bus_${subject}_test PRIVATE kiv_test_bus)
 endforeach()
 target_link_libraries(bus_connection_test PRIVATE ${CMAKE_DL_LIBS})
-
-# The allocators of the sanitizers keep no account of what is in use.
-if(NOT KIV_SANITIZE)
-  kiv_test(bus_growth_test bus/growth_test.cpp bus/Subscribers.cpp)
-  target_link_libraries(bus_growth_test PRIVATE kiv_test_bus)
-endif()

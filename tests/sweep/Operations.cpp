@@ -544,6 +544,11 @@ const std::vector<Operation>& Operations()
     return operations;
 }
 
+bool IsLong()
+{
+    return std::getenv("KIV_TEST_LONG") != nullptr;
+}
+
 Session::Session()
 {
     telephony_init(&given);

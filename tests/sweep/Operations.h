@@ -70,6 +70,9 @@ struct Operation
 /// Every public member of the facade and the managers.
 const std::vector<Operation>& Operations();
 
+/// Whether a test takes its long form, for which the environment variable KIV_TEST_LONG asks.
+bool IsLong();
+
 /// What the operations need: UTC, the profile "dual" with its clock stopped, and a private bus with whom they call on it. The test
 /// fails when GLib has anything to say.
 struct World

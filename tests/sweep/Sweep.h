@@ -11,8 +11,8 @@
 namespace kiv::test
 {
 
-/// Whether a sweep takes its long form: every program of them knows the option --long.
-bool IsLong();
+/// How many calls or allocations are to fail in a row: one, two, all; more in the long form.
+std::vector<unsigned> Lengths();
 
 /// Tries operations one by one in one world, each on a device that nobody used before.
 struct Sweep : testing::Test
