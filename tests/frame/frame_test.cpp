@@ -31,7 +31,6 @@ struct
     std::set<std::string> held;
     std::vector<std::string> taken;
     int waiting = 0;
-    bool refuses = false;
 } locks;
 
 /// What an allocation without exceptions does first; false lets it fail. Empty: nothing.
@@ -48,8 +47,6 @@ std::set<std::string> HeldLocks()
 DAMutexLock::DAMutexLock(const char* name)
 {
     std::unique_lock guard(locks.mutex);
-    if (locks.refuses)
-        throw std::bad_alloc();
     ++locks.waiting;
     locks.changed.notify_all();
     locks.changed.wait(guard, [&] { return locks.held.count(name) == 0; });
@@ -79,26 +76,24 @@ using testing::IsEmpty;
 struct Class
 {
     std::string lockName;
-    std::string failure; // what is logged when there is no memory
     void* (*getInstance)();
     void* (*instance)();
     void (*forget)();
 };
 
 template <class Any>
-Class Of(const std::string& file, const char* failure)
+Class Of(const std::string& file)
 {
     static_assert(sizeof(Any) == sizeof(void*) && std::has_virtual_destructor_v<Any>);
-    return {file + "::GetInstance", "E " + file + " GetInstance > " + failure,
-        [] { return static_cast<void*>(Any::GetInstance()); }, [] { return static_cast<void*>(Any::__pInstance); },
-        [] { delete std::exchange(Any::__pInstance, nullptr); }};
+    return {file + "::GetInstance", [] { return static_cast<void*>(Any::GetInstance()); },
+        [] { return static_cast<void*>(Any::__pInstance); }, [] { delete std::exchange(Any::__pInstance, nullptr); }};
 }
 
 const Class kClasses[] = {
-    Of<DASystem>("DASystem.cpp", "CoreSystem() failed."),
-    Of<DASimManager>("DASimManager.cpp", "SimManager() failed."),
-    Of<DADBusManager>("DADBusManager.cpp", "DBusManager() failed."),
-    Of<DAConnectionManager>("DAConnectionManager.cpp", "ConnectionManager() failed."),
+    Of<DASystem>("DASystem.cpp"),
+    Of<DASimManager>("DASimManager.cpp"),
+    Of<DADBusManager>("DADBusManager.cpp"),
+    Of<DAConnectionManager>("DAConnectionManager.cpp"),
 };
 
 /// Each test starts with no instance and no lock taken.
@@ -110,11 +105,7 @@ struct Facade : testing::Test
             any.forget();
         locks.taken.clear();
     }
-    ~Facade() override
-    {
-        allocating = nullptr;
-        locks.refuses = false;
-    }
+    ~Facade() override { allocating = nullptr; }
 
     kiv::test::LogCapture log;
 };
@@ -162,23 +153,6 @@ TEST_P(Frame, GivesTwoThreadsThatComeAtTheSameMomentTheSameObject)
     EXPECT_EQ(1, made);
 }
 
-TEST_P(Frame, SaysSoWhenThereIsNoMemoryAndTriesAgain)
-{
-    allocating = [] { return false; };
-    for (int i = 0; i < 2; ++i)
-    {
-        EXPECT_EQ(nullptr, GetParam().getInstance());
-        EXPECT_EQ(nullptr, GetParam().instance());
-        EXPECT_THAT(log.Take(), ElementsAre(GetParam().failure));
-        EXPECT_THAT(HeldLocks(), IsEmpty());
-    }
-    allocating = nullptr;
-    locks.refuses = true;
-    EXPECT_EQ(nullptr, GetParam().getInstance()) << "a lock that can not be recorded throws";
-    locks.refuses = false;
-    EXPECT_NE(nullptr, GetParam().getInstance());
-}
-
 TEST_F(Facade, MakesEachManagerOnTheFirstForwardAndNotBefore)
 {
     EXPECT_TRUE(DASystem::GetInstance()->IsValidMcc("412"));
@@ -186,31 +160,6 @@ TEST_F(Facade, MakesEachManagerOnTheFirstForwardAndNotBefore)
     EXPECT_EQ(nullptr, DADBusManager::__pInstance);
     EXPECT_EQ(nullptr, DAConnectionManager::__pInstance);
     EXPECT_THAT(locks.taken, ElementsAre("DASystem.cpp::GetInstance", "DASimManager.cpp::GetInstance"));
-}
-
-TEST_F(Facade, GivesTheFailureResultsWhenItsManagersCanNotBeMade)
-{
-    DASystem& facade = *DASystem::GetInstance();
-    allocating = [] { return false; };
-    char text[] = "before";
-    char* out = text;
-    int ids[] = {7};
-    char* statuses[] = {text};
-    EXPECT_FALSE(facade.IsValidMcc("412"));
-    EXPECT_FALSE(facade.IsMoSupportMcc("505"));
-    facade.GetCountryNameFromMcc("412", &out);
-    EXPECT_EQ(nullptr, out) << "as after a miss";
-    out = text;
-    facade.GetCountryNameFromCountryCallingCode("93", &out);
-    facade.GetCountryNameAlpha2FromCountryCallingCode("93", &out);
-    EXPECT_EQ(text, out) << "as after a calling code that nobody has";
-    const char* id = text;
-    EXPECT_EQ(4, facade.GetDeviceUniqueID(&id));
-    EXPECT_EQ(nullptr, id);
-    EXPECT_EQ(4, facade.SendNotiToServiceManager(KIV_NOTI_TYPE_STATUS_ON, "450", 7, nullptr, nullptr, nullptr, nullptr));
-    EXPECT_EQ(0, facade.SendMultiOnOffNotiToServiceManager("450", 1, ids, statuses));
-    EXPECT_EQ(nullptr, DASimManager::__pInstance);
-    EXPECT_EQ(nullptr, DADBusManager::__pInstance);
 }
 
 } // namespace

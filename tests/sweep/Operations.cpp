@@ -112,7 +112,8 @@ struct Argument
         if constexpr (kIsTextOut<Type>)
             told = keepsTexts ? Tell(value == nullptr ? "null" : value) : Take(value);
         else if constexpr (kIsOneOf<Type, tm*>)
-            told = Tell(value.tm_year, value.tm_mday, value.tm_sec);
+            told = Tell(value.tm_year, value.tm_mon, value.tm_mday, value.tm_hour, value.tm_min, value.tm_sec, value.tm_wday,
+                value.tm_yday);
         else if constexpr (kIsOneOf<Type, std::vector<char*>*>)
             for (char* const text : value)
                 told += Take(text);
@@ -420,7 +421,8 @@ void AddFacade(Table& t)
     t.Add<int(char**)>(&S::GetTizenIdN, {}, {"0 h7q3kz0r5fT9wPq"});
     t.Fails(info, {"-77 before", "E > system_info_get_platform_string failed [-77]"}).WithoutMemory({"-12 before"});
     t.Add<int(int*)>(&S::GetFontSize, {}, {"0 1"}).Fails({Call::system_settings_get_value_int}, {"-77"});
-    t.Add<int(tm*)>(&S::GetCurrentTime, {}, {"0 123 14 20"}).Fails({Call::alarm_get_current_time}, {"-77 0 0 0*"});
+    t.Add<int(tm*)>(&S::GetCurrentTime, {}, {"0 123 10 14 22 13 20 2 317"})
+        .Fails({Call::alarm_get_current_time}, {"-77 0 0 0 0 0 0 0 0*"});
     t.Add<int(Text, char**)>(&S::GetPackageVersion, {"org.example.mail"}, {"0 3.0.17"});
     t.Fails({Call::package_info_create}, {"-77 before", "E > package_info_create failed [-77]"});
     t.Fails({Call::package_info_get_version}, {"-77 before"}).WithoutMemory({"-12 before"});

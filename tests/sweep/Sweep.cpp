@@ -42,7 +42,7 @@ std::vector<std::string> Words(const std::string& text)
 std::vector<unsigned> Lengths()
 {
     constexpr unsigned kAll = 1'000'000;
-    return IsLong() ? std::vector<unsigned>{1, 2, 3, 4, 5, 6, 8, 12, kAll} : std::vector<unsigned>{1, 2, kAll};
+    return IsLong() ? std::vector<unsigned>{1, 2, 3, 4, 5, 6, 8, 12, kAll} : std::vector<unsigned>{1, 2, 3, kAll};
 }
 
 Sweep::Sweep()

@@ -11,7 +11,7 @@
 namespace kiv::test
 {
 
-/// How many calls or allocations are to fail in a row: one, two, all; more in the long form.
+/// How many calls or allocations are to fail in a row: one, two, three, all; more in the long form.
 std::vector<unsigned> Lengths();
 
 /// Tries operations one by one in one world, each on a device that nobody used before.

@@ -155,9 +155,9 @@ struct MemorySweep : Sweep
     {
         const auto arm = [&]
         {
-            PrepareInstances(operation, isFirstUse);
             if (isFirstUse)
                 lockNames.clear();
+            PrepareInstances(operation, isFirstUse);
             log.Take();
             isLockRefused = [] { return injection.isArmed && FailsNext(); };
             injection = {true, first, last};
