@@ -256,6 +256,8 @@ std::string Listen(Session&)
     using C = DAConnectionManager;
     Listener listener;
     S::GetInstance()->SetConnectionEventListener(&listener, nullptr);
+    for (const bool isOn : {false, true})
+        sim::ChangeDevice([&](sim::Device& device) { device.packetData = isOn; });
     C::wifi_device_state_changed(WIFI_DEVICE_STATE_ACTIVATED, nullptr);
     C::wifi_connection_state_changed(WIFI_CONNECTION_STATE_CONNECTED, nullptr, nullptr);
     for (const auto key :
@@ -282,7 +284,7 @@ void AddConnection(Table& t)
     t.AddRun({SymbolOf<void (S::*)(IDAConnectionStateListener*, void*)>(&S::SetConnectionEventListener),
                  SymbolOf(&C::wifi_device_state_changed), SymbolOf(&C::wifi_connection_state_changed),
                  SymbolOf(&C::OnConnectionStateChanged)},
-        Listen<S>, {"device 1 connection 3 wifi false packet true flight true"});
+        Listen<S>, {"packet false packet true device 1 connection 3 wifi false packet true flight true"});
 }
 
 template <class S>
@@ -516,6 +518,7 @@ void AddBusManager(Table& t)
 template <class S>
 void AddInstance(Table& t, const char* file, const std::string& failure)
 {
+    static_assert(sizeof(S) == sizeof(void*) && std::has_virtual_destructor_v<S>, "no data, and a destructor that is virtual");
     t.file = file;
     t.AddRun({SymbolOf(&S::GetInstance)}, [](Session&) { return S::GetInstance() == nullptr ? " none" : " one"; }, {"one"});
     t.Fails({}, {"none", "E > " + failure + " failed."});
@@ -563,7 +566,7 @@ Session::~Session()
 }
 
 World::World()
-    : directory(g_dir_make_tmp("kiv-sweep-XXXXXX", nullptr)),
+    : directory(mkdtemp((std::filesystem::temp_directory_path() / "kiv-sweep-XXXXXX").string().data())),
       board(bus, "org.tizen.system.deviced", Peer::Reply("('KIV0123456789',)")),
       serviceManager(bus, "org.tizen.servicemanager.service"),
       client(bus, "org.example.client")

@@ -28,6 +28,7 @@ struct Injection
     bool isArmed = false;
     unsigned first = 0, last = 0; ///< those that fail
     unsigned seen = 0, failed = 0;
+    const char* lockOfInstance = ""; ///< held when the last instance was made
 };
 thread_local Injection injection;
 
@@ -99,6 +100,8 @@ void* operator new(std::size_t size)
 
 void* operator new(std::size_t size, const std::nothrow_t&) noexcept
 {
+    if (injection.isArmed)
+        injection.lockOfInstance = kiv::test::heldLock;
     return Fails(__builtin_return_address(0)) ? nullptr : KIV_MALLOC(size);
 }
 
@@ -160,7 +163,7 @@ struct MemorySweep : Sweep
             PrepareInstances(operation, isFirstUse);
             log.Take();
             isLockRefused = [] { return injection.isArmed && FailsNext(); };
-            injection = {true, first, last};
+            injection = {true, first, last, 0, 0, ""};
         };
         const auto disarm = [&]
         {
@@ -223,6 +226,29 @@ TEST_F(MemorySweep, GivesFailureResultsWhicheverAllocationFails)
     }
     std::cout << injections << " allocations failed\n";
     EXPECT_GT(injections, 10'000U);
+}
+
+TEST_F(MemorySweep, MakesEachInstanceUnderItsNamedLockOnFirstUseAndNotBefore)
+{
+    const std::pair<std::string, std::string> expected[] = {{"DASystem::GetInstance()", "DASystem.cpp::GetInstance"},
+        {"DASimManager::GetInstance()", "DASimManager.cpp::GetInstance"},
+        {"DADBusManager::GetInstance()", "DADBusManager.cpp::GetInstance"},
+        {"DAConnectionManager::GetInstance()", "DAConnectionManager.cpp::GetInstance"}, {"DASystem::IsFlightMode()", ""},
+        {"DASystem::IsValidMcc(char*)", "DASimManager.cpp::GetInstance"},
+        {"DASystem::GetBTNetworkState()", "DAConnectionManager.cpp::GetInstance"},
+        {"DASystem::GetDeviceUniqueID(char const**)", "DADBusManager.cpp::GetInstance"}};
+    for (const auto& [name, lock] : expected)
+    {
+        const auto isIt = [&, wanted = name](const Operation& operation) { return operation.name == wanted; };
+        const Operation& operation = *std::find_if(Operations().begin(), Operations().end(), isIt);
+        isFirstUse = true;
+        EXPECT_EQ(operation.good, TryFailing(operation, 0, 0));
+        EXPECT_EQ(lock, injection.lockOfInstance) << name;
+        EXPECT_EQ(lock.empty() ? 0U : 1U, lockNames.count(lock));
+        isFirstUse = false;
+        TryFailing(operation, 0, 0);
+        EXPECT_STREQ("", injection.lockOfInstance) << name << " made another";
+    }
 }
 
 } // namespace

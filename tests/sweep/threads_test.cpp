@@ -24,22 +24,18 @@ thread_local const Operation* current = nullptr;
 /// Subscribes and unsubscribes in another process, once it reads where the store is from a pipe. Started before there are threads.
 pid_t ChangeStoreElsewhere(int pathPipe, const char* busname)
 {
+    using Store = DASubscriberStore;
     const pid_t process = fork();
     if (process != 0)
         return process;
     char path[256] = "";
     bool isRight = read(pathPipe, path, sizeof path) == sizeof path;
     setenv("KIV_SUBSCRIBERS", path, 1);
+    const DASubscription subscription{"push", "6", {busname, "/x", "a.b"}};
     std::string reason;
     for (int i = 0; i < 50 && isRight; ++i)
-    {
-        for (const char* const key : {"all", "6"})
-            isRight = isRight &&
-                      DASubscriberStore().Add({"push", key, {busname, "/x", "a.b"}}, reason) == DASubscriberStore::Outcome::Done;
-        for (const char* const key : {"all", "6"})
-            isRight = isRight &&
-                      DASubscriberStore().Remove({"push", key, {busname, "/x", "a.b"}}, reason) == DASubscriberStore::Outcome::Done;
-    }
+        isRight = Store().Add(subscription, reason) == Store::Outcome::Done &&
+                  Store().Remove(subscription, reason) == Store::Outcome::Done;
     _exit(isRight ? 0 : 1);
 }
 
@@ -57,36 +53,15 @@ std::string CheckSimAccess(Call call, int)
     return "";
 }
 
-void RunAll(std::size_t start, int rounds)
+void RunAll(const std::vector<const Operation*>& operations, std::size_t start, int rounds)
 {
-    const auto& operations = Operations();
     for (std::size_t i = 0; i < operations.size() * static_cast<std::size_t>(rounds); ++i)
     {
-        const Operation& operation = operations[(start + i) % operations.size()];
-        if (operation.kind == Kind::kListener)
-            continue;
+        const Operation& operation = *operations[(start + i) % operations.size()];
         Session session;
         current = &operation;
         EXPECT_EQ(operation.good[0], operation.run(session)) << operation.name;
         current = nullptr;
-    }
-}
-
-/// Registers and unregisters on the thread on which the changes arrive. What changes is no answer of another operation.
-void Listen(int rounds)
-{
-    const auto& operations = Operations();
-    for (int i = 0; i < rounds; ++i)
-    {
-        for (const Operation& operation : operations)
-        {
-            if (operation.kind != Kind::kListener)
-                continue;
-            Session session;
-            sim::ChangeDevice([](sim::Device& device) { device.packetData = true; });
-            EXPECT_EQ(operation.good[0], operation.run(session));
-            sim::ChangeDevice([](sim::Device& device) { device.packetData = false; });
-        }
     }
 }
 
@@ -105,6 +80,9 @@ TEST(Threads, DoNotDisturbEachOther)
         ASSERT_EQ(static_cast<ssize_t>(sizeof path), write(pathPipe[1], path, sizeof path));
     sim::SetCallHook(CheckSimAccess);
 
+    std::vector<const Operation*> any, listening; // the latter on the thread that the changes arrive on
+    for (const Operation& operation : Operations())
+        (operation.kind == Kind::kListener ? listening : any).push_back(&operation);
     const int rounds = IsLong() ? 200 : 5;
     std::vector<std::thread> threads;
     std::atomic<int> running{0};
@@ -120,8 +98,8 @@ TEST(Threads, DoNotDisturbEachOther)
             });
     };
     for (std::size_t i = 0; i < 8; ++i)
-        start([=] { RunAll(i * 16, rounds); });
-    start([=] { Listen(rounds * 20); });
+        start([&, i] { RunAll(any, i * 16, rounds); });
+    start([&] { RunAll(listening, 0, rounds * 20); });
     while (running > 0)
         g_main_context_iteration(nullptr, TRUE);
     for (std::thread& thread : threads)
