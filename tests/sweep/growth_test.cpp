@@ -53,8 +53,8 @@ TEST_F(Growth, OfEachOperationIsNextToNothingInAThreadWithoutAMainLoop)
     {
         int error = 0; // held in the short form, since to connect for each call takes ten times as long
         const Connection connection(IsLong() ? nullptr : DADBusManager::GetInstance()->InitDbusConnection(&error));
-        const bool isShort = operation.kind == Kind::kBus && !IsLong();
-        const double bytes = BytesPerCall(isShort ? 300 : 5000,
+        const int shortly = operation.kind == Kind::kBus ? 300 : 1000;
+        const double bytes = BytesPerCall(IsLong() ? 5000 : shortly,
             [&](int)
             {
                 Session session;
