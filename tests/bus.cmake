@@ -13,9 +13,3 @@ target_link_libraries(bus_connection_test PRIVATE ${CMAKE_DL_LIBS})
 get_test_property(bus_kill_test ENVIRONMENT environment)
 list(REMOVE_ITEM environment G_DEBUG=fatal-criticals)
 set_tests_properties(bus_kill_test PROPERTIES ENVIRONMENT "${environment}")
-
-# The allocators of the sanitizers keep no account of what is in use.
-if(NOT KIV_SANITIZE)
-  kiv_test(bus_growth_test bus/growth_test.cpp bus/Subscribers.cpp)
-  target_link_libraries(bus_growth_test PRIVATE kiv_test_bus)
-endif()

@@ -1,4 +1,2 @@
-kiv_test(facade_test device/facade_test.cpp)
-kiv_test(device_test device/device_test.cpp)
-kiv_test(language_test device/language_test.cpp)
-target_compile_definitions(language_test PRIVATE KIV_TEST_DATA="${CMAKE_CURRENT_SOURCE_DIR}/data")
+kiv_test(device_test device/connection_test.cpp device/device_test.cpp device/language_test.cpp)
+target_compile_definitions(device_test PRIVATE KIV_TEST_DATA="${CMAKE_CURRENT_SOURCE_DIR}/data")

@@ -1,5 +1,3 @@
-kiv_test(frame_test frame/frame_test.cpp)
-
 # The sanitizers put guard bytes behind a table and symbols of their own beside it.
 if(NOT KIV_SANITIZE)
   add_test(NAME exported_symbols COMMAND ${CMAKE_COMMAND} -DNM=${CMAKE_NM} -DLIBRARY=$<TARGET_FILE:kiv_system>

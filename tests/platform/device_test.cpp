@@ -72,25 +72,4 @@ TEST_F(DeviceTest, TellsWhatIsOpenAndWhatWasUsedWrongly)
             "connection_destroy: needs a connection handle, got what never was a handle"));
 }
 
-TEST_F(DeviceTest, FailsTheCallsThatItIsToldToAndWritesDownWhatTheyGave)
-{
-    // The hook's own calls go without it.
-    SetCallHook([](Call /*call*/, int /*slot*/) { return std::to_string(tel_deinit(tel_init("modem0"))); });
-    FailCall(Call::tel_get_sim_imsi, -5, Only(2), 1);
-    StartJournal();
-    TapiHandle* const modems[] = {tel_init("modem0"), tel_init("modem1")};
-    TelSimImsiInfo_t imsi{};
-    for (const int slot : {1, 0, 1, 1})
-        tel_get_sim_imsi(modems[slot], &imsi);
-    StopJournal();
-    tel_deinit(modems[0]);
-
-    std::vector<std::string> told;
-    for (const JournalEntry& entry : TakeJournal())
-        if (!entry.note.empty())
-            told.push_back(NameOf(entry.call) + std::to_string(entry.slot) + " gave " + std::to_string(entry.result));
-    EXPECT_THAT(told, testing::ElementsAre("tel_init0 gave 0", "tel_init1 gave 0", "tel_get_sim_imsi1 gave 0",
-                          "tel_get_sim_imsi0 gave 0", "tel_get_sim_imsi1 gave -5", "tel_get_sim_imsi1 gave 0"));
-}
-
 } // namespace

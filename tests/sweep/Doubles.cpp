@@ -1,10 +1,11 @@
-// The named locks and sleep() of this program stand in front of those that the library links.
-#include "sim/SimTest.h"
+#include "sweep/Doubles.h"
 
 #include <DAMutex.h>
 
-#include <cstring>
+#include <gtest/gtest.h>
+
 #include <new>
+#include <string>
 #include <unistd.h>
 #include <utility>
 
@@ -13,11 +14,21 @@ using namespace kiv::test;
 namespace
 {
 
-char* Make(const char* name)
+void* Make(const char* name)
 {
-    if (refusedLock > 0 && std::strcmp(name, kSimAccess) == 0 && --refusedLock == 0)
+    if (lockNames.count(name) == 0 && isLockRefused && isLockRefused())
         throw std::bad_alloc();
-    return const_cast<char*>(name);
+    return const_cast<char*>(lockNames.insert(name).first->c_str());
+}
+
+void Hold(void* lock)
+{
+    EXPECT_STREQ("", std::exchange(heldLock, static_cast<char*>(lock)));
+}
+
+void Release(void* lock)
+{
+    EXPECT_EQ(lock, std::exchange(heldLock, ""));
 }
 
 } // namespace
@@ -27,22 +38,22 @@ DAMutex::~DAMutex() {}
 
 void DAMutex::Lock()
 {
-    EXPECT_STREQ("", std::exchange(heldLock, static_cast<char*>(lock_)));
+    Hold(lock_);
 }
 
 void DAMutex::Unlock()
 {
-    EXPECT_EQ(lock_, std::exchange(heldLock, ""));
+    Release(lock_);
 }
 
 DAMutexLock::DAMutexLock(const char* name) : lock_(Make(name))
 {
-    EXPECT_STREQ("", std::exchange(heldLock, name));
+    Hold(lock_);
 }
 
 DAMutexLock::~DAMutexLock()
 {
-    EXPECT_EQ(lock_, std::exchange(heldLock, ""));
+    Release(lock_);
 }
 
 extern "C" unsigned sleep(unsigned seconds)

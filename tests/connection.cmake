@@ -1,1 +1,0 @@
-kiv_test(connection_test connection/connection_test.cpp)

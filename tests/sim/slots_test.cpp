@@ -1,0 +1,256 @@
+// The facade's questions about all SIMs, each beside what its contract makes of a device; slots that are not there; and values that
+// no profile holds.
+#include "sweep/Sweep.h"
+
+#include <DASimManager.h>
+#include <DASystem.h>
+
+#include <algorithm>
+#include <climits>
+#include <numeric>
+
+namespace
+{
+
+using namespace kiv::test;
+namespace sim = kiv::sim;
+
+enum class Sim
+{
+    kAnswers,
+    kSilent, ///< usable, without IMSI and number
+    kLocked
+};
+using Sims = std::vector<Sim>;
+
+std::string Line(const std::string& function, const std::string& text)
+{
+    return "E DASimManager.cpp " + function + " > " + text;
+}
+const std::string kNotAvailable = Line("IsSimAvailable", "Sim is not available");
+
+struct Slots : Sweep
+{
+    static const Operation& Find(const std::string& name)
+    {
+        const auto isIt = [&](const Operation& operation) { return operation.name == name; };
+        return *std::find_if(Operations().begin(), Operations().end(), isIt);
+    }
+
+    Story Ask(const Operation& operation)
+    {
+        return Try(
+            operation, [] {}, [] {});
+    }
+
+    void Insert(const Sims& sims)
+    {
+        const std::vector<sim::SimSlot> slots = {{"modem0", {3}, {}, "450", "05", "0123456780", "", {}},
+            {"modem1", {3}, {}, "451", "012", "0123456781", "+491515550001", {}},
+            {"modem2", {3}, {}, "452", "99", "0123456782", "0002", {}}};
+        device.slots.assign(slots.begin(), slots.begin() + static_cast<std::ptrdiff_t>(sims.size()));
+        for (std::size_t slot = 0; slot < sims.size(); ++slot)
+        {
+            if (sims[slot] == Sim::kLocked)
+                device.slots[slot].cardStatus = {4};
+            if (sims[slot] == Sim::kSilent)
+                device.slots[slot].mcc = device.slots[slot].number = std::nullopt;
+        }
+    }
+
+    /// @param texts  what a member reads of the SIMs, in slot order
+    void ExpectTexts(const Sims& sims, const std::string& member, const std::string& failure, const Story& texts)
+    {
+        Story first{member.find("Phone") == 0 ? "-39841791 before" : "4 before"}, every{"before"};
+        int count = 0;
+        for (std::size_t slot = 0; slot < sims.size(); ++slot)
+        {
+            Story lines;
+            if (sims[slot] == Sim::kLocked)
+                lines.push_back(kNotAvailable);
+            if (sims[slot] != Sim::kAnswers)
+                lines.push_back(Line("Get" + member + "FromSim", "fail to get " + failure));
+            every.insert(every.end(), lines.begin(), lines.end());
+            if (count == 0)
+                first.insert(first.end(), lines.begin(), lines.end());
+            if (sims[slot] != Sim::kAnswers)
+                continue;
+            every[0] += ' ' + texts[slot];
+            first[0] = ++count == 1 ? "0 " + texts[slot] : first[0];
+        }
+        every[0] += ' ' + std::to_string(count);
+        EXPECT_EQ(first, Ask(Find("DASystem::Get" + member + "FromSim(char**)")));
+        const std::string vector = "std::vector<char*, std::allocator<char*> >*";
+        EXPECT_EQ(every, Ask(Find("DASystem::Get" + member + "FromSim(" + vector + ", int*)")));
+    }
+};
+
+TEST_F(Slots, AnswerTheFacadeInEveryPatternOfUpToThree)
+{
+    std::vector<Sims> patterns = {{}};
+    for (std::size_t i = 0; i < patterns.size(); ++i)
+    {
+        const Sims sims = patterns[i];
+        for (const Sim next : {Sim::kAnswers, Sim::kSilent, Sim::kLocked})
+        {
+            if (sims.size() < 3)
+                patterns.insert(patterns.end(), sims)->push_back(next);
+        }
+        if (sims.empty())
+            continue; // as when telephony can not be opened
+        SCOPED_TRACE(testing::PrintToString(sims));
+        Insert(sims);
+        ExpectTexts(sims, "MCC", "MCC", {"450", "451", "452"});
+        ExpectTexts(sims, "MNC", "MNC", {"05", "012", "99"});
+        ExpectTexts(sims, "IMSI", "imsi", {"450050123456780", "4510120123456781", "452990123456782"});
+        ExpectTexts(sims, "PhoneNumber", "phoneNumber", {"", "+491515550001", "0002"});
+
+        const auto usable = std::find_if(sims.begin(), sims.end(), [](Sim sim) { return sim != Sim::kLocked; });
+        Story any{usable != sims.end() ? "true" : "false"}, exists = any;
+        any.resize(1 + static_cast<std::size_t>(usable - sims.begin()), kNotAvailable);
+        for (std::size_t slot = 0; slot < sims.size(); ++slot)
+        {
+            if (sims[slot] == Sim::kLocked)
+                exists.push_back(Line("IsSimExist", "SIM STATE[" + std::to_string(slot) + "] : TELEPHONY_SIM_STATE_LOCKED"));
+        }
+        EXPECT_EQ(any, Ask(Find("DASystem::IsSimAvailable()")));
+        EXPECT_EQ(exists, Ask(Find("DASystem::IsSimExist()")));
+        Story dual{"true"};
+        if (sims.size() < 2)
+            dual = {"false", "E DASystem.cpp IsDualSimAvailable > [Single Sim Device] Not support Dual Sim."};
+        else if (sims[0] == Sim::kLocked || sims[1] == Sim::kLocked)
+            dual = {"false", kNotAvailable};
+        EXPECT_EQ(dual, Ask(Find("DASystem::IsDualSimAvailable()")));
+    }
+    EXPECT_EQ(1U + 3 + 9 + 27, patterns.size());
+}
+
+TEST_F(Slots, ThatAreNotThereFailWithoutACallToAModem)
+{
+    for (const int slot : {-1, 2, INT_MAX, INT_MIN})
+    {
+        auto& manager = *DASimManager::GetInstance();
+        const auto run = [&](Session& session) -> std::string
+        {
+            char* text = nullptr;
+            const char* mcc = nullptr;
+            bool isRoaming = true;
+            auto status = TAPI_SIM_STATUS_UNKNOWN;
+            int serviceType = 0;
+            const bool isAnyDone =
+                manager.IsSimAvailable(session.given, slot) || manager.IsAvaliableState(slot, &status) ||
+                manager.IsAvaliableSendSMS(slot, &status, &serviceType) || manager.GetRoamingStatus(slot, &isRoaming) ||
+                manager.GetMCCFromSim(session.given, slot, &mcc) == 0 || manager.GetIMSIFromSim(session.given, slot, &text) == 0 ||
+                manager.GetPhoneNumberFromSim(session.given, slot, &text) == 0 ||
+                manager.IsAvaliableSimStateOnPolling(slot, 0, &status);
+            return isAnyDone || !isRoaming ? "done" : "failed";
+        };
+        const auto onCall = [](Call call, int)
+        {
+            const Calls harmless{Call::telephony_init, Call::telephony_deinit, Call::tel_get_cp_name_list};
+            EXPECT_THAT(harmless, testing::Contains(call)) << sim::NameOf(call);
+            return "";
+        };
+        EXPECT_EQ("failed",
+            Try(
+                {{}, "", {}, {}, false, run, {}, {}, {}}, [&] { sim::SetCallHook(onCall); }, [] { sim::SetCallHook(nullptr); })[0]);
+        EXPECT_EQ(100, pauses) << "of the one that waits for a modem";
+    }
+}
+
+TEST_F(Slots, AreJudgedByWhatTheModemSays)
+{
+    const auto state = [](const char* name) { return Story{"true", Line("IsSimExist", "SIM STATE[1] : " + std::string(name))}; };
+    const auto service = [](const char* told, const char* type) {
+        return Story{told, Line("IsAvaliableSendSMS", "NetworkSvc[" + std::string(type) + ']')};
+    };
+    const char kExist[] = "DASystem::IsSimExist()", kRoaming[] = "DASystem::GetRoamingStatus(int, bool*)",
+               kSms[] = "DASystem::IsAvaliableSendSMS(int, TelSimCardStatus_t*, int*)";
+    const struct
+    {
+        const char* operation;
+        void (*change)(sim::SimSlot& slot);
+        Story story;
+    } cases[] = {
+        {kExist, [](sim::SimSlot& slot) { slot.simState = 0; }, state("TELEPHONY_SIM_STATE_UNAVAILABLE")},
+        {kExist, [](sim::SimSlot& slot) { slot.simState = 3; }, state("TELEPHONY_SIM_STATE_UNKNOWN")},
+        {kExist, [](sim::SimSlot& slot) { slot.simState = 4; }, state("-")},
+        {"DASimManager::IsSimAvailable(telephony_handle_list_s, int)", [](sim::SimSlot& slot) { slot.simState = 3; },
+            {"false", kNotAvailable}},
+        {kRoaming, [](sim::SimSlot& slot) { slot.serviceState = 2; }, {"false true"}},
+        {kRoaming, [](sim::SimSlot& slot) { slot.roaming = true; }, {"true true"}},
+        {kSms, [](sim::SimSlot& slot) { slot.serviceType = 3; }, service("false", "3")},
+        {kSms, [](sim::SimSlot& slot) { slot.serviceType = 4; }, service("true 3 4", "4")},
+        {kSms, [](sim::SimSlot& slot) { slot.cardStatus = {99}; }, service("true 99 6", "6")},
+    };
+    for (const auto& [name, change, story] : cases)
+    {
+        Use("dual");
+        change(device.slots[1]);
+        EXPECT_EQ(story, Ask(Find(name))) << name;
+    }
+}
+
+// How the card statuses 0 to 14 are judged: yes, no, wait. 255 is judged as 2; any other, as 0.
+// status                     0    5    10  14
+constexpr char kUsable[] = "nnnynnnnnnnnnnn";
+constexpr char kPolled[] = "nnwywwnwwwwnwnw";
+constexpr char kWaiting[] = "nnynyynyyyynynn";
+
+struct CardStatus : Slots
+{
+    /// @param script  the statuses of the card
+    /// @param read    those that are read; none when no modem opens
+    /// @param waits   between the reads
+    void ExpectPolling(const std::vector<int>& script, const std::vector<int>& read, int waits, int failedOpenings = 0,
+        Call failing = Call::tel_init, sim::CallNumbers which = {0, 0})
+    {
+        const std::string place = " DASimManager.cpp IsAvaliableSimStateOnPolling > ", waited = std::to_string(waits);
+        const bool isUsable = !read.empty() && read.back() == TAPI_SIM_STATUS_SIM_INIT_COMPLETED;
+        Story story{isUsable ? "true 3" : "false"};
+        for (int attempt = 1; attempt <= failedOpenings; ++attempt)
+            story.push_back('E' + place + "wait tel_init[" + std::to_string(attempt) + ']');
+        for (const int status : read)
+            story.push_back('I' + place + "current SIM Status[" + std::to_string(status) + ']');
+        story.push_back(read.empty() ? 'E' + place + "TapiHandle is null. fail."
+                                     : 'I' + place + "slotNum[1], result[" + (isUsable ? '1' : '0') + "], status[" +
+                                           std::to_string(read.back()) + "], time[" + waited + ']');
+        device.slots[1].cardStatus = script;
+        const Operation& polling = Find("DASystem::IsAvaliableSimStateOnPolling(int, int, TelSimCardStatus_t*)");
+        EXPECT_EQ(story, Try(
+                             polling, [&] { sim::FailCall(failing, -17, which); }, sim::ClearFaults));
+        EXPECT_EQ(failedOpenings + waits, pauses);
+    }
+};
+
+TEST_F(CardStatus, IsJudgedThreeWays)
+{
+    std::vector<int> values(21);
+    std::iota(values.begin(), values.end(), 0);
+    values.insert(values.end(), {254, 255, 256, -1, -3, -255, INT_MIN, INT_MAX});
+    for (const int value : values)
+    {
+        const auto column = static_cast<std::size_t>(value == 255 ? 2 : value >= 0 && value <= 14 ? value : 0);
+        auto status = static_cast<TelSimCardStatus_t>(value);
+        EXPECT_EQ(kWaiting[column] == 'y', DASystem::GetInstance()->IsWaittingSimCheck(status)) << value;
+        const int waits = kPolled[column] == 'w' ? 1 : 0;
+        ExpectPolling({value, 3}, waits > 0 ? std::vector{value, 3} : std::vector{value}, waits);
+
+        sim::ChangeDevice([&](sim::Device& changed) { changed.slots[0].cardStatus = {value}; });
+        EXPECT_EQ(kUsable[column] == 'y', DASystem::GetInstance()->IsAvaliableState(0, &status)) << value;
+        EXPECT_EQ(value, status);
+    }
+}
+
+TEST_F(CardStatus, IsPolledOnceASecondUntilItIsDecidedWhicheverCallFails)
+{
+    ExpectPolling({2, 2, 4, 3}, {2, 2, 4, 3}, 3);
+    ExpectPolling({255, 14, 14, 11}, {255, 14, 14, 11}, 3);
+    ExpectPolling({3}, {}, 0, 100, Call::tel_get_cp_name_list, sim::Only(1));
+    ExpectPolling({3}, {}, 0, 100, Call::tel_init, sim::kEveryCall);
+    ExpectPolling({3}, {3}, 0, 99, Call::tel_init, {1, 99});
+    ExpectPolling({2, 3}, {2, 3}, 3, 0, Call::tel_get_sim_init_info, {2, 3});
+    ExpectPolling({2, 6}, {2, 6}, 401, 0, Call::tel_get_sim_init_info, {1, 400});
+}
+
+} // namespace

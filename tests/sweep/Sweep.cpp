@@ -1,0 +1,130 @@
+#include "sweep/Sweep.h"
+
+#include <algorithm>
+#include <cstring>
+#include <sstream>
+
+namespace kiv::test
+{
+
+namespace
+{
+
+World& TheWorld()
+{
+    static World world;
+    return world;
+}
+
+constexpr char kManySlots[] = "dual, eight times over";
+
+/// A line whatever the numbers in it are.
+std::string AnyNumber(std::string line)
+{
+    const auto isOfNumber = [](char ch) { return std::strchr("-0123456789", ch) != nullptr; };
+    line.erase(std::remove_if(line.begin(), line.end(), isOfNumber), line.end());
+    return line;
+}
+
+bool Has(const std::vector<std::string>& texts, const std::string& text)
+{
+    return std::find(texts.begin(), texts.end(), text) != texts.end();
+}
+
+std::vector<std::string> Words(const std::string& text)
+{
+    std::istringstream in(text);
+    return {std::istream_iterator<std::string>(in), {}};
+}
+
+} // namespace
+
+std::vector<unsigned> Lengths()
+{
+    constexpr unsigned kAll = 1'000'000;
+    return IsLong() ? std::vector<unsigned>{1, 2, 3, 4, 5, 6, 8, 12, kAll} : std::vector<unsigned>{1, 2, 3, kAll};
+}
+
+Sweep::Sweep()
+{
+    TheWorld();
+    Use("dual");
+}
+
+Sweep::~Sweep()
+{
+    sim::ResetDevice();
+}
+
+std::vector<std::string> Sweep::Devices()
+{
+    std::vector<std::string> names{kManySlots};
+    for (const sim::Profile& profile : sim::ListProfiles())
+        names.push_back(profile.name);
+    return names;
+}
+
+void Sweep::Use(const std::string& name)
+{
+    World::Use(name == kManySlots ? "dual" : name);
+    device = sim::GetDevice();
+    while (name == kManySlots && device.slots.size() < 16)
+    {
+        device.slots.push_back(device.slots[device.slots.size() % 2]);
+        device.slots.back().cpName += '_' + std::to_string(device.slots.size());
+    }
+}
+
+Story Sweep::Try(const Operation& operation, const std::function<void()>& arm, const std::function<void()>& disarm)
+{
+    sim::SetDevice(device);
+    pauses = 0;
+    Story story;
+    {
+        Session session;
+        log.Take();
+        arm();
+        story.push_back(operation.run(session));
+        disarm();
+        const Story lines = log.Take();
+        story.insert(story.end(), lines.begin(), lines.end());
+    }
+    if (operation.kind == Kind::kPush)
+        TheWorld().FinishPushes();
+    EXPECT_THAT(sim::OpenHandles(), testing::IsEmpty());
+    EXPECT_THAT(sim::TakeMisuses(), testing::IsEmpty());
+    EXPECT_STREQ("", heldLock);
+    return story;
+}
+
+testing::AssertionResult Sweep::MayBe(const Operation& operation, const Story& story, const Story& untouched) const
+{
+    Story texts{untouched[0]}, lines(untouched.begin() + 1, untouched.end());
+    for (const Failing& each : operation.failing)
+    {
+        texts.push_back(each.story[0]);
+        lines.insert(lines.end(), each.story.begin() + 1, each.story.end());
+    }
+    texts.insert(texts.end(), operation.noMemory.begin(), operation.noMemory.end());
+    std::transform(lines.begin(), lines.end(), lines.begin(), AnyNumber);
+
+    std::vector<std::string> words = Words(untouched[0] + " before true false 0 1 2 3 4 5 6 7 8 9 10 11 12 13 14 15");
+    for (const sim::SimSlot& slot : device.slots)
+    {
+        const std::string mcc = slot.mcc.value_or(""), mnc = slot.mnc.value_or("");
+        words.insert(words.end(), {mcc, mnc, mcc + mnc + slot.msin.value_or(""), slot.number.value_or(""), slot.imei.value_or("")});
+    }
+    const std::vector<std::string> told = Words(story[0]);
+    const bool isPartial = operation.kind != Kind::kSingle &&
+                           std::all_of(told.begin(), told.end(), [&](const std::string& word) { return Has(words, word); });
+    if (!Has(texts, story[0]) && !isPartial)
+        return testing::AssertionFailure() << operation.name << " gave " << story[0] << ", untouched " << untouched[0];
+    for (std::size_t i = 1; i < story.size(); ++i)
+    {
+        if (!Has(lines, AnyNumber(story[i])))
+            return testing::AssertionFailure() << operation.name << " logged " << story[i];
+    }
+    return testing::AssertionSuccess();
+}
+
+} // namespace kiv::test

@@ -1,0 +1,92 @@
+// What operations leave behind: those that end with the call in a thread without a main loop, pushes in one with a loop.
+#include "sweep/Operations.h"
+
+#include <DADBusManager.h>
+
+#include <gtest/gtest.h>
+
+#include <malloc.h>
+#include <optional>
+#include <thread>
+#include <unistd.h>
+
+namespace
+{
+
+using namespace kiv::test;
+
+constexpr double kMostBytes = 64; // a call
+
+/// Runs an operation and a tenth more calls first, which make what stays: the connection, GLib's types.
+template <class Run>
+double BytesPerCall(int calls, Run run)
+{
+    std::size_t before = 0;
+    for (int i = -calls / 10; i < calls; ++i)
+    {
+        if (i == 0)
+            before = mallinfo2().uordblks;
+        run(i);
+    }
+    return (static_cast<double>(mallinfo2().uordblks) - static_cast<double>(before)) / calls;
+}
+
+struct Growth : testing::Test
+{
+    Growth()
+    {
+        // The allocator's cache of each thread would look like growth. It is set up before main, so the program starts once more.
+        if (g_getenv("GLIBC_TUNABLES") == nullptr)
+        {
+            setenv("GLIBC_TUNABLES", "glibc.malloc.tcache_count=0", 1);
+            execl("/proc/self/exe", "growth_test", static_cast<char*>(nullptr));
+        }
+        world.emplace();
+    }
+
+    std::optional<World> world;
+};
+
+TEST_F(Growth, OfEachOperationIsNextToNothingInAThreadWithoutAMainLoop)
+{
+    const auto measure = [](const Operation& operation)
+    {
+        int error = 0; // held in the short form, since to connect for each call takes ten times as long
+        const Connection connection(IsLong() ? nullptr : DADBusManager::GetInstance()->InitDbusConnection(&error));
+        const int shortly = operation.kind == Kind::kBus ? 300 : 1000;
+        const double bytes = BytesPerCall(IsLong() ? 5000 : shortly,
+            [&](int)
+            {
+                Session session;
+                ASSERT_EQ(operation.good[0], operation.run(session)) << operation.name;
+            });
+        EXPECT_LT(bytes, kMostBytes) << operation.name;
+    };
+    for (const Operation& operation : Operations())
+    {
+        if (operation.kind != Kind::kPush)
+            std::thread(measure, operation).join();
+    }
+}
+
+TEST_F(Growth, OfPushesThroughALoopIsNextToNothing)
+{
+    constexpr int kAtOnce = 50;
+    for (const Operation& operation : Operations())
+    {
+        if (operation.kind != Kind::kPush)
+            continue;
+        const double bytes = BytesPerCall(IsLong() ? 10'000 : 2000,
+            [&](int i)
+            {
+                Session session;
+                ASSERT_EQ(operation.good[0], operation.run(session));
+                if (i % kAtOnce == 0 || i == -1)
+                    world->FinishPushes();
+            });
+        EXPECT_LT(bytes, kMostBytes);
+        world->FinishPushes();
+    }
+}
+
+} // namespace

@@ -1,0 +1,254 @@
+// Every operation on every profile, with each allocation of the library's own failing in its turn: alone, and with all that
+// follow. The library's are those that it and its support library make, in the code of the standard library too; GLib ends the
+// process where it finds no memory, so its own are left alone. To make a named lock counts as one. What is lost, LeakSanitizer
+// tells.
+#include "sweep/Sweep.h"
+
+#include <DAConnectionManager.h>
+#include <DADBusManager.h>
+#include <DASimManager.h>
+#include <DASystem.h>
+
+#include <algorithm>
+#include <cstdlib>
+#include <cstring>
+#include <dlfcn.h>
+#include <execinfo.h>
+#include <iostream>
+#include <link.h>
+#include <new>
+#include <utility>
+
+namespace
+{
+
+/// What is done to the allocations of the one thread that runs the operation.
+struct Injection
+{
+    bool isArmed = false;
+    unsigned first = 0, last = 0; ///< those that fail
+    unsigned seen = 0, failed = 0;
+    const char* lockOfInstance = ""; ///< held when the last instance was made
+};
+thread_local Injection injection;
+
+bool IsIn(const char* library, const void* code)
+{
+    dl_find_object object{};
+    return _dl_find_object(const_cast<void*>(code), &object) == 0 && std::strstr(object.dlfo_link_map->l_name, library) != nullptr;
+}
+
+/// Whether an allocation is made for the library: by its code, or by the standard library's that its code called.
+bool IsOwn(const void* caller)
+{
+    if (IsIn("libstdc++", caller))
+    {
+        void* frames[24];
+        void** const end = frames + backtrace(frames, std::size(frames));
+        void** const owner =
+            std::find_if(std::find(frames, end, caller), end, [](const void* frame) { return !IsIn("libstdc++", frame); });
+        return owner != end && IsOwn(*owner);
+    }
+    return IsIn("libkiv_system", caller) || IsIn("libkiv_util", caller);
+}
+
+bool FailsNext()
+{
+    ++injection.seen;
+    const bool fails = injection.seen >= injection.first && injection.seen <= injection.last;
+    injection.failed += fails ? 1 : 0;
+    return fails;
+}
+
+bool Fails(const void* caller)
+{
+    if (!injection.isArmed)
+        return false;
+    injection.isArmed = false; // what this code needs itself
+    const bool fails = IsOwn(caller) && FailsNext();
+    injection.isArmed = true;
+    return fails;
+}
+
+} // namespace
+
+// The allocators of the sanitizers can not be replaced, but for these of the language and for strdup().
+#if defined(__SANITIZE_ADDRESS__) || defined(__SANITIZE_THREAD__)
+#define KIV_MALLOC std::malloc
+#else
+#define KIV_MALLOC __libc_malloc
+extern "C" void* __libc_malloc(std::size_t size) noexcept;
+
+extern "C" void* malloc(std::size_t size) noexcept
+{
+    return Fails(__builtin_return_address(0)) ? nullptr : KIV_MALLOC(size);
+}
+#endif
+
+extern "C" char* strdup(const char* text) noexcept
+{
+    const std::size_t size = std::strlen(text) + 1;
+    void* const copy = Fails(__builtin_return_address(0)) ? nullptr : KIV_MALLOC(size);
+    return static_cast<char*>(copy == nullptr ? nullptr : std::memcpy(copy, text, size));
+}
+
+void* operator new(std::size_t size)
+{
+    void* const made = Fails(__builtin_return_address(0)) ? nullptr : KIV_MALLOC(size);
+    return made == nullptr ? throw std::bad_alloc() : made;
+}
+
+void* operator new(std::size_t size, const std::nothrow_t&) noexcept
+{
+    if (injection.isArmed)
+        injection.lockOfInstance = kiv::test::heldLock;
+    return Fails(__builtin_return_address(0)) ? nullptr : KIV_MALLOC(size);
+}
+
+void operator delete(void* memory) noexcept
+{
+    std::free(memory);
+}
+
+void operator delete(void* memory, std::size_t) noexcept
+{
+    std::free(memory);
+}
+
+namespace
+{
+
+using namespace kiv::test;
+
+void ForgetInstances()
+{
+    delete std::exchange(DASystem::__pInstance, nullptr);
+    delete std::exchange(DASimManager::__pInstance, nullptr);
+    delete std::exchange(DADBusManager::__pInstance, nullptr);
+    delete std::exchange(DAConnectionManager::__pInstance, nullptr);
+}
+
+/// Leaves the instance of the class whose member is called, if it is the first use; else all.
+void PrepareInstances(const Operation& operation, bool isFirstUse)
+{
+    ForgetInstances();
+    const auto isNeeded = [&](const std::string& name)
+    { return !isFirstUse || (operation.name.find(name + "::") == 0 && operation.name != name + "::GetInstance()"); };
+    if (isNeeded("DASystem"))
+        DASystem::GetInstance();
+    if (isNeeded("DASimManager"))
+        DASimManager::GetInstance();
+    if (isNeeded("DADBusManager"))
+        DADBusManager::GetInstance();
+    if (isNeeded("DAConnectionManager"))
+        DAConnectionManager::GetInstance();
+}
+
+struct MemorySweep : Sweep
+{
+    MemorySweep()
+    {
+        void* frames[2];
+        backtrace(frames, 2); // loads what it needs
+        int error = 0;
+        connection.reset(DADBusManager::GetInstance()->InitDbusConnection(&error));
+    }
+
+    Story TryFailing(const Operation& operation, unsigned first, unsigned last)
+    {
+        const auto arm = [&]
+        {
+            if (isFirstUse)
+                lockNames.clear();
+            PrepareInstances(operation, isFirstUse);
+            log.Take();
+            isLockRefused = [] { return injection.isArmed && FailsNext(); };
+            injection = {true, first, last, 0, 0, ""};
+        };
+        const auto disarm = [&]
+        {
+            isLockRefused = nullptr;
+            if (isFirstUse)
+                ForgetInstances();
+            injection.isArmed = false;
+        };
+        return Try(operation, arm, disarm);
+    }
+
+    /// Lets every allocation fail in its turn until there is none left. @return how many failed
+    unsigned TryAll(const Operation& operation)
+    {
+        const Story untouched = TryFailing(operation, 0, 0);
+        Story allowed = untouched;
+        for (const Operation& other : Operations()) // the classes may not come into being
+            if (other.failing.size() == 1 && other.failing[0].story[0] == "none")
+                allowed.push_back(other.failing[0].story[1]);
+        unsigned injections = 0;
+        for (const unsigned length : Lengths())
+        {
+            for (unsigned number = 1;; ++number)
+            {
+                const Story story = TryFailing(operation, number, number + length - 1);
+                injections += injection.failed;
+                if (injection.failed == 0)
+                {
+                    EXPECT_EQ(untouched, story) << operation.name;
+                    break;
+                }
+                EXPECT_TRUE(MayBe(operation, story, allowed)) << "allocation " << number;
+            }
+        }
+        return injections;
+    }
+
+    bool isFirstUse = true; ///< of the library: no class has an instance, no lock was named
+    Connection connection;  ///< held, so that not every operation has to connect
+};
+
+TEST_F(MemorySweep, GivesFailureResultsWhicheverAllocationFails)
+{
+    unsigned injections = 0;
+    for (const std::string& name : Devices())
+    {
+        SCOPED_TRACE(name);
+        Use(name);
+        for (const Operation& operation : Operations())
+        {
+            const bool isOnBus = operation.kind == Kind::kBus || operation.kind == Kind::kPush;
+            if ((operation.needsHandle && device.slots.empty()) || (isOnBus && name != "dual"))
+                continue;
+            for (const bool isFirst : {true, false})
+            {
+                isFirstUse = isFirst;
+                injections += TryAll(operation);
+            }
+        }
+    }
+    std::cout << injections << " allocations failed\n";
+    EXPECT_GT(injections, 10'000U);
+}
+
+TEST_F(MemorySweep, MakesEachInstanceUnderItsNamedLockOnFirstUseAndNotBefore)
+{
+    const std::pair<std::string, std::string> expected[] = {{"DASystem::GetInstance()", "DASystem.cpp::GetInstance"},
+        {"DASimManager::GetInstance()", "DASimManager.cpp::GetInstance"},
+        {"DADBusManager::GetInstance()", "DADBusManager.cpp::GetInstance"},
+        {"DAConnectionManager::GetInstance()", "DAConnectionManager.cpp::GetInstance"}, {"DASystem::IsFlightMode()", ""},
+        {"DASystem::IsValidMcc(char*)", "DASimManager.cpp::GetInstance"},
+        {"DASystem::GetBTNetworkState()", "DAConnectionManager.cpp::GetInstance"},
+        {"DASystem::GetDeviceUniqueID(char const**)", "DADBusManager.cpp::GetInstance"}};
+    for (const auto& [name, lock] : expected)
+    {
+        const auto isIt = [&, wanted = name](const Operation& operation) { return operation.name == wanted; };
+        const Operation& operation = *std::find_if(Operations().begin(), Operations().end(), isIt);
+        isFirstUse = true;
+        EXPECT_EQ(operation.good, TryFailing(operation, 0, 0));
+        EXPECT_EQ(lock, injection.lockOfInstance) << name;
+        EXPECT_EQ(lock.empty() ? 0U : 1U, lockNames.count(lock));
+        isFirstUse = false;
+        TryFailing(operation, 0, 0);
+        EXPECT_STREQ("", injection.lockOfInstance) << name << " made another";
+    }
+}
+
+} // namespace

@@ -1,0 +1,158 @@
+// Every operation on every profile, with each of its platform calls failing in its turn: alone, and with all that follow.
+#include "sweep/Sweep.h"
+
+#include <algorithm>
+#include <cstdio>
+#include <dlfcn.h>
+#include <iostream>
+#include <memory>
+#include <regex>
+#include <set>
+
+namespace
+{
+
+using namespace kiv::test;
+using kiv::sim::Leavings;
+namespace sim = kiv::sim;
+
+constexpr int kCode = -77;
+
+bool Contains(const Calls& calls, Call call)
+{
+    return std::find(calls.begin(), calls.end(), call) != calls.end();
+}
+
+/// What is left behind by a call that is to fail. One that opens may not have opened, which nobody could close; one that closes
+/// must have closed, since nobody would do so again.
+Leavings Possible(Call call, Leavings wanted)
+{
+    const Calls opening{Call::telephony_init, Call::tel_init, Call::package_info_create, Call::connection_create};
+    const Calls closing{Call::telephony_deinit, Call::tel_deinit, Call::package_info_destroy, Call::connection_destroy};
+    if (Contains(opening, call))
+        return Leavings::kNothing;
+    return Contains(closing, call) ? Leavings::kItsResults : wanted;
+}
+
+/// What an operation comes to that ends with the first call that fails.
+Story Expected(const Operation& operation, const Calls& failed, Leavings leavings, const Story& untouched)
+{
+    for (const Call call : failed)
+    {
+        for (const Failing& each : operation.failing)
+        {
+            if (!Contains(each.calls, call))
+                continue;
+            Story story = each.story;
+            std::string& text = story[0];
+            if (text.back() != '*')
+                return story;
+            text.pop_back();
+            const std::size_t rest = text.find(' ');
+            if (leavings == Leavings::kItsResults)
+                text =
+                    rest == std::string::npos ? untouched[0] : text.substr(0, rest) + untouched[0].substr(untouched[0].find(' '));
+            return story;
+        }
+    }
+    return untouched;
+}
+
+struct PlatformSweep : Sweep
+{
+    /// Fails the calls from `first` to `last`, counted from 1.
+    Story TryFailing(const Operation& operation, std::size_t first, std::size_t last, Leavings leavings)
+    {
+        made.clear();
+        failed.clear();
+        const auto onCall = [&](Call call, int)
+        {
+            const Calls reads{Call::telephony_sim_get_state, Call::telephony_sim_get_subscriber_number, Call::tel_get_sim_imsi};
+            const bool isLocked = operation.lock == SimLock::kWhole || Contains(reads, call);
+            EXPECT_STREQ(isLocked ? kSimAccess : "", heldLock) << operation.name << ": " << sim::NameOf(call);
+            made.push_back(call);
+            sim::ClearFaults();
+            constexpr int kPatience = 120; // who waits for a SIM does so without a bound
+            if (pauses >= kPatience)
+                return "";
+            if (made.size() >= first && made.size() <= last)
+            {
+                failed.push_back(call);
+                sim::FailCall(call, kCode, sim::kEveryCall, sim::kNoSlot, Possible(call, leavings));
+            }
+            return "";
+        };
+        const auto disarm = []
+        {
+            sim::SetCallHook(nullptr);
+            sim::ClearFaults();
+        };
+        return Try(
+            operation, [&] { sim::SetCallHook(onCall); }, disarm);
+    }
+
+    Calls made, failed;
+};
+
+TEST_F(PlatformSweep, HasEveryPublicMemberInItsTable)
+{
+    Dl_info library{};
+    ASSERT_NE(0, dladdr(dlsym(RTLD_DEFAULT, Operations()[0].symbols[0].c_str()), &library));
+    const std::string command = "nm --dynamic --defined-only --format=posix " + std::string(library.dli_fname);
+    const std::unique_ptr<FILE, decltype(&pclose)> listing(popen(command.c_str(), "r"), pclose);
+    const std::regex memberFunction("_ZN[0-9]+DA(System|SimManager|DBusManager|ConnectionManager)([0-9]+[a-zA-Z_]|C2|D2).*");
+    std::set<std::string> exported, listed;
+    char symbol[512], type = 0;
+    while (std::fscanf(listing.get(), "%511s %c%*[^\n]", symbol, &type) == 2)
+    {
+        if (type == 'T' && std::regex_match(symbol, memberFunction) && std::string(symbol).find("C2Ev") == std::string::npos &&
+            std::string(symbol).find("D2Ev") == std::string::npos)
+            exported.insert(symbol);
+    }
+    for (const Operation& operation : Operations())
+        listed.insert(operation.symbols.begin(), operation.symbols.end());
+    EXPECT_GT(exported.size(), 100U);
+    EXPECT_EQ(exported, listed);
+}
+
+TEST_F(PlatformSweep, AnswersRightOnADeviceWhereAllGoesWell)
+{
+    for (const Operation& operation : Operations())
+        EXPECT_EQ(operation.good, TryFailing(operation, 0, 0, Leavings::kNothing)) << operation.name;
+}
+
+TEST_F(PlatformSweep, GivesFailureResultsAndReleasesAllWhicheverCallFails)
+{
+    const std::size_t kMostCalls = IsLong() ? 200 : 20; // of one operation: polling makes more, all alike
+    int pairs = 0;
+    for (const std::string& name : Devices())
+    {
+        SCOPED_TRACE(name);
+        Use(name);
+        for (const Operation& operation : Operations())
+        {
+            if (operation.needsHandle && device.slots.empty())
+                continue;
+            const Story untouched = TryFailing(operation, 0, 0, Leavings::kNothing);
+            const std::size_t count = std::min(made.size(), kMostCalls);
+            for (const unsigned length : Lengths())
+            {
+                for (std::size_t i = 0; i < count * 2; ++i)
+                {
+                    const Leavings leavings = i % 2 == 0 ? Leavings::kNothing : Leavings::kItsResults;
+                    const Story story = TryFailing(operation, i / 2 + 1, i / 2 + length, leavings);
+                    ++pairs;
+                    if (operation.kind == Kind::kSingle)
+                        EXPECT_EQ(Expected(operation, failed, leavings, untouched), story)
+                            << operation.name << " with " << failed.size() << " failing from " << sim::NameOf(failed.at(0));
+                    else
+                        EXPECT_TRUE(MayBe(operation, story, untouched)) << "call " << i / 2 + 1;
+                }
+            }
+        }
+    }
+    std::cout << pairs << " pairs of an operation and a failure\n";
+    EXPECT_GT(pairs, 2000);
+}
+
+} // namespace
