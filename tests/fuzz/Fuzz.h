@@ -1,10 +1,8 @@
 /// @file
-/// What the fuzz targets have in common. A target reads its input as lines of text, so that a kept input can be read and written by
-/// hand, and checks the answers against what it knows, not only that nothing crashes.
+/// What the fuzz targets have in common. Their inputs are lines of text, so that one can be read, and written by hand.
 #ifndef KIV_TESTS_FUZZ_H
 #define KIV_TESTS_FUZZ_H
 
-#include <cstdint>
 #include <string>
 #include <string_view>
 #include <vector>
@@ -12,17 +10,17 @@
 namespace kiv::fuzz
 {
 
-/// Ends the run, and so keeps the input, unless it is true.
+/// Ends the run, which keeps the input, unless it is true.
 void Require(bool isTrue, const char* what);
 
-/// Counts records given to the library; the sum is printed at the end of the run.
+/// Counts what the library was given; the sum is printed at the end of the run.
 void Feed(std::size_t records);
 
-/// The pieces between separators, at least one.
-std::vector<std::string> Split(std::string_view text, char separator);
+/// The pieces between separators, and empty ones behind them up to `least`.
+std::vector<std::string> Split(std::string_view text, char separator, std::size_t least = 1);
 
-/// Has every line of the log formatted, which nobody then reads: texts from outside stand in them.
-void FormatLog();
+/// As std::strtoll() reads it, wrapped.
+int Number(const std::string& text);
 
 } // namespace kiv::fuzz
 
