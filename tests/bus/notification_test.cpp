@@ -194,8 +194,8 @@ TEST_F(Notification, PassesOverSubscribersThatCanNotBeCalledAreGoneRefuseOrLeave
     const _SubscriberInfo good = Record(client);
     store.records = {{"", good.objectpath, good.interface}, {"org.ex\xe9mple", good.objectpath, good.interface},
         {good.busname, "", good.interface}, {good.busname, "/x/", good.interface},
-        {good.busname, "/org/freedesktop/DBus/Local", good.interface}, {good.busname, good.objectpath, "undotted"},
-        {good.busname, good.objectpath, "org.freedesktop.DBus.Local"}, {"", "", ""}};
+        {good.busname, "/org/freedesktop/DBus/Locale/x", good.interface}, {good.busname, good.objectpath, "undotted"},
+        {good.busname, good.objectpath, "org.freedesktop.DBus.Locale"}, {"", "", ""}};
     std::vector<testing::Matcher<std::string>> expectedErrors;
     for (const auto& record : store.records)
     {

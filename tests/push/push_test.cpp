@@ -142,7 +142,9 @@ TEST_F(Push, ReachesTheOthersWhenARecordBetweenThemCanNotBeCalled)
         {{"a.b", "x", "a.b"}, 2, {notMade + "objectpath is not an object path"}},
         {{"a.b", "/x", "a"}, 2, {notMade + "interface is not an interface name"}},
         {{"a.b", "/org/freedesktop/DBus/Local", "a.b"}, 2, {notMade + "objectpath is reserved"}},
+        {{"a.b", "/org/freedesktop/DBus/Locale/x", "a.b"}, 2, {notMade + "objectpath is reserved"}},
         {{"a.b", "/x", "org.freedesktop.DBus.Local"}, 2, {notMade + "interface is reserved"}},
+        {{"a.b", "/x", "org.freedesktop.DBus.Locale"}, 2, {notMade + "interface is reserved"}},
     };
     Peer first(bus), third(bus);
     for (const auto& row : cases)

@@ -288,7 +288,7 @@ constexpr Notification kNumberChanged {"number_changed", "all",   "number_change
 // clang-format on
 
 /// Why a record can not be called, null when it can. GDBus does not tell a malformed record apart, and the bus answers the
-/// reserved path and interface by closing the connection.
+/// reserved path and interface, and all that begin with their letters, by closing the connection.
 const char* Flaw(const _SubscriberInfo& subscriber)
 {
     if (!g_dbus_is_name(subscriber.busname.c_str()))
@@ -297,9 +297,9 @@ const char* Flaw(const _SubscriberInfo& subscriber)
         return "objectpath is not an object path";
     if (!g_dbus_is_interface_name(subscriber.interface.c_str()))
         return "interface is not an interface name";
-    if (g_str_equal(subscriber.objectpath.c_str(), "/org/freedesktop/DBus/Local"))
+    if (g_str_has_prefix(subscriber.objectpath.c_str(), "/org/freedesktop/DBus/Local"))
         return "objectpath is reserved";
-    if (g_str_equal(subscriber.interface.c_str(), "org.freedesktop.DBus.Local"))
+    if (g_str_has_prefix(subscriber.interface.c_str(), "org.freedesktop.DBus.Local"))
         return "interface is reserved";
     return nullptr;
 }

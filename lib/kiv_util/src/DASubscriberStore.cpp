@@ -116,12 +116,14 @@ std::string Objection(const DASubscription& subscription)
         {"object path", subscriber.objectpath,
             [](const std::string& text) { return g_variant_is_object_path(text.c_str()) != FALSE; },
             "elements of letters, digits and underscores, a slash before each, are needed, such as /org/example/Client"},
-        {"object path", subscriber.objectpath, [](const std::string& text) { return text != "/org/freedesktop/DBus/Local"; },
-            "the bus reserves this one and disconnects who calls it"},
+        {"object path", subscriber.objectpath,
+            [](const std::string& text) { return g_str_has_prefix(text.c_str(), "/org/freedesktop/DBus/Local") == FALSE; },
+            "the bus reserves what begins like this and disconnects who calls it"},
         {"interface", subscriber.interface, [](const std::string& text) { return g_dbus_is_interface_name(text.c_str()) != FALSE; },
             "two or more elements joined by dots are needed, such as org.example.Client"},
-        {"interface", subscriber.interface, [](const std::string& text) { return text != "org.freedesktop.DBus.Local"; },
-            "the bus reserves this one and disconnects who calls it"},
+        {"interface", subscriber.interface,
+            [](const std::string& text) { return g_str_has_prefix(text.c_str(), "org.freedesktop.DBus.Local") == FALSE; },
+            "the bus reserves what begins like this and disconnects who calls it"},
     };
     for (const auto& rule : rules)
     {
