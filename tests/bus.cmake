@@ -15,3 +15,7 @@ if(NOT KIV_SANITIZE)
   kiv_test(bus_growth_test bus/growth_test.cpp bus/Subscribers.cpp)
   target_link_libraries(bus_growth_test PRIVATE kiv_test_bus)
 endif()
+
+add_test(NAME bus_policy COMMAND ${CMAKE_CURRENT_SOURCE_DIR}/bus/policy.sh $<TARGET_FILE:kivctl>
+  ${PROJECT_SOURCE_DIR}/dbus/kiv-agent.conf)
+set_tests_properties(bus_policy PROPERTIES TIMEOUT 120)
