@@ -1,5 +1,5 @@
-# A device's own libraries in the place of platform/ and lib/kiv_util, under the names that pkg-config knows them by. Every name is a
-# cache variable; of several, the first that is there is taken.
+# A device's own libraries in the place of platform/ and lib/kiv_util, under the names that pkg-config knows them by. Every name is
+# a cache variable; of several, the first that is there is taken.
 add_library(kiv_platform INTERFACE)
 add_library(kiv_util INTERFACE)
 set_target_properties(kiv_platform PROPERTIES EXPORT_NAME platform)

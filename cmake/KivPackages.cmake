@@ -30,7 +30,7 @@ set(CPACK_DEB_COMPONENT_INSTALL ON)
 set(CPACK_DEBIAN_FILE_NAME DEB-DEFAULT)
 set(CPACK_DEBIAN_PACKAGE_RELEASE 1)
 set(CPACK_DEBIAN_PACKAGE_SOURCE kiv-system)
-set(CPACK_DEBIAN_PACKAGE_MAINTAINER "kiv-agent developers <kiv-system@kiv-agent.org>")
+set(CPACK_DEBIAN_PACKAGE_MAINTAINER "kiv-agent developers <kiv-system@example.org>")
 set(CPACK_DEBIAN_PACKAGE_PRIORITY optional)
 set(CPACK_DEBIAN_PACKAGE_CONTROL_STRICT_PERMISSION ON)
 set(CPACK_DEBIAN_ENABLE_COMPONENT_DEPENDS ON)
@@ -49,7 +49,8 @@ set(CPACK_DEBIAN_SYSTEM_PACKAGE_SECTION libs)
 set(CPACK_DEBIAN_PLATFORM_PACKAGE_SECTION libs)
 set(CPACK_DEBIAN_DEV_PACKAGE_SECTION libdevel)
 set(CPACK_DEBIAN_KIVCTL_PACKAGE_SECTION devel)
-# A trigger tells ldconfig of the libraries. CPack leaves out its scripts that would do so for those that are named and not there.
+# A trigger tells ldconfig of the libraries. CPack leaves out its scripts for that when others are named; none are there, as it
+# warns.
 set(CPACK_DEBIAN_SYSTEM_PACKAGE_CONTROL_EXTRA ${PROJECT_SOURCE_DIR}/cmake/debian/triggers no/postinst no/postrm)
 set(CPACK_DEBIAN_PLATFORM_PACKAGE_CONTROL_EXTRA ${CPACK_DEBIAN_SYSTEM_PACKAGE_CONTROL_EXTRA})
 

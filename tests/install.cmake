@@ -6,5 +6,6 @@ if(NOT KIV_SANITIZE)
 endif()
 kiv_check(packages ${CMAKE_CURRENT_SOURCE_DIR}/install/packages.sh ${PROJECT_BINARY_DIR} ${PROJECT_SOURCE_DIR}/README.md
   ${CMAKE_CXX_COMPILER})
-kiv_check(native_build ${CMAKE_CURRENT_SOURCE_DIR}/install/native.sh ${PROJECT_BINARY_DIR} ${PROJECT_SOURCE_DIR} ${CMAKE_CXX_COMPILER})
+kiv_check(native_build ${CMAKE_CURRENT_SOURCE_DIR}/install/native.sh ${PROJECT_BINARY_DIR} ${PROJECT_SOURCE_DIR}
+  ${CMAKE_CXX_COMPILER})
 kiv_check(same_bytes ${CMAKE_CURRENT_SOURCE_DIR}/install/same_bytes.sh ${PROJECT_BINARY_DIR} ${PROJECT_SOURCE_DIR})

@@ -1,5 +1,6 @@
 #!/usr/bin/env bash
-# The example policy on a bus that denies by default: the library's calls pass, others do not, and a client service has to add a rule.
+# The example policy on a bus that denies by default: the library's calls pass, others do not, and a client service has to add a
+# rule.
 # usage: policy.sh KIVCTL KIV_AGENT_CONF
 set -euo pipefail
 kivctl=$1 policy=$2
@@ -68,7 +69,8 @@ subscribe Mail --key 7 --kind policy --kind status --kind auth --kind activated 
 "$kivctl" device id >/dev/null || fail "the device unique ID is denied"
 while read -r event options; do
     read -ra words <<<"$event $options"
-    [[ $event == number-changed ]] || "$kivctl" notify "${words[@]}" --to manager >/dev/null || fail "not told to the manager: $event"
+    [[ $event == number-changed ]] || "$kivctl" notify "${words[@]}" --to manager >/dev/null ||
+        fail "not told to the manager: $event"
     [[ $("$kivctl" notify "${words[@]}") == "sent subscribers=1 delivered=1" ]] || fail "not told to the subscriber: $event"
 done <<EVENTS
 auth-success

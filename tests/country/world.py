@@ -1,6 +1,6 @@
 #!/usr/bin/python3
-"""Compares the library's tables with what others publish. Every difference stands in a reviewed list, with its reason: one that is not
-there fails, and one there that is no more fails too.
+"""Compares the library's tables with what others publish. Every difference stands in a reviewed list, with its reason: one that
+is not there fails, and one there that is no more fails too.
 
 usage: world.py iso-codes|libphonenumber|mobile-broadband-provider-info DATA_DIR
 
@@ -37,7 +37,8 @@ def text(words):
 
 def iso_codes():
     countries = {entry['alpha_2'].lower(): entry for entry in iso('3166-1', 'alpha_2')}
-    languages = {entry['alpha_2']: {entry['alpha_3'], entry.get('bibliographic', entry['alpha_3'])} for entry in iso('639-2', 'alpha_2')}
+    languages = {entry['alpha_2']: {entry['alpha_3'], entry.get('bibliographic', entry['alpha_3'])}
+                 for entry in iso('639-2', 'alpha_2')}
     ours = {alpha2: name for _, alpha2, name in COUNTRY}
     for alpha2 in countries.keys() | ours.keys():
         there = countries.get(alpha2, {})

@@ -1,9 +1,10 @@
+# shellcheck shell=bash
 # Sourced. Builds the agent that the README shows against an installed tree, the way a user would, and runs it.
 
 # With the flags of pkg-config and with CMake's package; both find the tree wherever it stands.
 try_agent() # prefix readme compiler scratch
 {
-    local prefix=$1 readme=$2 cxx=$3 scratch=$4 flags agent
+    local prefix=$1 readme=$2 cxx=$3 scratch=$4 flags
     awk '/^```cpp$/ { inside = 1; next } /^```$/ { inside = 0 } inside' "$readme" >"$scratch/agent.cpp"
 
     export PKG_CONFIG_PATH LD_LIBRARY_PATH

@@ -9,7 +9,10 @@ scratch=$(mktemp -d)
 trap 'rm -rf "$scratch"' EXIT
 cmake --install "$build" --prefix "$scratch/made" >"$scratch/install.log"
 mv "$scratch/made" "$scratch/moved"
-! grep --recursive --fixed-strings --files-with-matches -e "$scratch/made" -e "$build" "$scratch/moved"
+if grep --recursive --fixed-strings --files-with-matches -e "$scratch/made" -e "$build" "$scratch/moved"; then
+    echo "these know where they were built or installed"
+    exit 1
+fi
 try_agent "$scratch/moved" "$readme" "$cxx" "$scratch"
 
 read -ra flags <<<"$(pkg-config --cflags kiv_system)"

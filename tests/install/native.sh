@@ -1,6 +1,6 @@
 #!/usr/bin/env bash
-# Builds the library for a device: from its own sources alone, on libraries and headers that it finds by the names that pkg-config knows
-# on a device. The simulated device is installed under these names, each header where its .pc file alone leads to.
+# Builds the library for a device: from its own sources alone, on libraries and headers that it finds by the names that pkg-config
+# knows on a device. The simulated device is installed under these names, each header where its .pc file alone leads to.
 # usage: native.sh BUILD_DIR SOURCE_DIR CXX
 set -euo pipefail
 build=$1 sources=$2 cxx=$3
@@ -28,7 +28,7 @@ Cflags: -I\${prefix}/include/$name -I\${prefix}/include/common
 Libs: -L\${prefix}/lib -l$library
 PC
 done <<NAMES
-kiv_util                    kiv_util      DAMutex.h DAUtil.h DASubscriberInfo.h DASubscriberStore.h DADatabaseManager.h DASubscribeDataManager.h
+kiv_util  kiv_util  DAMutex.h DAUtil.h DASubscriberInfo.h DASubscriberStore.h DADatabaseManager.h DASubscribeDataManager.h
 device-log                  kiv_platform  dlog.h
 capi-telephony              kiv_platform  telephony.h
 tapi                        kiv_platform  TapiUtility.h ITapiCall.h ITapiNetText.h ITapiNetwork.h ITapiSim.h
@@ -49,8 +49,8 @@ cp -r "$sources/lib/DASystem" "$scratch/tree/lib"
 export PKG_CONFIG_PATH=$device/lib/pkgconfig
 configure() # option...
 {
-    cmake -S "$scratch/tree" -B "$scratch/build" -DKIV_PLATFORM=native -DCMAKE_BUILD_TYPE=Debug -DCMAKE_CXX_COMPILER="$cxx" "$@" \
-        >"$scratch/log" 2>&1
+    cmake -S "$scratch/tree" -B "$scratch/build" -DKIV_PLATFORM=native -DCMAKE_BUILD_TYPE=Debug -DCMAKE_CXX_COMPILER="$cxx" \
+        "$@" >"$scratch/log" 2>&1
 }
 if configure || ! grep --quiet "None of the required 'dlog' found" "$scratch/log"; then
     echo "configured without the platform log, or refused for another reason:"
@@ -60,12 +60,13 @@ fi
 configure -DKIV_PC_DLOG=device-log && cmake --build "$scratch/build" --parallel 2 >>"$scratch/log" 2>&1 &&
     cmake --install "$scratch/build" --prefix "$scratch/prefix" >>"$scratch/log" || { cat "$scratch/log"; exit 1; }
 
-# Nothing of the device is built or installed, and the same is exported. What an agent needs of the device it gets through the names.
+# Nothing of the device is built or installed, and the same is exported. An agent gets to the device by the names.
 made=$(find "$scratch/prefix" -name '*.so*' -o -name '*.h' | sed 's|.*/||; s|[.]so.*|.so|' | sort --unique | tr '\n' ' ')
 expected=$({ ls "$sources/lib/DASystem/include"; echo libkiv_system.so; } | sort | tr '\n' ' ')
 [[ $made == "$expected" ]] || { echo "installed: $made"; exit 1; }
 library=$(find "$scratch/prefix" -name libkiv_system.so)
-cmake -DNM=nm -DLIBRARY="$library" -DSYMBOLS="$sources/lib/DASystem/exported_symbols.txt" -P "$sources/tests/frame/exported_symbols.cmake"
+cmake -DNM=nm -DLIBRARY="$library" -DSYMBOLS="$sources/lib/DASystem/exported_symbols.txt" \
+    -P "$sources/tests/frame/exported_symbols.cmake"
 PKG_CONFIG_PATH=$PKG_CONFIG_PATH:$(dirname "$(find "$scratch/prefix" -name kiv_system.pc)")
 read -ra flags <<<"$(pkg-config --cflags kiv_system)"
 for header in DASystem DASimManager DADBusManager DAConnectionManager; do

@@ -1,6 +1,6 @@
 #!/usr/bin/env bash
-# Makes the Debian packages of a build, has them checked, installs them into a root of their own, and there builds and runs the agent
-# that the README shows, and kivctl.
+# Makes the Debian packages of a build, has them checked, installs them into a root of their own, and there builds and runs the
+# agent that the README shows, and kivctl.
 # usage: packages.sh BUILD_DIR README CXX
 set -euo pipefail
 build=$1 readme=$2 cxx=$3

@@ -1,6 +1,6 @@
 #!/usr/bin/env bash
-# Builds once more what was built, from a copy of the sources in another place, and compares every byte: of the libraries, or of all that
-# is installed and of the packages too.
+# Builds once more what was built, from a copy of the sources in another place, and compares every byte: of the libraries, or of
+# kivctl and the packages too.
 # usage: same_bytes.sh BUILD_DIR SOURCE_DIR [packages]
 set -euo pipefail
 build=$1 sources=$2 packages=${3-} target=kiv_system
