@@ -1,10 +1,12 @@
-# What every target of the project is compiled and linked with.
+# What every target of the project is compiled and linked with. Nothing of it depends on where the sources and the build stand, so
+# that two builds give the same bytes.
+set(CMAKE_BUILD_RPATH_USE_ORIGIN ON)
 
 add_library(kiv_compile INTERFACE)
 target_compile_options(kiv_compile INTERFACE
   -Wall -Wextra -Wpedantic -Wconversion -Wshadow -Werror
   -fstack-protector-strong
-  "-ffile-prefix-map=${PROJECT_SOURCE_DIR}/=")
+  "-ffile-prefix-map=${PROJECT_SOURCE_DIR}/=" "-ffile-prefix-map=${PROJECT_BINARY_DIR}=build")
 target_link_options(kiv_compile INTERFACE -Wl,-z,relro,-z,now -Wl,-z,noexecstack -Wl,--as-needed)
 
 if(KIV_SANITIZE)
@@ -33,14 +35,21 @@ function(kiv_shared_library target)
     VERSION ${PROJECT_VERSION}
     SOVERSION ${PROJECT_VERSION_MAJOR}
     INSTALL_RPATH "$ORIGIN")
-  install(TARGETS ${target} LIBRARY DESTINATION ${CMAKE_INSTALL_LIBDIR})
 endfunction()
 
-# Programs find the libraries beside them, in any prefix.
+# Installs a shared library as a part of that component; kiv_system is kiv::system to whoever finds the package.
+function(kiv_install_library target component)
+  string(REPLACE kiv_ "" name ${target})
+  set_property(TARGET ${target} PROPERTY EXPORT_NAME ${name})
+  install(TARGETS ${target} EXPORT kiv_system
+    LIBRARY DESTINATION ${CMAKE_INSTALL_LIBDIR} COMPONENT ${component} NAMELINK_COMPONENT dev
+    INCLUDES DESTINATION ${CMAKE_INSTALL_INCLUDEDIR}/kiv_system)
+endfunction()
+
+# Programs find the libraries in the prefix that they stand in, whichever that is.
 function(kiv_program target)
   add_executable(${target} ${ARGN})
   target_link_libraries(${target} PRIVATE kiv_compile)
-  file(RELATIVE_PATH to_libraries /prefix/${CMAKE_INSTALL_BINDIR} /prefix/${CMAKE_INSTALL_LIBDIR})
-  set_target_properties(${target} PROPERTIES INSTALL_RPATH "$ORIGIN/${to_libraries}")
-  install(TARGETS ${target} RUNTIME DESTINATION ${CMAKE_INSTALL_BINDIR})
+  set_target_properties(${target} PROPERTIES INSTALL_RPATH "$ORIGIN/../${CMAKE_INSTALL_LIBDIR}")
+  install(TARGETS ${target} RUNTIME DESTINATION ${CMAKE_INSTALL_BINDIR} COMPONENT kivctl)
 endfunction()

@@ -13,3 +13,7 @@ target_link_libraries(bus_connection_test PRIVATE ${CMAKE_DL_LIBS})
 get_test_property(bus_kill_test ENVIRONMENT environment)
 list(REMOVE_ITEM environment G_DEBUG=fatal-criticals)
 set_tests_properties(bus_kill_test PROPERTIES ENVIRONMENT "${environment}")
+
+add_test(NAME bus_policy COMMAND ${CMAKE_CURRENT_SOURCE_DIR}/bus/policy.sh $<TARGET_FILE:kivctl>
+  ${PROJECT_SOURCE_DIR}/dbus/kiv-agent.conf)
+set_tests_properties(bus_policy PROPERTIES TIMEOUT 120)

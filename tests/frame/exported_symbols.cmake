@@ -1,20 +1,24 @@
-# cmake -DNM=... -DLIBRARY=... -P exported_symbols.cmake
-# The library exports the four classes and the listener and nothing else, and their destructors are their only virtual members.
+# cmake -DNM=... -DLIBRARY=... -DSYMBOLS=... -P exported_symbols.cmake
+# The library exports what the list holds and nothing else, and the destructors of its classes are their only virtual members.
+cmake_minimum_required(VERSION 3.21)
 execute_process(COMMAND ${NM} --dynamic --defined-only --print-size --demangle ${LIBRARY} OUTPUT_VARIABLE output COMMAND_ERROR_IS_FATAL ANY)
-string(REPLACE "\n" ";" lines "${output}")
+string(REGEX REPLACE "[0-9a-f]+ ([0-9a-f]+ )?[A-Z] ([^\n]*)" "\\2" exported "${output}")
+string(REGEX REPLACE "\n$" "" exported "${exported}")
+string(REPLACE "\n" ";" exported "${exported}")
+file(STRINGS ${SYMBOLS} listed)
 
-set(classes DASystem DASimManager DADBusManager DAConnectionManager)
-list(JOIN classes "|" any)
-foreach(line IN LISTS lines)
-  if(line AND NOT line MATCHES " ([A-Z] (${any}|IDAConnectionStateListener)::|[DRV] (vtable|typeinfo|typeinfo name) for (${any}|IDAConnectionStateListener)$)")
-    message(SEND_ERROR "exported without need: ${line}")
+foreach(symbol IN LISTS exported)
+  if(NOT symbol IN_LIST listed)
+    message(SEND_ERROR "exported and not listed: ${symbol}")
   endif()
 endforeach()
-foreach(class IN LISTS classes)
-  # Offset to top, type information, two destructors.
-  if(NOT output MATCHES " ${class}::GetInstance\\(\\)" OR NOT output MATCHES " ${class}::__pInstance\n")
-    message(SEND_ERROR "${class} is not exported")
-  elseif(NOT output MATCHES "0000000000000020 [A-Z] vtable for ${class}\n")
-    message(SEND_ERROR "${class} has other virtual members than its destructor")
+foreach(symbol IN LISTS listed)
+  if(NOT symbol IN_LIST exported)
+    message(SEND_ERROR "listed and not exported: ${symbol}")
+  elseif(symbol MATCHES "^vtable for ")
+    # Offset to top, type information, two destructors.
+    if(NOT output MATCHES "0000000000000020 [A-Z] ${symbol}\n")
+      message(SEND_ERROR "other virtual members than the destructor: ${symbol}")
+    endif()
   endif()
 endforeach()

@@ -1,0 +1,71 @@
+# The Debian packages, one a component: "cmake --build BUILD --target package". Packages for a system have the prefix /usr.
+set(package_of_system libkiv-system${PROJECT_VERSION_MAJOR})
+set(package_of_platform libkiv-platform${PROJECT_VERSION_MAJOR})
+set(package_of_dev libkiv-system-dev)
+set(package_of_kivctl kivctl)
+
+# What each package has beside its component: copyright and changelog.
+configure_file(cmake/debian/changelog.in debian/changelog @ONLY)
+file(READ LICENSE license)
+string(REGEX REPLACE "^MIT License\n\n" "" license "${license}")
+file(CONFIGURE OUTPUT debian/copyright CONTENT "libkiv_system, libkiv_util, libkiv_platform and kivctl\n\n@license@" @ONLY)
+add_custom_command(OUTPUT debian/changelog.Debian.gz
+  COMMAND gzip --best --no-name --stdout debian/changelog >debian/changelog.Debian.gz
+  WORKING_DIRECTORY ${PROJECT_BINARY_DIR} DEPENDS ${PROJECT_BINARY_DIR}/debian/changelog)
+add_custom_target(debian_changelog ALL DEPENDS debian/changelog.Debian.gz)
+foreach(component IN ITEMS system platform dev kivctl)
+  install(FILES ${PROJECT_BINARY_DIR}/debian/copyright ${PROJECT_BINARY_DIR}/debian/changelog.Debian.gz
+    DESTINATION ${CMAKE_INSTALL_DATADIR}/doc/${package_of_${component}} COMPONENT ${component} EXCLUDE_FROM_ALL)
+  string(TOUPPER ${component} upper)
+  set(CPACK_DEBIAN_${upper}_PACKAGE_NAME ${package_of_${component}})
+  list(APPEND CPACK_COMPONENTS_ALL ${component})
+endforeach()
+configure_file(cmake/debian/options.cmake.in debian/options.cmake @ONLY)
+
+set(CPACK_GENERATOR DEB)
+set(CPACK_PROJECT_CONFIG_FILE ${PROJECT_BINARY_DIR}/debian/options.cmake)
+set(CPACK_PACKAGING_INSTALL_PREFIX /usr)
+set(CPACK_STRIP_FILES ON)
+set(CPACK_DEB_COMPONENT_INSTALL ON)
+set(CPACK_DEBIAN_FILE_NAME DEB-DEFAULT)
+set(CPACK_DEBIAN_PACKAGE_RELEASE 1)
+set(CPACK_DEBIAN_PACKAGE_SOURCE kiv-system)
+set(CPACK_DEBIAN_PACKAGE_MAINTAINER "kiv-agent developers <kiv-system@example.org>")
+set(CPACK_DEBIAN_PACKAGE_PRIORITY optional)
+set(CPACK_DEBIAN_PACKAGE_CONTROL_STRICT_PERMISSION ON)
+set(CPACK_DEBIAN_ENABLE_COMPONENT_DEPENDS ON)
+
+# What the programs need of other packages is found by dpkg-shlibdeps, what they need of each other stands here.
+set(CPACK_DEBIAN_PACKAGE_SHLIBDEPS ON)
+set(CPACK_DEBIAN_PACKAGE_SHLIBDEPS_PRIVATE_DIRS
+  ${PROJECT_BINARY_DIR}/lib/DASystem ${PROJECT_BINARY_DIR}/lib/kiv_util ${PROJECT_BINARY_DIR}/platform)
+set(CPACK_DEBIAN_PACKAGE_GENERATE_SHLIBS ON)
+set(CPACK_COMPONENT_SYSTEM_DEPENDS platform)
+set(CPACK_COMPONENT_DEV_DEPENDS system platform)
+set(CPACK_COMPONENT_KIVCTL_DEPENDS system platform)
+set(CPACK_DEBIAN_DEV_PACKAGE_DEPENDS libglib2.0-dev)
+set(CPACK_DEBIAN_DEV_PACKAGE_SHLIBDEPS OFF)
+set(CPACK_DEBIAN_SYSTEM_PACKAGE_SECTION libs)
+set(CPACK_DEBIAN_PLATFORM_PACKAGE_SECTION libs)
+set(CPACK_DEBIAN_DEV_PACKAGE_SECTION libdevel)
+set(CPACK_DEBIAN_KIVCTL_PACKAGE_SECTION devel)
+# A trigger tells ldconfig of the libraries. CPack leaves out its scripts for that when others are named; none are there, as it
+# warns.
+set(CPACK_DEBIAN_SYSTEM_PACKAGE_CONTROL_EXTRA ${PROJECT_SOURCE_DIR}/cmake/debian/triggers no/postinst no/postrm)
+set(CPACK_DEBIAN_PLATFORM_PACKAGE_CONTROL_EXTRA ${CPACK_DEBIAN_SYSTEM_PACKAGE_CONTROL_EXTRA})
+
+set(CPACK_PACKAGE_DESCRIPTION_SUMMARY "") # each package has its own
+set(CPACK_COMPONENT_SYSTEM_DESCRIPTION "system-access layer of kiv-agent
+One facade tells an on-device agent who the device and its SIM subscribers
+are, knows countries and languages, carries notifications and push messages
+over the system bus, and tells when the connection changes.")
+set(CPACK_COMPONENT_PLATFORM_DESCRIPTION "simulated mobile device behind the platform's C interfaces
+Stands in for the libraries of a device where there is none. It is strict
+with its callers, and set up by a profile or a file.")
+set(CPACK_COMPONENT_DEV_DESCRIPTION "system-access layer of kiv-agent: development files
+Headers, files for pkg-config and CMake, the interfaces on the bus, and an
+example of the agent's bus policy.")
+set(CPACK_COMPONENT_KIVCTL_DESCRIPTION "agent in miniature and remote control of the simulated device
+Asks the system-access layer from the command line, plays a client service,
+and comes with the bus services of a device.")
+include(CPack)

@@ -1,0 +1,108 @@
+#!/usr/bin/env bash
+# The example policy on a bus that denies by default: the library's calls pass, others do not, and a client service has to add a
+# rule.
+# usage: policy.sh KIVCTL KIV_AGENT_CONF
+set -euo pipefail
+kivctl=$1 policy=$2
+scratch=$(mktemp -d)
+pids=()
+trap '((${#pids[@]})) && kill "${pids[@]}" 2>/dev/null; wait; rm -rf "$scratch"' EXIT
+export DBUS_SYSTEM_BUS_ADDRESS=unix:path=$scratch/bus KIV_SUBSCRIBERS=$scratch/subscribers.db
+unset KIV_PROFILE KIV_LOG
+
+fail() # text
+{
+    echo "$1" >&2
+    head -50 "$scratch"/*.log >&2
+    exit 1
+}
+
+start() # name text-that-it-prints command...
+{
+    local log=$scratch/$1.log text=$2 deadline=$((SECONDS + 20))
+    shift 2
+    : >"$log"
+    "$@" >>"$log" 2>&1 &
+    pids+=($!)
+    until grep --quiet "$text" "$log"; do
+        ((SECONDS < deadline)) && kill -0 "${pids[-1]}" 2>/dev/null || fail "not ready: $*"
+        sleep 0.02
+    done
+}
+
+# The agent, the services and their client are one user here, so the services' part of the policy is as narrow as can be.
+sed "s/user=\"kiv-agent\"/user=\"$(id --user)\"/" "$policy" >"$scratch/agent.conf"
+cat >"$scratch/bus.conf" <<CONF
+<busconfig>
+  <type>system</type>
+  <listen>$DBUS_SYSTEM_BUS_ADDRESS</listen>
+  <auth>EXTERNAL</auth>
+  <policy context="default">
+    <allow user="*"/>
+    <deny own="*"/>
+    <deny send_type="method_call"/>
+    <allow send_type="signal"/>
+    <allow send_requested_reply="true" send_type="method_return"/>
+    <allow send_requested_reply="true" send_type="error"/>
+    <allow receive_type="*"/>
+  </policy>
+  <policy user="$(id --user)">
+    <allow own="org.tizen.system.deviced"/>
+    <allow own="org.tizen.servicemanager.service"/>
+    <allow own_prefix="org.example"/>
+    <allow send_destination="org.freedesktop.DBus" send_interface="org.freedesktop.DBus" send_member="RequestName"/>
+    <allow send_destination="org.freedesktop.DBus" send_interface="org.freedesktop.DBus" send_member="ReleaseName"/>
+    <allow send_destination="org.example.Mail" send_interface="org.kiv.ClientService"/>
+    <allow send_destination="org.example.Mail" send_interface="org.freedesktop.DBus.Properties" send_member="GetAll"/>
+  </policy>
+  <include>$scratch/agent.conf</include>
+</busconfig>
+CONF
+start bus unix: dbus-daemon --config-file="$scratch/bus.conf" --nofork --nosyslog --print-address
+start services ready "$kivctl" services
+subscribe() # name kind...
+{
+    start "$1" ready "$kivctl" subscribe --name "org.example.$1" "${@:2}"
+}
+subscribe Mail --key 7 --kind policy --kind status --kind auth --kind activated --kind number_changed --push mail
+
+"$kivctl" device id >/dev/null || fail "the device unique ID is denied"
+while read -r event options; do
+    read -ra words <<<"$event $options"
+    [[ $event == number-changed ]] || "$kivctl" notify "${words[@]}" --to manager >/dev/null ||
+        fail "not told to the manager: $event"
+    [[ $("$kivctl" notify "${words[@]}") == "sent subscribers=1 delivered=1" ]] || fail "not told to the subscriber: $event"
+done <<EVENTS
+auth-success
+on              --service 7
+policy          --service 7 --texts a b c d
+activated
+number-changed  --texts a b c d
+EVENTS
+[[ $("$kivctl" push mail --data a --message b) == "sent subscribers=1 delivered=1" ]] || fail "not pushed"
+! grep Rejected "$scratch/bus.log" || fail "the library makes calls that the policy denies"
+
+# Without a rule of its own, a client service is not told, nor is one started that does not run; the others are.
+subscribe Other --kind auth
+"$kivctl" subscribers add auth all org.example.Gone /org/example org.example.Gone >/dev/null
+[[ $("$kivctl" notify auth-success 2>&1) == *"subscribers=3 delivered=1"* ]] || fail "not told to exactly one of three"
+[[ $(wc --lines <"$scratch/Other.log") == 1 ]] || fail "told to the wrong one"
+! grep "Rejected.*StartServiceByName" "$scratch/bus.log" || fail "a subscriber can not be started"
+
+call() # destination path member
+{
+    dbus-send --system --print-reply --reply-timeout=5000 --dest="$1" "$2" "$3" 2>&1
+}
+readonly board=/Org/Tizen/System/DeviceD/Board manager=/org/tizen/servicemanager
+call org.tizen.system.deviced $board org.tizen.system.deviced.Board.GetSerial >/dev/null || fail "even GetSerial is denied"
+while read -r destination path member; do
+    [[ $(call "$destination" "$path" "$member") == *AccessDenied* ]] || fail "allowed: $destination $path $member"
+done <<CALLS
+org.tizen.system.deviced         $board          org.tizen.system.deviced.Board.SetSerial
+org.tizen.system.deviced         /               org.tizen.system.deviced.Board.GetSerial
+org.tizen.system.deviced         $board          org.freedesktop.DBus.Peer.Ping
+org.tizen.servicemanager.service $manager        org.tizen.servicemanager.number_change
+org.tizen.servicemanager.service $manager/other  org.tizen.servicemanager.auth
+org.freedesktop.DBus             /               org.freedesktop.DBus.ListNames
+org.example.Other                /               org.kiv.ClientService.auth
+CALLS
