@@ -5,6 +5,7 @@
 #include <csignal>
 #include <filesystem>
 #include <fstream>
+#include <set>
 #include <sstream>
 
 using testing::AllOf;
@@ -19,6 +20,29 @@ namespace
 std::string Contents(const std::string& file)
 {
     return (std::ostringstream() << std::ifstream(file).rdbuf()).str();
+}
+
+std::string Replaced(const std::string& text, const std::string& pattern, const char* by)
+{
+    g_autoptr(GRegex) regex = g_regex_new(pattern.c_str(), G_REGEX_MULTILINE, GRegexMatchFlags(0), nullptr);
+    g_autofree char* replaced = g_regex_replace(regex, text.c_str(), -1, 0, by, GRegexMatchFlags(0), nullptr);
+    return replaced;
+}
+
+/// What the pattern's group holds at every place where the pattern fits.
+template <typename Texts = std::set<std::string>>
+Texts All(const char* pattern, const std::string& text)
+{
+    Texts all;
+    g_autoptr(GRegex) regex = g_regex_new(pattern, G_REGEX_MULTILINE, GRegexMatchFlags(0), nullptr);
+    g_autoptr(GMatchInfo) match = nullptr;
+    g_regex_match(regex, text.c_str(), GRegexMatchFlags(0), &match);
+    for (; g_match_info_matches(match); g_match_info_next(match, nullptr))
+    {
+        g_autofree char* group = g_match_info_fetch(match, 1);
+        all.insert(all.end(), group);
+    }
+    return all;
 }
 
 std::string MakeDirectory()
@@ -36,6 +60,7 @@ public:
     Program(std::string files, const std::string& command) : files_(std::move(files))
     {
         g_autoptr(GSubprocessLauncher) launcher = g_subprocess_launcher_new(G_SUBPROCESS_FLAGS_NONE);
+        g_subprocess_launcher_set_cwd(launcher, std::filesystem::path(files_).parent_path().c_str());
         g_subprocess_launcher_set_stdout_file_path(launcher, (files_ + "out").c_str());
         g_subprocess_launcher_set_stderr_file_path(launcher, (files_ + "err").c_str());
         g_auto(GStrv) arguments = nullptr;
@@ -56,17 +81,12 @@ public:
         EXPECT_THAT(Out(), HasSubstr(text)) << Err();
     }
 
-    /// Waits for its end. @return the exit code; -1 when a signal ended it
-    int End()
-    {
-        g_subprocess_wait(process_.get(), nullptr, nullptr);
-        return g_subprocess_get_if_exited(process_.get()) ? g_subprocess_get_exit_status(process_.get()) : -1;
-    }
-
-    int End(int signal)
+    /// Waits for its end, which the signal brings about if there is one. @return the exit code; -1 when a signal ended it
+    int End(int signal = 0)
     {
         g_subprocess_send_signal(process_.get(), signal);
-        return End();
+        g_subprocess_wait(process_.get(), nullptr, nullptr);
+        return g_subprocess_get_if_exited(process_.get()) ? g_subprocess_get_exit_status(process_.get()) : -1;
     }
 
 private:
@@ -80,6 +100,13 @@ struct Outcome
     int exit;
     std::string out, err;
 };
+
+/// The text without what differs from run to run and from machine to machine: times, addresses, directories, widths of columns.
+std::string Steady(const std::string& text)
+{
+    const char* const passing = R"(\d{4}-\d\d-\d\d \d\d:\d\d:\d\d|(?<=waited seconds)  \d+|\d+(?= s:)|unix:[^ "]*|[^ "]*/)";
+    return Replaced(Replaced(text, passing, ""), " +", " ");
+}
 
 /// A bus, a subscriber store and a directory of its own for each test.
 class KivctlTest : public testing::Test
@@ -97,6 +124,14 @@ protected:
     }
 
     Outcome Kivctl(const std::string& arguments) { return Finish(KIVCTL " " + arguments); }
+
+    /// What bash offers behind those words, one a line.
+    std::string Complete(const std::string& words)
+    {
+        return Finish("bash -c 'source " KIV_COMPLETION "; COMP_WORDS=(kivctl " + words +
+                      R"( ""); COMP_CWORD=$((${#COMP_WORDS[@]} - 1)); _kivctl; printf "%s\n" "${COMPREPLY[@]}"')")
+            .out;
+    }
 
     /// Starts a program that says when it is ready.
     std::unique_ptr<Program> Start(const std::string& command)
@@ -124,27 +159,28 @@ TEST_F(KivctlTest, AnswersAndRefusesWithTheDocumentedExitCode)
         const char* out;
         const char* err;
     } const cases[] = {
-        {"--help", 0, "Exit codes:", ""},
-        {"", 2, "", "subcommand is required"},
-        {"nosuchverb", 2, "", "\"nosuchverb\" is no verb"},
-        {"country 450", 0, "name          Korea, South\n", ""},
+        {"", 2, "", "a verb is needed"},
+        {"--version", 0, "kivctl " KIV_VERSION "\n", ""},
+        {"sim wate", 2, "", "did you mean \"wait\"?"},
+        {"sim --slott 1", 2, "", "did you mean \"--slot\"?"},
+        {"sim --profile Singel", 10, "", "did you mean \"single\"?"},
+        {"device set sim1.mscn=1 --profile ./x", 10, "", "did you mean \"sim1.msin\"?"},
+        {"subscribers", 2, "", "a verb is needed: list, add, remove"},
+        {"country 450 kr", 2, "", "one word too many"},
+        {"sim --slot 1 wait", 2, "", "--slot belongs to \"sim\" alone"},
         {"country +590", 0, "alpha2 of calling code  mq\n", ""},
         {"country 352", 0, "Grenada", "--by calling"},
         {"country 352 --by calling", 0, "Luxembourg", ""},
-        {"country 406 --json", 0, "\"name\": \"none recorded for this MCC\"", ""},
         {"country KR", 1, "", "lower-case"},
         {"country 450-1", 2, "", "three digits"},
         {"device id", 1, "", "ServiceUnknown"},
         {"device --profile no-telephony", 0, "no modem answered", ""},
         {"device set runtime.flight-mode=true", 2, "", "--profile"},
+        {"device --show-ids", 0, "imei                356938035643809\n", ""},
+        {"sim --show-ids --json", 0, "\"450050123456789\"", ""},
         {"sim --profile dual-first-locked --json", 0, "\"imsi\": \"PIN required\"", ""},
-        {"sim --profile no-telephony", 1, "", "no modem"},
         {"sim --slot -1", 2, "", "a number from 0 up"},
         {"sim --slot 2", 1, "", "slots count from 0"},
-        {"sim --profile nosuch", 10, "", "nosuch"},
-        {"sim wait", 0, "usable slot     0\n", ""},
-        {"sim wait --profile none", 1, "", "slot 0: no card"},
-        {"sim wait --profile pin-required --timeout 0", 3, "", "slot 0: PIN required"},
         {"notify on", 2, "", "--service"},
         {"notify policy --service 7 --texts a b c", 2, "", "--texts"},
         {"notify on --service 7", 1, "subscribers=0", "nobody has subscribed"},
@@ -167,54 +203,34 @@ TEST_F(KivctlTest, AnswersAndRefusesWithTheDocumentedExitCode)
     }
 }
 
-TEST_F(KivctlTest, ShowsIdentifiersWholeOnlyWhenAsked)
-{
-    EXPECT_THAT(Kivctl("sim").out, AllOf(HasSubstr(" 45005**********  ***********78 "), Not(HasSubstr("450050123456789"))));
-    EXPECT_THAT(Kivctl("sim --show-ids --json").out, AllOf(HasSubstr("\"450050123456789\""), HasSubstr("\"+821012345678\"")));
-    EXPECT_THAT(Kivctl("device").out, HasSubstr("imei                ***********3809\n"));
-    EXPECT_THAT(Kivctl("device --show-ids").out, HasSubstr("imei                356938035643809\n"));
-}
-
 TEST_F(KivctlTest, CarriesEveryNotificationToSubscribersAndToTheServiceManager)
 {
     const auto services = Start(KIVCTL " services --serial S1");
-    const auto all = Start(KIVCTL
-        " subscribe --name a.all --key 7 --kind policy --kind status --kind auth --kind activated --kind number_changed --json");
+    const auto all = Start(
+        KIVCTL " subscribe --name a.all --key 7 --kind policy --kind status --kind auth --kind activated --kind number_changed");
     const auto other = Start(KIVCTL " subscribe --kind status --key 8");
     EXPECT_EQ("device id  S1\n", Kivctl("device id").out);
 
-    struct
-    {
-        const char* arguments;
-        const char* manager; ///< null where the service manager takes none
-        const char* subscriber;
-    } const cases[] = {
-        {"auth-success", "auth imsi='1' success=1\n", R"({"event":"auth","imsi":"1","success":1})"},
-        {"auth-fail", "auth imsi='1' success=0\n", R"({"event":"auth","imsi":"1","success":0})"},
-        {"on --service 7", "status imsi='1' service_id=7 status='on'\n",
-            R"({"event":"status","imsi":"1","service_id":7,"status":"on"})"},
-        {"off --service 7", "status imsi='1' service_id=7 status='off'\n",
-            R"({"event":"status","imsi":"1","service_id":7,"status":"off"})"},
+    const std::pair<std::string, const char*> cases[] = {
+        {"auth-success", "auth imsi='1' success=1\n"},
+        {"auth-fail", "auth imsi='1' success=0\n"},
+        {"on --service 7", "status imsi='1' service_id=7 status='on'\n"},
+        {"off --service 7", "status imsi='1' service_id=7 status='off'\n"},
         {"policy --service 7 --texts w x y z",
-            "policy imsi='1' service_id=7 service_status='w' policy_feature='x' policy_version='y' policy_doc_url='z'\n",
-            R"("service_id":7,"service_status":"w","policy_feature":"x","policy_version":"y","policy_doc_url":"z"})"},
-        {"activated", "activate imsi='1' active=1\n", R"({"event":"activate","imsi":"1","active":1})"},
-        {"deactivated", "activate imsi='1' active=0\n", R"({"event":"activate","imsi":"1","active":0})"},
-        {"number-changed --texts w x y z", nullptr,
-            R"({"event":"number_change","imsi":"1","text1":"w","text2":"x","text3":"y","text4":"z"})"},
+            "policy imsi='1' service_id=7 service_status='w' policy_feature='x' policy_version='y' policy_doc_url='z'\n"},
+        {"activated", "activate imsi='1' active=1\n"},
+        {"deactivated", "activate imsi='1' active=0\n"},
     };
-    for (const auto& row : cases)
+    for (const auto& [arguments, call] : cases)
     {
-        const std::string notify = std::string("notify --imsi 1 ") + row.arguments;
-        EXPECT_EQ("sent subscribers=1 delivered=1\n", Kivctl(notify).out) << row.arguments;
-        all->Await(std::string(row.subscriber) + '\n');
-        if (row.manager)
-        {
-            EXPECT_EQ(0, Kivctl(notify + " --to manager").exit) << row.arguments;
-            services->Await(row.manager);
-        }
+        EXPECT_EQ("sent subscribers=1 delivered=1\n", Kivctl("notify --imsi 1 " + arguments).out) << arguments;
+        EXPECT_EQ(0, Kivctl("notify --to manager --imsi 1 " + arguments).exit) << arguments;
+        all->Await(call);
+        services->Await(call);
     }
 
+    EXPECT_EQ("sent subscribers=1 delivered=1\n", Kivctl("notify --imsi 1 number_changed --texts w x y z").out);
+    all->Await("number_change imsi='1' text1='w' text2='x' text3='y' text4='z'\n");
     EXPECT_EQ("sent subscribers=2 delivered=2\n", Kivctl("notify --imsi 1 on off --service 8 --service 7").out);
     other->Await("status imsi='1' service_id=8 status='on'\n");
 }
@@ -248,20 +264,6 @@ TEST_F(KivctlTest, AClientServiceTakesItsSubscriptionsBackWhenItEnds)
     }
 }
 
-TEST_F(KivctlTest, AWatcherHearsOfChangesOfTheDeviceFile)
-{
-    const std::string profile = " --profile " + directory + "/phone";
-    ASSERT_EQ(0, Kivctl("device set runtime.flight-mode=false" + profile).exit);
-    const auto watcher = Start(KIVCTL " watch --json" + profile);
-    EXPECT_EQ(0, Kivctl("network" + profile).exit);
-
-    ASSERT_EQ(0, Kivctl("device set runtime.flight-mode=true network.cellular=1" + profile).exit);
-    watcher->Await("{\"event\":\"flight_mode\",\"value\":true}\n");
-    EXPECT_EQ(1, Kivctl("network" + profile).exit);
-    EXPECT_EQ(10, Kivctl("device set network.cellular=99" + profile).exit);
-    EXPECT_EQ(0, watcher->End(SIGINT));
-}
-
 TEST_F(KivctlTest, ServicesTakeTheirNamesOrSayWhyNot)
 {
     for (const char* program : {KIV_BOARD_DAEMON, KIV_SERVICE_MANAGER})
@@ -285,10 +287,103 @@ TEST_F(KivctlTest, TellsAMissingBusFromABrokenStore)
     for (const char* arguments :
         {"subscribers list", "notify --imsi 1 auth-fail", "push mail --data d --message m", "subscribe --push a"})
         EXPECT_EQ(6, Kivctl(arguments).exit) << arguments;
+    const Outcome examined = Kivctl("doctor");
+    EXPECT_EQ(1, examined.exit);
+    EXPECT_THAT(Steady(examined.out), AllOf(HasSubstr("bus yes"), HasSubstr("deviced is not on the bus start it: kivctl services"),
+                                          HasSubstr("subscriber store no"), HasSubstr("library yes")));
     bus.Stop();
+    EXPECT_THAT(Steady(Kivctl("doctor --profile nosuch").out), AllOf(HasSubstr("bus no"), HasSubstr("device no")));
     for (const char* arguments : {"device id", "notify --imsi 1 auth-fail", "notify --imsi 1 auth-fail --to manager",
              "push mail --data d --message m", "subscribe --push a", "services"})
         EXPECT_EQ(8, Kivctl(arguments).exit) << arguments;
+}
+
+TEST_F(KivctlTest, PrintsWhatThePagesShow)
+{
+    std::vector<std::pair<std::unique_ptr<Program>, std::string>> beside;
+    const std::string pages = Contents(KIV_DOCS "/profiles.md") + Contents(KIV_DOCS "/kivctl.md");
+    const auto examples = All<std::vector<std::string>>(R"(^\$ kivctl ((?s:.*?))(?=^\$ |^```))", pages);
+    EXPECT_LT(35U, examples.size());
+    for (const std::string& example : examples)
+    {
+        const std::string arguments = example.substr(0, example.find('\n'));
+        const std::string printed = example.substr(arguments.size() + 1);
+        if (arguments.back() == '&')
+        {
+            beside.emplace_back(Start(KIVCTL " " + arguments.substr(0, arguments.size() - 2)), printed);
+            continue;
+        }
+        const Outcome outcome = Kivctl(arguments);
+        const std::string end = outcome.exit ? "(exit code " + std::to_string(outcome.exit) + ")\n" : "";
+        EXPECT_EQ(Steady(printed), Steady(outcome.out + outcome.err + end)) << arguments;
+    }
+    for (const auto& [program, printed] : beside)
+    {
+        program->Await(printed);
+        EXPECT_EQ(printed, program->Out());
+    }
+
+    const auto rows = All(R"(^(\| `kivctl [^`]*` \| (?:object|array) \| .*) \|$)", pages);
+    EXPECT_EQ(13U, rows.size());
+    for (const std::string& row : rows)
+    {
+        const std::string arguments = *All("`kivctl (.*?)`", row).begin();
+        const std::string out = Kivctl("--json --profile single " + arguments).out;
+        std::set<std::string> names = All(R"re("(\w+)": ?)re", out);
+        names.erase("notes");
+        EXPECT_EQ(All(R"(`(\w+)`)", row), names) << arguments;
+        EXPECT_EQ(row.find("| array |") != row.npos, out.front() == '[') << arguments;
+    }
+}
+
+TEST_F(KivctlTest, HelpManPageCompletionAndPageAgreeOnVerbsOptionsAndExitCodes)
+{
+    const std::string man = Replaced(Contents(KIV_MAN_PAGE), R"(\\([-:]))", R"(\1)");
+    const std::string general = Replaced(man, R"((?s)\A.*^\.SH OPTIONS|^\.SH VERBS.*)", "");
+    const char* const inHelp = "(?:^  |\\G,)(--?[a-z-]+)";
+    const char* const inMan = R"((?:^\\fB|\G, )(--?[a-z-]+))";
+    const std::set<std::string> everywhere = All(inHelp, Kivctl("--help").out);
+    EXPECT_EQ(everywhere, All(inMan, general));
+
+    std::vector<std::string> verbs{""};
+    for (size_t i = 0; i < verbs.size(); ++i)
+    {
+        const std::string verb = verbs[i];
+        const std::string help = Kivctl(verb + " --help").out;
+        const std::set<std::string> below = All("^  ([a-z]+)  ", help);
+        for (const std::string& name : below)
+            verbs.push_back(verb + (verb.empty() ? "" : " ") + name);
+
+        std::set<std::string> options = All(inHelp, help);
+        std::set<std::string> described =
+            All(inMan, verb.empty() ? general : Replaced(man, R"((?s)\A.*^\.SS ")" + verb + R"( \[|^\.S.*)", ""));
+        options.insert(everywhere.begin(), everywhere.end());
+        described.insert(everywhere.begin(), everywhere.end());
+        EXPECT_EQ(options, described) << verb;
+
+        const std::string completed = Complete(verb);
+        EXPECT_EQ(options, All("^(-.*)$", completed)) << verb;
+        EXPECT_THAT(All("^(.*)$", completed), testing::IsSupersetOf(below)) << verb;
+    }
+    EXPECT_EQ(20U, verbs.size());
+    EXPECT_EQ("subscribers\nmanager\n", Complete("notify on --to"));
+    EXPECT_THAT(Complete("device set"), HasSubstr("\nruntime.flight-mode=\n"));
+
+    const auto codes = All(R"(^ +(\d+  .*)$)", Kivctl("--help").out);
+    EXPECT_EQ(10U, codes.size());
+    const std::string page = Replaced(Contents(KIV_DOCS "/kivctl.md"), R"(^\| (\d+) \| (.*) \|$)", R"(code \1  \2)");
+    EXPECT_EQ(codes, All(R"(^code (.*)$)", page));
+    EXPECT_EQ(codes, All(R"(^code (.*)$)", Replaced(man, R"(^\\fB(\d+)\\fR\n(.*))", R"(code \1  \2)")));
+}
+
+TEST_F(KivctlTest, ColoursAndReportsProgressOnATerminalOnly)
+{
+    const std::string colour = "\033[1m", progress = "\r\033[Klooking at the bus";
+    const std::string onTerminal = " script --quiet --command '" KIVCTL " doctor' /dev/null";
+    EXPECT_THAT(Finish("env -u NO_COLOR TERM=xterm" + onTerminal).out, AllOf(HasSubstr(colour), HasSubstr(progress)));
+    EXPECT_THAT(Finish("env NO_COLOR=1 TERM=xterm" + onTerminal).out, AllOf(Not(HasSubstr(colour)), HasSubstr(progress)));
+    const Outcome piped = Kivctl("doctor");
+    EXPECT_THAT(piped.out + piped.err, AllOf(HasSubstr("library"), Not(HasSubstr("\033"))));
 }
 
 } // namespace

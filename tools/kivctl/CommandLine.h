@@ -5,7 +5,7 @@
 
 /// Reads the command line.
 /// @param command  receives what it asks for; without a verb when everything is done already, as with --help
-/// @return Done, or Usage after a message on standard error
-Exit ReadCommandLine(int argc, char** argv, Command& command);
+/// Throws Failure.
+void ReadCommandLine(int argc, char** argv, Command& command);
 
 #endif

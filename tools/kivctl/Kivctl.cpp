@@ -1,6 +1,10 @@
 #include "Kivctl.h"
 
+#include "Nearest.h"
+
 #include <SimulatedDevice.h>
+
+#include <unistd.h>
 
 #include <algorithm>
 #include <cstdio>
@@ -58,11 +62,33 @@ std::string DeviceAskedFor(const Command& command)
     return command.profile.empty() && fromEnvironment ? fromEnvironment : command.profile;
 }
 
+std::string UseDevice(const Command& command)
+{
+    const std::string trouble = command.profile.empty() ? kiv::sim::DeviceTrouble() : kiv::sim::UseProfile(command.profile);
+    const std::string device = DeviceAskedFor(command);
+    const bool isFile = device.find('/') != device.npos || access(device.c_str(), F_OK) == 0;
+    return trouble.empty() || isFile ? trouble : trouble + DidYouMean(device, ProfileNames());
+}
+
+void RequireDevice(const Command& command)
+{
+    const std::string trouble = UseDevice(command);
+    if (!trouble.empty())
+        throw Failure(Exit::BadDevice, trouble);
+}
+
+std::vector<std::string> ProfileNames()
+{
+    std::vector<std::string> names;
+    for (const kiv::sim::Profile& profile : kiv::sim::ListProfiles())
+        names.push_back(profile.name);
+    return names;
+}
+
 bool IsProfileName(const std::string& device)
 {
-    const auto profiles = kiv::sim::ListProfiles();
-    return device.empty() || std::any_of(profiles.begin(), profiles.end(),
-                                 [&device](const kiv::sim::Profile& profile) { return profile.name == device; });
+    const std::vector<std::string> names = ProfileNames();
+    return device.empty() || std::find(names.begin(), names.end(), device) != names.end();
 }
 
 void Note(const std::string& text)

@@ -10,7 +10,7 @@
 #include <string>
 #include <vector>
 
-/// Exit codes, the same for every verb and from version to version; --help lists them.
+/// Exit codes, the same for every verb and from version to version.
 enum class Exit : int
 {
     Done = 0,
@@ -23,6 +23,41 @@ enum class Exit : int
     NoBus = 8,
     BusTimedOut = 9,
     BadDevice = 10
+};
+
+/// What an exit code tells.
+struct ExitMeaning
+{
+    Exit code;
+    const char* meaning;
+};
+
+inline constexpr ExitMeaning kExitMeanings[] = {
+    {Exit::Done, "done; the answer is yes"},
+    {Exit::No, "no, not found, not delivered, no reply, something is not well"},
+    {Exit::Usage, "wrong usage"},
+    {Exit::TimeUp, "time is up"},
+    {Exit::Refused, "the library refuses an argument"},
+    {Exit::NoService, "the service can not be addressed"},
+    {Exit::NoStore, "the subscriber store can not be used"},
+    {Exit::NoBus, "the system bus can not be reached"},
+    {Exit::BusTimedOut, "reaching the system bus timed out"},
+    {Exit::BadDevice, "the device file is wrong"},
+};
+
+/// An environment variable that matters.
+struct Variable
+{
+    const char* name;
+    const char* meaning;
+};
+
+inline constexpr Variable kEnvironment[] = {
+    {"DBUS_SYSTEM_BUS_ADDRESS", "the system bus to use"},
+    {"KIV_SUBSCRIBERS", "file of the subscriber store"},
+    {"KIV_PROFILE", "the device where --profile names none"},
+    {"KIV_LOG", "\"error\" or \"info\" shows the platform log on standard error"},
+    {"NO_COLOR", "when not empty, no colour on a terminal either"},
 };
 
 /// What ends a verb early: the exit code, and a text that says what was wrong and what would be right.
@@ -67,6 +102,16 @@ std::string MeaningOf(int code);
 
 /// The device that the command line or the environment asks for; empty for the default one.
 std::string DeviceAskedFor(const Command& command);
+
+/// Makes that device the one to ask: the profile of the command line takes the place of the environment's.
+/// @return what is wrong with it and what would be right; empty when nothing is
+std::string UseDevice(const Command& command);
+
+/// The same, ending the verb when something is wrong.
+void RequireDevice(const Command& command);
+
+/// Names of the profiles that come with the simulated device.
+std::vector<std::string> ProfileNames();
 
 /// Whether `device` names a profile that comes with the simulated device, not a file. Such a device never changes.
 bool IsProfileName(const std::string& device);

@@ -1,4 +1,5 @@
 #include "LibraryLog.h"
+#include "Progress.h"
 #include "Verbs.h"
 
 #include <DADBusManager.h>
@@ -105,7 +106,14 @@ int SendToSubscribers(const NotifyOptions& options, std::string imsi, const std:
 Exit TellSubscribers(const NotifyOptions& options, const std::string& imsi, const std::array<const char*, 4>& texts, Form form)
 {
     Walk walk;
-    const LibraryLog log([&walk](const LibraryLine& line) { walk.Hear(line); });
+    const Progress progress;
+    const LibraryLog log(
+        [&walk, &progress](const LibraryLine& line)
+        {
+            walk.Hear(line);
+            if (!walk.Deliveries().empty())
+                progress.Show("telling " + walk.Deliveries().back().busName);
+        });
 
     // The facade's result tells nothing of the bus, so its connection is asked for first, and kept for the walk.
     int code = 0;
@@ -113,6 +121,7 @@ Exit TellSubscribers(const NotifyOptions& options, const std::string& imsi, cons
     RequireSuccess(connection ? 0 : code, log.Errors());
 
     code = SendToSubscribers(options, imsi, texts);
+    progress.Show("");
     log.RequireStore();
     RequireSuccess(code == 0 && !walk.Refusals().empty() ? 4 : code, walk.Refusals());
 

@@ -8,6 +8,8 @@
 
 #include <algorithm>
 #include <cstdio>
+#include <cstdlib>
+#include <cstring>
 #include <limits>
 #include <numeric>
 #include <type_traits>
@@ -82,8 +84,34 @@ std::string ToText(const Value& value)
 std::string CellText(const Field& field)
 {
     if (std::holds_alternative<std::monostate>(field.value))
-        return "(" + field.note + ")";
+        return field.note.empty() ? "-" : "(" + field.note + ")";
     return ToText(field.value) + (field.note.empty() ? "" : " (" + field.note + ")");
+}
+
+constexpr char kBold[] = "\033[1m";
+constexpr char kFaint[] = "\033[2m";
+constexpr char kGreen[] = "\033[32m";
+constexpr char kRed[] = "\033[31m";
+
+/// How a field's value looks on a terminal.
+const char* Style(const Field& field)
+{
+    if (field.tone != Tone::Plain)
+        return field.tone == Tone::Good ? kGreen : kRed;
+    return std::holds_alternative<std::monostate>(field.value) ? kFaint : "";
+}
+
+bool UsesColour()
+{
+    const char* const refusal = std::getenv("NO_COLOR");
+    const char* const terminal = std::getenv("TERM");
+    return isatty(STDOUT_FILENO) == 1 && !(refusal && *refusal) && terminal && std::strcmp(terminal, "dumb") != 0;
+}
+
+std::string Painted(const std::string& text, const char* style)
+{
+    static const bool usesColour = UsesColour();
+    return usesColour && *style ? style + text + "\033[0m" : text;
 }
 
 /// Characters, not bytes; what is no UTF-8 counts by its bytes.
@@ -117,7 +145,12 @@ std::string LineText(const Value& value)
     return quoted;
 }
 
-using Cells = std::vector<std::vector<std::string>>;
+struct Cell
+{
+    std::string text;
+    const char* style;
+};
+using Cells = std::vector<std::vector<Cell>>;
 
 std::vector<size_t> ColumnWidths(const Cells& rows)
 {
@@ -125,7 +158,7 @@ std::vector<size_t> ColumnWidths(const Cells& rows)
     for (const auto& row : rows)
     {
         for (size_t i = 0; i < row.size(); ++i)
-            widths[i] = std::max(widths[i], Width(row[i]));
+            widths[i] = std::max(widths[i], Width(row[i].text));
     }
     return widths;
 }
@@ -148,11 +181,11 @@ Cells Transposed(const Cells& rows)
     return columns;
 }
 
-void PrintRow(const std::vector<std::string>& cells, const std::vector<size_t>& widths)
+void PrintRow(const std::vector<Cell>& cells, const std::vector<size_t>& widths)
 {
     std::string line;
     for (size_t i = 0; i < cells.size(); ++i)
-        line += i + 1 == cells.size() ? cells[i] : Padded(cells[i], widths[i] + kGap);
+        line += Painted(i + 1 == cells.size() ? cells[i].text : Padded(cells[i].text, widths[i] + kGap), cells[i].style);
     std::puts(line.c_str());
 }
 
@@ -179,7 +212,7 @@ void Print(const Record& record, Form form)
     for (const Field& field : record)
         width = std::max(width, field.name.size());
     for (const Field& field : record)
-        std::puts((Padded(Label(field.name), width + 2) + CellText(field)).c_str());
+        std::puts((Padded(Label(field.name), width + 2) + Painted(CellText(field), Style(field))).c_str());
 }
 
 void PrintTable(const std::vector<Record>& records, Form form)
@@ -197,12 +230,12 @@ void PrintTable(const std::vector<Record>& records, Form form)
 
     Cells rows(1);
     for (const Field& field : records.front())
-        rows.front().push_back(Label(field.name));
+        rows.front().push_back({Label(field.name), kBold});
     for (const Record& record : records)
     {
         rows.emplace_back();
         for (const Field& field : record)
-            rows.back().push_back(CellText(field));
+            rows.back().push_back({CellText(field), Style(field)});
     }
     if (!Fits(ColumnWidths(rows)) && Fits(ColumnWidths(Transposed(rows))))
         rows = Transposed(rows);

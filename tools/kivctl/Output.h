@@ -23,13 +23,22 @@ enum class Identifiers
 /// What a field may hold; std::monostate where a value is missing.
 using Value = std::variant<std::monostate, bool, std::int64_t, double, std::string, std::vector<std::string>>;
 
+/// How a value is coloured on a terminal, unless NO_COLOR is set.
+enum class Tone
+{
+    Plain,
+    Good,
+    Bad
+};
+
 /// One thing to tell. Its name is the JSON key; text shows it with blanks for underscores. A value that is missing has its reason
-/// as the note; a value that is there may have a note too.
+/// as the note, if there is one; a value that is there may have a note too.
 struct Field
 {
     std::string name;
     Value value;
     std::string note = {};
+    Tone tone = Tone::Plain;
 };
 using Record = std::vector<Field>;
 

@@ -1,4 +1,5 @@
 #include "LibraryLog.h"
+#include "Progress.h"
 #include "Verbs.h"
 
 #include <DADBusManager.h>
@@ -27,7 +28,7 @@ public:
             End(trouble_);
     }
 
-    bool AreUnderWay() const { return ended_ < started_; }
+    size_t UnderWay() const { return started_ - ended_; }
     size_t Started() const { return started_; }
     const std::vector<std::string>& Troubles() const { return troubles_; }
     const std::vector<std::string>& Refusals() const { return refusals_; }
@@ -55,6 +56,16 @@ void RequireBus(const LibraryLog& log)
     RequireSuccess(connection ? 0 : code, log.Errors());
 }
 
+void AwaitEnd(const Deliveries& deliveries)
+{
+    const Progress progress;
+    while (deliveries.UnderWay() > 0)
+    {
+        progress.Show(std::to_string(deliveries.UnderWay()) + " of " + std::to_string(deliveries.Started()) + " not answered yet");
+        g_main_context_iteration(nullptr, TRUE);
+    }
+}
+
 } // namespace
 
 Exit Push(const PushOptions& options, const Command& command)
@@ -67,8 +78,7 @@ Exit Push(const PushOptions& options, const Command& command)
         options.service.c_str(), options.data.c_str(), options.message.c_str(), options.time);
     log.RequireStore();
     RequireSuccess(deliveries.Refusals().empty() ? 0 : 4, deliveries.Refusals());
-    while (deliveries.AreUnderWay())
-        g_main_context_iteration(nullptr, TRUE);
+    AwaitEnd(deliveries);
 
     const size_t failed = deliveries.Troubles().size();
     for (const std::string& trouble : deliveries.Troubles())

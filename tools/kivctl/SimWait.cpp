@@ -1,13 +1,11 @@
+#include "Progress.h"
 #include "SimCard.h"
 #include "Verbs.h"
 
 #include <DASystem.h>
 
-#include <unistd.h>
-
 #include <algorithm>
 #include <chrono>
-#include <cstdio>
 #include <thread>
 
 namespace
@@ -44,25 +42,6 @@ std::string Tell(const std::vector<Answer>& answers)
         text += (text.empty() ? "slot " : "; slot ") + std::to_string(answer.slot) + ": " + answer.text;
     return text;
 }
-
-/// One line that is written over on a terminal; nothing anywhere else.
-class Progress
-{
-public:
-    Progress() = default;
-    Progress(const Progress&) = delete;
-    Progress& operator=(const Progress&) = delete;
-    ~Progress() { Show(""); }
-
-    void Show(const std::string& text) const
-    {
-        if (isTerminal_)
-            std::fprintf(stderr, "\r\033[K%s", text.c_str());
-    }
-
-private:
-    const bool isTerminal_ = isatty(STDERR_FILENO) == 1;
-};
 
 } // namespace
 

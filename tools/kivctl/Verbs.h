@@ -38,6 +38,12 @@ Exit ShowDeviceId(const Command& command);
 Exit SetInDeviceFile(const std::vector<std::string>& assignments, const Command& command);
 Exit ShowDeviceKeys(const Command& command);
 Exit ShowProfiles(const Command& command);
+std::vector<std::string> DeviceFileKeys(); ///< "GROUP.KEY", of the first slot where every slot has it
+/// @}
+
+/// @name Doctor.cpp
+/// @{
+Exit Examine(const Command& command);
 /// @}
 
 /// @name Sim.cpp, SimWait.cpp

@@ -1,29 +1,20 @@
 #include "CommandLine.h"
 
 #include <BusParty.h>
-#include <SimulatedDevice.h>
 
 #include <exception>
 
 namespace
 {
 
-/// The profile of the command line takes the place of the environment's; either has to be in order.
-void PrepareDevice(const Command& command)
-{
-    const std::string trouble = command.profile.empty() ? kiv::sim::DeviceTrouble() : kiv::sim::UseProfile(command.profile);
-    if (!trouble.empty())
-        throw Failure(Exit::BadDevice, trouble);
-}
-
 Exit Run(int argc, char** argv)
 {
     Command command;
-    const Exit read = ReadCommandLine(argc, argv, command);
-    if (!command.verb || read != Exit::Done)
-        return read;
+    ReadCommandLine(argc, argv, command);
+    if (!command.verb) // --help and --version did it all
+        return Exit::Done;
     if (command.deviceUse == DeviceUse::Asks)
-        PrepareDevice(command);
+        RequireDevice(command);
     return command.verb();
 }
 

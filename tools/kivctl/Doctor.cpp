@@ -1,0 +1,151 @@
+#include "LibraryLog.h"
+#include "Progress.h"
+#include "Verbs.h"
+
+#include <BoardDaemon.h>
+#include <DADBusManager.h>
+#include <DASubscriberStore.h>
+#include <DASystem.h>
+#include <ServiceManager.h>
+#include <SimulatedDevice.h>
+#include <telephony.h>
+
+#include <dlfcn.h>
+
+#include <cstdlib>
+
+namespace
+{
+
+/// What one look found, and what to do about it; nothing is to be done when all is well.
+struct Finding
+{
+    std::string text;
+    std::string remedy = {};
+};
+
+constexpr int kPatienceMs = 3000; ///< with a service that runs, but may be stuck
+
+Finding LookAtBus(const Command&)
+{
+    const LibraryLog log;
+    int code = 0;
+    g_autoptr(GDBusConnection) connection = DADBusManager::GetInstance()->InitDbusConnection(&code);
+    g_autofree char* address = g_dbus_address_get_for_bus_sync(G_BUS_TYPE_SYSTEM, nullptr, nullptr);
+    const std::string where = address ? address : "no address";
+    if (connection)
+        return {where};
+    return {where + ": " + MeaningOf(code), "start dbus-daemon, and have DBUS_SYSTEM_BUS_ADDRESS tell where it listens"};
+}
+
+Finding LookAtService(const char* busName)
+{
+    g_autoptr(GDBusConnection) connection = g_bus_get_sync(G_BUS_TYPE_SYSTEM, nullptr, nullptr);
+    if (!connection)
+        return {"not asked without a bus", "mend the bus first"};
+    g_autoptr(GError) error = nullptr;
+    g_autoptr(GVariant) reply = g_dbus_connection_call_sync(connection, busName, "/", "org.freedesktop.DBus.Peer", "Ping", nullptr,
+        nullptr, G_DBUS_CALL_FLAGS_NONE, kPatienceMs, nullptr, &error);
+    if (reply)
+        return {std::string(busName) + " answers"};
+    if (g_error_matches(error, G_DBUS_ERROR, G_DBUS_ERROR_SERVICE_UNKNOWN) ||
+        g_error_matches(error, G_DBUS_ERROR, G_DBUS_ERROR_NAME_HAS_NO_OWNER))
+        return {std::string(busName) + " is not on the bus", "start it: kivctl services"};
+    g_dbus_error_strip_remote_error(error);
+    return {std::string(busName) + " does not answer: " + error->message, "look at its process, and start it again"};
+}
+
+Finding LookAtDeviceDaemon(const Command&)
+{
+    return LookAtService(kiv::BoardDaemon::kBusName);
+}
+
+Finding LookAtServiceManager(const Command&)
+{
+    return LookAtService(kiv::ServiceManager::kBusName);
+}
+
+Finding LookAtStore(const Command&)
+{
+    std::vector<DASubscription> subscriptions;
+    std::string reason;
+    if (DASubscriberStore().List(subscriptions, reason) == DASubscriberStore::Outcome::Done)
+        return {DASubscriberStore::Path() + ", subscriptions: " + std::to_string(subscriptions.size())};
+    return {reason, "take the file away, or have KIV_SUBSCRIBERS name another"};
+}
+
+Finding LookAtDevice(const Command& command)
+{
+    const std::string trouble = UseDevice(command);
+    if (!trouble.empty())
+        return {trouble, "name another with --profile or KIV_PROFILE; kivctl device keys lists what a file may hold"};
+    const std::string device = DeviceAskedFor(command);
+    return {(IsProfileName(device) ? "profile " : "file ") + (device.empty() ? "dual" : device) + ", " +
+            kiv::sim::GetDevice().description};
+}
+
+/// The shared library that holds a function, its version in its real name.
+template <typename Function>
+Finding LookAtLibrary(Function* function)
+{
+    Dl_info info{};
+    if (dladdr(reinterpret_cast<void*>(function), &info) == 0 || !info.dli_fname)
+        return {"not to be found in memory", "run kivctl from an installation"};
+    char* const real = realpath(info.dli_fname, nullptr);
+    const LibraryText owner(real);
+    const std::string path = real ? real : info.dli_fname;
+    const size_t end = path.rfind(".so.");
+    const std::string version = end == path.npos ? "unknown" : path.substr(end + 4);
+    if (version == KIV_VERSION)
+        return {path + ", version " + version};
+    return {
+        path + " is of version " + version + ", kivctl of " KIV_VERSION, "look at LD_LIBRARY_PATH, or install the two together"};
+}
+
+Finding LookAtSystemLibrary(const Command&)
+{
+    return LookAtLibrary(&DASystem::GetInstance);
+}
+
+Finding LookAtPlatformLibrary(const Command&)
+{
+    return LookAtLibrary(&telephony_init);
+}
+
+struct Check
+{
+    const char* name;
+    Finding (*look)(const Command&);
+};
+
+constexpr Check kChecks[] = {
+    {"bus", LookAtBus},
+    {"device daemon", LookAtDeviceDaemon},
+    {"service manager", LookAtServiceManager},
+    {"subscriber store", LookAtStore},
+    {"device", LookAtDevice},
+    {"library", LookAtSystemLibrary},
+    {"platform", LookAtPlatformLibrary},
+};
+
+} // namespace
+
+Exit Examine(const Command& command)
+{
+    std::vector<Record> rows;
+    Exit exit = Exit::Done;
+    const Progress progress;
+    for (const Check& check : kChecks)
+    {
+        progress.Show(std::string("looking at the ") + check.name);
+        const Finding finding = check.look(command);
+        const bool isWell = finding.remedy.empty();
+        if (!isWell)
+            exit = Exit::No;
+        rows.push_back({{"check", check.name}, {"ok", isWell, "", isWell ? Tone::Good : Tone::Bad}, {"finding", finding.text},
+            isWell ? Missing("remedy", "") : Field{"remedy", finding.remedy}});
+    }
+    progress.Show("");
+    PrintTable(rows, command.form);
+    return exit;
+}

@@ -1,0 +1,12 @@
+#include "Progress.h"
+
+#include <unistd.h>
+
+#include <cstdio>
+
+void Progress::Show(const std::string& text) const
+{
+    static const bool isTerminal = isatty(STDERR_FILENO) == 1;
+    if (isTerminal)
+        std::fprintf(stderr, "\r\033[K%s", text.c_str());
+}
