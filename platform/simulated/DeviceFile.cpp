@@ -1,5 +1,6 @@
 #include "DeviceFile.h"
 
+#include <algorithm>
 #include <charconv>
 #include <glib.h>
 #include <limits>
@@ -310,8 +311,12 @@ void Assign(GKeyFile* file, const std::string& name, const std::string& assignme
     const std::string group = assignment.substr(0, dot);
     const std::string key = assignment.substr(dot + 1, equals - dot - 1);
     const std::string value = assignment.substr(equals + 1);
-    if (group.find_first_of("[]\n") != std::string::npos || key.find_first_of("[]\n ") != std::string::npos)
-        throw DeviceFileError(name + ": \"" + assignment + "\" has a group or a key with a bracket, a blank or a line end in it");
+    const std::string both = group + key;
+    const auto isControl = [](char ch) { return g_ascii_iscntrl(ch) != FALSE; };
+    if (both.find_first_of("[]") != std::string::npos || key.find(' ') != std::string::npos ||
+        std::any_of(both.begin(), both.end(), isControl))
+        throw DeviceFileError(
+            name + ": \"" + assignment + "\" has a group or a key with a bracket, a blank or a control character in it");
     if (!g_utf8_validate(assignment.data(), static_cast<gssize>(assignment.size()), nullptr))
         throw DeviceFileError(name + ": [" + group + "] " + key + ": the value is not UTF-8");
     g_key_file_set_string(file, group.c_str(), key.c_str(), value.c_str());

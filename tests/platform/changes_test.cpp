@@ -174,6 +174,7 @@ TEST_F(Changes, ThatAreWrongAreRefusedAsAWholeWithGroupAndKeyAndWhatWouldBeRight
         {"network.wifi-connection=-2", "[network] wifi-connection: \"-2\" is wrong; a number from -1 to 3 would be right"},
         {"storage.block-size=4294967296", "[storage] block-size: \"4294967296\" is wrong"},
         {"flight-mode=true", "\"flight-mode=true\" sets nothing; GROUP.KEY=VALUE is needed"},
+        {"run\ttime.wifi=1", "\"run\ttime.wifi=1\" has a group or a key with a bracket, a blank or a control character in it"},
         {"device.serial=\xff", "[device] serial: the value is not UTF-8"},
     };
     const std::string before = Read();
