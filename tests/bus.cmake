@@ -16,4 +16,5 @@ set_tests_properties(bus_kill_test PROPERTIES ENVIRONMENT "${environment}")
 
 add_test(NAME bus_policy COMMAND ${CMAKE_CURRENT_SOURCE_DIR}/bus/policy.sh $<TARGET_FILE:kivctl>
   ${PROJECT_SOURCE_DIR}/dbus/kiv-agent.conf)
-set_tests_properties(bus_policy PROPERTIES TIMEOUT 120)
+set_tests_properties(bus_policy PROPERTIES TIMEOUT 120
+  ENVIRONMENT "TSAN_OPTIONS=suppressions=${CMAKE_CURRENT_SOURCE_DIR}/tsan.supp atexit_sleep_ms=0")
