@@ -76,7 +76,7 @@ TEST_F(Growth, OfPushesThroughALoopIsNextToNothing)
     {
         if (operation.kind != Kind::kPush)
             continue;
-        const double bytes = BytesPerCall(IsLong() ? 10'000 : 2000,
+        const double bytes = BytesPerCall(IsLong() ? 10'000 : 5'000,
             [&](int i)
             {
                 Session session;

@@ -128,7 +128,7 @@ protected:
     /// What bash offers behind those words, one a line.
     std::string Complete(const std::string& words)
     {
-        return Finish("bash -c 'source " KIV_COMPLETION "; COMP_WORDS=(kivctl " + words +
+        return Finish("bash -c 'source <(" KIVCTL " print-bash-completion); COMP_WORDS=(kivctl " + words +
                       R"( ""); COMP_CWORD=$((${#COMP_WORDS[@]} - 1)); _kivctl; printf "%s\n" "${COMPREPLY[@]}"')")
             .out;
     }
@@ -289,7 +289,7 @@ TEST_F(KivctlTest, TellsAMissingBusFromABrokenStore)
         EXPECT_EQ(6, Kivctl(arguments).exit) << arguments;
     const Outcome examined = Kivctl("doctor");
     EXPECT_EQ(1, examined.exit);
-    EXPECT_THAT(Steady(examined.out), AllOf(HasSubstr("bus yes"), HasSubstr("deviced is not on the bus start it: kivctl services"),
+    EXPECT_THAT(Steady(examined.out), AllOf(HasSubstr("bus yes"), HasSubstr("deviced is not on the bus start it: kiv-board-daemon"),
                                           HasSubstr("subscriber store no"), HasSubstr("library yes")));
     bus.Stop();
     EXPECT_THAT(Steady(Kivctl("doctor --profile nosuch").out), AllOf(HasSubstr("bus no"), HasSubstr("device no")));
@@ -338,7 +338,7 @@ TEST_F(KivctlTest, PrintsWhatThePagesShow)
 
 TEST_F(KivctlTest, HelpManPageCompletionAndPageAgreeOnVerbsOptionsAndExitCodes)
 {
-    const std::string man = Replaced(Contents(KIV_MAN_PAGE), R"(\\([-:]))", R"(\1)");
+    const std::string man = Replaced(Kivctl("print-man-page").out, R"(\\([-:]))", R"(\1)");
     const std::string general = Replaced(man, R"((?s)\A.*^\.SH OPTIONS|^\.SH VERBS.*)", "");
     const char* const inHelp = "(?:^  |\\G,)(--?[a-z-]+)";
     const char* const inMan = R"((?:^\\fB|\G, )(--?[a-z-]+))";

@@ -7,6 +7,7 @@
 #include <CLI/CLI.hpp>
 
 #include <algorithm>
+#include <cstring>
 #include <utility>
 
 namespace
@@ -26,7 +27,7 @@ std::string Footer()
     }
     text += "\nEnvironment:";
     for (const Variable& variable : kEnvironment)
-        text += "\n  " + (variable.name + std::string(26, ' ')).substr(0, 26) + variable.meaning;
+        text.append("\n  ").append(variable.name).append(26 - std::strlen(variable.name), ' ').append(variable.meaning);
     return text;
 }
 
@@ -54,7 +55,10 @@ void Restrict(CLI::Option* option, const std::vector<std::string>& words)
         for (const std::string& word : words)
         {
             if (std::equal(typed.begin(), typed.end(), word.begin(), word.end(), same))
-                return typed = word, "";
+            {
+                typed = word;
+                return "";
+            }
         }
         return '"' + typed + "\" is wrong" + DidYouMean(typed, words) + "; right are " + Joined(words, ", ");
     };

@@ -38,7 +38,7 @@ Finding LookAtBus(const Command&)
     return {where + ": " + MeaningOf(code), "start dbus-daemon, and have DBUS_SYSTEM_BUS_ADDRESS tell where it listens"};
 }
 
-Finding LookAtService(const char* busName)
+Finding LookAtService(const char* busName, const std::string& program)
 {
     g_autoptr(GDBusConnection) connection = g_bus_get_sync(G_BUS_TYPE_SYSTEM, nullptr, nullptr);
     if (!connection)
@@ -50,19 +50,19 @@ Finding LookAtService(const char* busName)
         return {std::string(busName) + " answers"};
     if (g_error_matches(error, G_DBUS_ERROR, G_DBUS_ERROR_SERVICE_UNKNOWN) ||
         g_error_matches(error, G_DBUS_ERROR, G_DBUS_ERROR_NAME_HAS_NO_OWNER))
-        return {std::string(busName) + " is not on the bus", "start it: kivctl services"};
+        return {std::string(busName) + " is not on the bus", "start it: " + program + ", or kivctl services for both"};
     g_dbus_error_strip_remote_error(error);
     return {std::string(busName) + " does not answer: " + error->message, "look at its process, and start it again"};
 }
 
 Finding LookAtDeviceDaemon(const Command&)
 {
-    return LookAtService(kiv::BoardDaemon::kBusName);
+    return LookAtService(kiv::BoardDaemon::kBusName, "kiv-board-daemon");
 }
 
 Finding LookAtServiceManager(const Command&)
 {
-    return LookAtService(kiv::ServiceManager::kBusName);
+    return LookAtService(kiv::ServiceManager::kBusName, "kiv-service-manager");
 }
 
 Finding LookAtStore(const Command&)
