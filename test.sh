@@ -9,7 +9,8 @@ usage()
     cat <<'TEXT'
 usage: ./test.sh [--all]
   Builds into build/ and runs the tests under AddressSanitizer with UBSan, under ThreadSanitizer, and plain.
-  --all  the same with clang++ too, and clang-format over all sources, and clang-tidy over all but the tests
+  --all  the same with clang++ too, clang-format over all sources, clang-tidy over all but the tests, 30 seconds of each fuzz
+         target, and the checks of packages, a device's build, documents and country data
 TEXT
 }
 
@@ -52,10 +53,10 @@ if setarch "$(uname -m)" --addr-no-randomize true 2>/dev/null; then
     fixed_addresses=(setarch "$(uname -m)" --addr-no-randomize)
 fi
 
-run_tests() # preset
+run_tests() # preset ctest-option...
 {
     say "$1: tests"
-    "${fixed_addresses[@]}" ctest --preset "$1" --parallel "$(nproc)"
+    "${fixed_addresses[@]}" ctest --preset "$1" --parallel "$(nproc)" "${@:2}"
 }
 
 sources()
@@ -75,17 +76,21 @@ check_tidy()
     quietly run-clang-tidy -quiet -p build/clang -j "$(nproc)" "^$PWD/(lib|platform|tools|bench)/"
 }
 
+only_here=(--label-exclude check)
 if [[ $all ]]; then
     .ci/install-missing
     check_format
     build clang
     check_tidy
-    run_tests clang
+    run_tests clang "${only_here[@]}"
+    say "fuzz targets"
+    ./fuzz.sh 30
 else
     .ci/install-missing build test
 fi
 
 for preset in asan tsan dev; do
     build "$preset"
-    run_tests "$preset"
+    [[ $all && $preset == dev ]] && only_here=()
+    run_tests "$preset" "${only_here[@]}"
 done
