@@ -69,11 +69,12 @@ void Restrict(CLI::Option* option, const std::vector<std::string>& words)
 void RefuseOptions(const CLI::App& verb, const std::string& below)
 {
     const std::string whole = verb.get_name() + " " + below;
+    const std::string rest = " belongs to \"" + verb.get_name() + "\" alone; \"" + whole +
+                             "\" takes its own options behind it: kivctl " + whole + " --help";
     for (const CLI::Option* option : verb.get_options())
     {
         if (option->count() > 0)
-            throw Failure(Exit::Usage, option->get_name() + " belongs to \"" + verb.get_name() + "\" alone; \"" + whole +
-                                           "\" takes its own options behind it: kivctl " + whole + " --help");
+            throw Failure(Exit::Usage, option->get_name() + rest);
     }
 }
 
