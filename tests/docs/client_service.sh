@@ -14,9 +14,9 @@ pids=()
 trap '((${#pids[@]})) && kill "${pids[@]}" 2>/dev/null; wait; rm -rf "$scratch"' EXIT
 cd "$scratch"
 
-block() # language
+block() # language number
 {
-    awk -v fence="\`\`\`$1" '$0 == fence { inside = 1; next } inside && /^```$/ { exit } inside' "$page"
+    awk -v fence="\`\`\`$1" -v number="$2" '/^```$/ { inside = 0 } inside; $0 == fence { inside = ++count == number }' "$page"
 }
 
 fail() # text
@@ -48,23 +48,23 @@ export PKG_CONFIG_PATH LD_LIBRARY_PATH PATH=$scratch/prefix/bin:$PATH
 PKG_CONFIG_PATH=$(dirname "$(find "$scratch/prefix" -name kiv_system.pc)")
 LD_LIBRARY_PATH=$(dirname "$(find "$scratch/prefix" -name libkiv_system.so)")
 if [[ $language == cpp ]]; then
-    block cpp >mail.cpp
-    command=$(block sh)
+    block cpp 1 >mail.cpp
+    command=$(block sh 1)
     eval "${command/g++/$cxx -Wall -Wextra -Werror}"
     service=(./mail)
 else
-    block python >mail.py
+    block python 1 >mail.py
     service=(/usr/bin/python3 mail.py)
 fi
 
-export DBUS_SYSTEM_BUS_ADDRESS=unix:path=$scratch/bus KIV_SUBSCRIBERS=$scratch/subscribers.db
 unset KIV_PROFILE KIV_LOG
-start bus unix: dbus-daemon --config-file="$sources/dbus/private-bus.conf" --address="$DBUS_SYSTEM_BUS_ADDRESS" --nofork \
-    --print-address
+ln -s "$sources/dbus"
+HOME=$scratch eval "$(block sh 2)" >bus.pid 2>bus.log
+pids+=("$(<bus.pid)")
 start service ready "${service[@]}"
 
 # What the page shows once more: what the service printed stands behind its start.
-block console | awk '/^\$ / { file = /^\$ \.\/mail/ ? "heard" : "told"; if (file == "heard") next } { print >file ".expected" }'
+block console 1 | awk '/^\$ / { file = /^\$ \.\/mail/ ? "heard" : "told"; if (file == "heard") next } { print >file ".expected" }'
 while read -r prompt command; do
     [[ $prompt == '$' ]] || continue
     echo "$prompt $command"
