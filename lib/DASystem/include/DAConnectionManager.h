@@ -13,14 +13,14 @@ public:
     /// Any thread; holds a lock of its own.
     static DAConnectionManager* GetInstance();
 
-    DAConnectionManager();
-    virtual ~DAConnectionManager();
+    DAConnectionManager();          ///< holds nothing; GetInstance() gives the one to ask
+    virtual ~DAConnectionManager(); ///< releases nothing
 
     /// Registers the one listener of the process in place of the one before; null unregisters.
     /// @param listener  borrowed until another takes its place
     /// @param userData  handed to the listener with every change
-    /// What the platform answers to the registration is not looked at. Call it in the thread that receives the changes, or
-    /// while none is being delivered: the listener is exchanged without a lock.
+    /// Blocks on the platform; what that answers to the registration is not looked at. Call it in the thread that receives the
+    /// changes, or while none is being delivered: the listener is exchanged without a lock.
     void SetConnectionEventListener(IDAConnectionStateListener* listener, void* userData);
 
     /// @return a connection_cellular_state_e; 0 when the platform does not tell. Blocks on the platform. Any thread.
@@ -33,7 +33,7 @@ public:
     int GetBTNetworkState();
 
     /// Asks for the cellular connection, and for the others that are selected, each with a query of its own.
-    /// @return whether at least one of them is up; a query that fails counts as down
+    /// @return whether at least one of them is up; a query that fails counts as down. Blocks on the platform. Any thread.
     bool IsNetworkConnected(bool checkWifi, bool checkBT);
 
     /// The platform's entry for a changed Wi-Fi device state.

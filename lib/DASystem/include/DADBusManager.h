@@ -21,13 +21,13 @@ public:
     /// Any thread; holds a lock of its own.
     static DADBusManager* GetInstance();
 
-    DADBusManager();
-    virtual ~DADBusManager();
+    DADBusManager();          ///< holds nothing; GetInstance() gives the one to ask
+    virtual ~DADBusManager(); ///< releases nothing
 
     /// Takes the process's shared system-bus connection.
     /// @param error  receives 1 or 3 on failure, else left as it is
     /// @return a new reference, released with g_object_unref(), or null. It does not end the process when the bus goes away.
-    /// Blocks while connecting.
+    /// Blocks while connecting; once for each connection that died and that somebody still holds, 20 milliseconds or so more.
     GDBusConnection* InitDbusConnection(int* error);
 
     /// Asks the device daemon for the board serial number.
@@ -41,6 +41,7 @@ public:
     /// @param reply  borrowed
     /// @param error  receives 2 when the reply is an error message, else left as it is
     /// @return a new text released with g_free(); null when the reply holds none
+    /// Does not block.
     char* ParseDeviceUniqueID(GDBusMessage* reply, int* error);
 
     /// Asks for the device unique ID, the board serial number, afresh on each call.
@@ -50,10 +51,10 @@ public:
     int GetDeviceUniqueID(const char*& uniqueId);
 
     /// Tells the platform's service manager, which is not started when it does not run.
-    /// @param type           1 to 7
-    /// @param imsi           subscriber identity of the SIM concerned
-    /// @param service_id     of types 3, 4 and 5
-    /// @param ServiceStatus  this and the next three: of type 5 only, where all four are required
+    /// @param type        1 to 7
+    /// @param imsi        subscriber identity of the SIM concerned
+    /// @param service_id  of types 3, 4 and 5
+    /// @param ServiceStatus,PolicyFeature,PolicyVersion,PolicyDocURL  of type 5 only, where all four are required
     /// @return a result code
     /// Blocks until the service manager answers or leaves the bus, without a time limit.
     int SendNotiToServiceManager(_KIV_NOTI_TYPE_E type, const char* imsi, int service_id, const char* ServiceStatus,
@@ -83,10 +84,12 @@ public:
     /// @}
 
     /// Starts the delivery of a push message to every subscriber of that service's pushes and returns.
-    /// @param noti_time  any 64-bit value; delivered as it is
+    /// @param service_id          the service whose subscribers are told
+    /// @param noti_data,noti_msg  what the message carries; not read here
+    /// @param noti_time           any 64-bit value; delivered as it is
     /// @return 0, also when a text is refused; what became of a delivery stands in the log only
-    /// Does not wait for the bus. The deliveries go on in the thread-default main context of the calling thread, which must be
-    /// iterated.
+    /// Blocks on the subscriber store; does not wait for the bus. The deliveries go on in the thread-default main context of the
+    /// calling thread, which must be iterated.
     int DeliverPushMessage(const char* service_id, const char* noti_data, const char* noti_msg, long long noti_time);
 
     static DADBusManager* __pInstance; ///< the instance, null until it is made

@@ -24,8 +24,8 @@ public:
     /// Any thread; holds a lock of its own.
     static DASimManager* GetInstance();
 
-    DASimManager();
-    virtual ~DASimManager();
+    DASimManager();          ///< holds nothing; GetInstance() gives the one to ask
+    virtual ~DASimManager(); ///< releases nothing
 
     /// @name Telephony handles
     /// @{
@@ -61,15 +61,18 @@ public:
     bool IsSimExist();
 
     /// @param list  open handle list; borrowed, stays open
+    /// @param slot  0-based
     /// @return whether the SIM of that slot is available. Holds the lock around the one read.
     bool IsSimAvailable(telephony_handle_list_s list, int slot);
 
     /// Reads the card status of a slot.
+    /// @param slot    0-based
     /// @param status  receives the status when it was read
     /// @return whether the card's initialisation is completed. Holds the lock.
     bool IsAvaliableState(int slot, TelSimCardStatus_t* status);
 
     /// Waits until the card of a slot is usable or never will be, asking once a second.
+    /// @param slot    0-based
     /// @param status  receives the last status read
     /// @return whether the card's initialisation is completed; false also when no modem answered 100 attempts to open it
     /// Has no bound once the modem answers: a card that waits for its PIN is waited for. A slot that is none is attempted 100 times
@@ -103,6 +106,7 @@ public:
     /// @}
 
     /// Reads the subscriber number behind one handle.
+    /// @param handle  one of an open handle list; borrowed, stays open
     /// @param number  receives the platform's text, released with free(), possibly null
     /// @return whether the platform answered. Holds the lock.
     bool GetPhoneNumber(telephony_data** handle, char** number);
@@ -112,6 +116,7 @@ public:
     bool GetSimInfo(const char* cpName, std::string* mcc, std::string* mnc, std::string* msin);
 
     /// Reads whether the device is roaming on a slot that is in service.
+    /// @param slot     0-based
     /// @param roaming  written on success only
     /// @return whether it was read; false also out of service. Holds the lock.
     bool GetRoamingStatus(int slot, bool* roaming);
@@ -135,6 +140,7 @@ public:
     /// @}
 
     /// Tells whether an SMS can be sent on a slot.
+    /// @param slot         0-based
     /// @param status       receives the card status, which is not judged
     /// @param serviceType  receives the network service type: 0 unknown, 1 none, 2 emergency only, 3 searching, 4 and above real
     /// @return whether the card status was read and the service type is above 3. Holds the lock.

@@ -28,8 +28,8 @@ public:
     /// Any thread; holds a lock of its own.
     static DASystem* GetInstance();
 
-    DASystem();
-    virtual ~DASystem();
+    DASystem();          ///< holds nothing; GetInstance() gives the one to ask
+    virtual ~DASystem(); ///< releases nothing
 
     /// @name Connection state
     /// As DAConnectionManager tells of the members of the same names.
@@ -129,7 +129,8 @@ public:
     int GetPhoneNumberFromSim(char** number);
 
     /// Appends the MCC of every SIM that answers; a SIM that does not leaves no gap.
-    /// @param count  receives the number appended by this call; like the vector untouched when telephony can not be opened
+    /// @param values  each text appended is released with free()
+    /// @param count   receives the number appended by this call; like the vector untouched when telephony can not be opened
     void GetMCCFromSim(std::vector<char*>* values, int* count);
 
     /// Appends the MNC of every SIM that answers, as the MCC one does.
@@ -184,7 +185,8 @@ public:
     void GetCountryNameFromCountryCallingCode(const char* countryCallingCode, char** countryName);
 
     /// Calling code to alpha-2 code, despite the name; the out-parameter is untouched when no country has that calling code.
-    /// @param countryCode  receives constant text of the library, which the caller neither frees nor changes
+    /// @param countryCallingCode  bare digits
+    /// @param countryCode         receives constant text of the library, which the caller neither frees nor changes
     void GetCountryNameAlpha2FromCountryCallingCode(const char* countryCallingCode, char** countryCode);
     /// @}
 
@@ -198,15 +200,17 @@ public:
 
     /// Tells every client service that subscribed to the event, one after the other. The service manager is told with the member
     /// of DADBusManager of the same name.
-    /// @param imsi           subscriber identity of the SIM concerned
-    /// @param service_id     of types 3, 4 and 5
-    /// @param ServiceStatus  this and the next three: texts of types 5 and 8, all four required
+    /// @param type        what it is about
+    /// @param imsi        subscriber identity of the SIM concerned
+    /// @param service_id  of types 3, 4 and 5
+    /// @param ServiceStatus,PolicyFeature,PolicyVersion,PolicyDocURL  texts of types 5 and 8, all four required
     /// @return 0 once dispatched, whatever became of the calls; 4 when the type is unknown or a text of type 5 is null
     /// Blocks until the last subscriber answered or left the bus, without a time limit.
     int SendNotiToServiceManager(_KIV_NOTI_TYPE_E type, const char* imsi, int service_id, const char* ServiceStatus,
         const char* PolicyFeature, const char* PolicyVersion, const char* PolicyDocURL);
 
     /// Sends one status notification an entry, in order.
+    /// @param imsi         subscriber identity of the SIM concerned
     /// @param count        number of entries of both arrays, at least 1
     /// @param service_ids  one service a notification
     /// @param statuses     one status text a notification
@@ -270,6 +274,7 @@ public:
     /// @}
 
     /// @name Device language
+    /// None blocks but the first.
     /// @{
 
     /// The language that the device is set to; "en_us" stands in for a setting that can not be read.
@@ -280,6 +285,7 @@ public:
     int GetDeviceLanguageCode(char** languageCode, bool isISO639);
 
     /// ISO 639-1 code in upper case to ISO 639-2 code.
+    /// @param deviceLang      ISO 639-1, upper case
     /// @param iso639LangCode  receives constant text of the library, which the caller must not free; null when there is none
     void GetISO639LangCodeFromDeviceLang(std::string deviceLang, char** iso639LangCode);
 

@@ -18,7 +18,9 @@ public:
     virtual void OnWifiDeviceStateChanged(wifi_device_state_e state, void* userData) = 0;
 
     /// The Wi-Fi connection state changed.
-    /// @param ap  the platform's access point handle; borrowed for the call
+    /// @param state     the new one
+    /// @param ap        the platform's access point handle; borrowed for the call
+    /// @param userData  as of the registration
     virtual void OnWifiConnectionStateChanged(wifi_connection_state_e state, void* ap, void* userData) = 0;
 
     /// Flight mode was switched.

@@ -10,9 +10,9 @@
 /// One line of the store: who hears of which event.
 struct DASubscription
 {
-    std::string kind; ///< "policy", "status", "auth", "activated", "number_changed" or "push"
-    std::string key;  ///< decimal service id, service name for "push", or "all"
-    _SubscriberInfo subscriber;
+    std::string kind;           ///< "policy", "status", "auth", "activated", "number_changed" or "push"
+    std::string key;            ///< decimal service id, service name for "push", or "all"
+    _SubscriberInfo subscriber; ///< where to call
 };
 
 /// The subscriptions of the device: one SQLite file that several processes read and write at the same time.

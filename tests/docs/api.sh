@@ -1,0 +1,10 @@
+#!/usr/bin/env bash
+# The pages of the headers are made without a warning: whatever is public is documented.
+# usage: api.sh SOURCE_DIR
+set -euo pipefail
+command -v doxygen >/dev/null || { echo "skipped: doxygen is not installed"; exit 77; }
+cd "$1"
+pages=$(mktemp -d)
+trap 'rm -rf "$pages"' EXIT
+doxygen - <<<"$(<docs/Doxyfile)
+OUTPUT_DIRECTORY = $pages"
