@@ -4,7 +4,7 @@ target_compile_definitions(kiv_test_bus PRIVATE KIV_PRIVATE_BUS_CONF="${PROJECT_
 target_link_libraries(kiv_test_bus PRIVATE kiv_compile PUBLIC GTest::gmock PkgConfig::GIO)
 set_property(TARGET kiv_test_bus PROPERTY KIV_UNOPTIMIZED ON)
 
-foreach(subject IN ITEMS notification outage connection kill)
+foreach(subject IN ITEMS notification outage connection kill traffic)
   kiv_test(bus_${subject}_test bus/${subject}_test.cpp bus/Subscribers.cpp push/PushSubscribers.cpp)
   target_link_libraries(bus_${subject}_test PRIVATE kiv_test_bus)
 endforeach()

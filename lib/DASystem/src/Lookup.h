@@ -82,8 +82,11 @@ auto FirstRow(const char* key) -> decltype(&Table[0])
     const auto wanted = Pack<typename Column::Word>(key);
 
     std::size_t row = 0;
-    while (row + kBlock <= Column::kRows && !BlockHolds<Column>(row, wanted))
-        row += kBlock;
+    if constexpr (Column::kRows >= kBlock)
+    {
+        while (row + kBlock <= Column::kRows && !BlockHolds<Column>(row, wanted))
+            row += kBlock;
+    }
     for (; row < Column::kRows; ++row)
     {
         if (Column::kKeys[row] == wanted)
@@ -100,8 +103,11 @@ auto LastRow(const char* key) -> decltype(&Table[0])
     const auto wanted = Pack<typename Column::Word>(key);
 
     std::size_t end = Column::kRows;
-    while (end >= kBlock && !BlockHolds<Column>(end - kBlock, wanted))
-        end -= kBlock;
+    if constexpr (Column::kRows >= kBlock)
+    {
+        while (end >= kBlock && !BlockHolds<Column>(end - kBlock, wanted))
+            end -= kBlock;
+    }
     for (; end > 0; --end)
     {
         if (Column::kKeys[end - 1] == wanted)

@@ -1,0 +1,22 @@
+#!/usr/bin/env bash
+# Holds what was built against what hardening asks for.
+# usage: hardening.sh READELF FILE...   the first of them calls something that _FORTIFY_SOURCE watches
+set -euo pipefail
+readelf=$1
+shift
+
+must() # what file pattern text
+{
+    grep --quiet --extended-regexp -e "$3" <<<"$4" || { echo "$2: $1 is missing"; exit 1; }
+}
+
+for file in "$@"; do
+    segments=$("$readelf" --wide --program-headers "$file")
+    dynamic=$("$readelf" --wide --dynamic "$file")
+    symbols=$("$readelf" --wide --dyn-syms "$file")
+    must "a stack that can not be executed" "$file" 'GNU_STACK .* RW +0x' "$segments"
+    must "a read-only relocation segment" "$file" GNU_RELRO "$segments"
+    must "binding of all symbols at loading" "$file" 'BIND_NOW|\(FLAGS_1\).*NOW' "$dynamic"
+    must "the stack protector" "$file" ' UND +__stack_chk_fail' "$symbols"
+done
+must "a function of _FORTIFY_SOURCE" "$1" ' UND +__[a-z]+_chk@' "$("$readelf" --wide --dyn-syms "$1")"
