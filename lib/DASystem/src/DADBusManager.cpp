@@ -83,17 +83,19 @@ private:
 /// the context in which it was made, and until that source has run, the dead connection stays the shared one; so that context
 /// lives as long as the process. The lock is recursive for an agent whose own "closed" handler calls the library.
 std::recursive_mutex connectLock;
+GMainContext* connectContext = nullptr; // made under the lock, and then there for good
 gboolean OutliveBus(GSignalInvocationHint* hint, guint count, const GValue* values, gpointer context);
+
+/// The context, made on first use; the lock is held.
 GMainContext* ConnectContext()
 {
-    static GMainContext* const context = []
+    if (connectContext == nullptr)
     {
-        GMainContext* const made = g_main_context_new();
+        connectContext = g_main_context_new();
         g_type_class_ref(G_TYPE_DBUS_CONNECTION); // which brings its signals into being, and stays
-        g_signal_add_emission_hook(g_signal_lookup("closed", G_TYPE_DBUS_CONNECTION), 0, OutliveBus, made, nullptr);
-        return made;
-    }();
-    return context;
+        g_signal_add_emission_hook(g_signal_lookup("closed", G_TYPE_DBUS_CONNECTION), 0, OutliveBus, connectContext, nullptr);
+    }
+    return connectContext;
 }
 
 /// Whether the calling thread is dispatching something of a context.
@@ -131,7 +133,7 @@ bool IsPassing(GDBusConnection* connection)
 {
     if (connection == nullptr || !g_dbus_connection_is_closed(connection))
         return false;
-    if (IsDispatching(ConnectContext()))
+    if (IsDispatching(connectContext))
         return false;
     g_autoptr(GObject) held = static_cast<GObject*>(g_weak_ref_get(&heldConnection));
     return held != G_OBJECT(connection);
@@ -273,15 +275,15 @@ GVariant* StructureArgument(Values values)
 /// One kind of notification: what the store is asked for, and what is called.
 struct Notification
 {
-    const char* kind;
-    const char* key; ///< null: the service id
-    const char* method;
+    char kind[16];
+    char key[4]; ///< empty: the service id
+    char method[16];
 };
 
 // clang-format off
 //                                     kind              key      method
-constexpr Notification kPolicy        {"policy",         nullptr, "policy"};
-constexpr Notification kStatus        {"status",         nullptr, "status"};
+constexpr Notification kPolicy        {"policy",         "",      "policy"};
+constexpr Notification kStatus        {"status",         "",      "status"};
 constexpr Notification kAuth          {"auth",           "all",   "auth"};
 constexpr Notification kActivated     {"activated",      "all",   "activate"};
 constexpr Notification kNumberChanged {"number_changed", "all",   "number_change"};
@@ -382,7 +384,7 @@ int Notify(const Place& here, const Notification& notification, int serviceId, V
             std::list<_SubscriberInfo> subscribers;
             char serviceKey[10] = {}; // as wide as the store's keys: what is longer is asked for by its first nine characters
             g_snprintf(serviceKey, sizeof serviceKey, "%d", serviceId);
-            store.GetSubscriber(notification.kind, notification.key == nullptr ? serviceKey : notification.key, subscribers);
+            store.GetSubscriber(notification.kind, notification.key[0] == '\0' ? serviceKey : notification.key, subscribers);
 
             if (!subscribers.empty())
             {
