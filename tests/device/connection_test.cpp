@@ -72,18 +72,6 @@ struct ConnectionTest : DeviceTest
     Listener listener;
 };
 
-TEST_F(ConnectionTest, StateGoesThroughAsThePlatformHasIt)
-{
-    for (const StateQuery& query : {kCellular, kWifi, kBluetooth})
-    {
-        for (const int state : {0, 2, 99, -1, 5})
-        {
-            Set(query.fact, state);
-            EXPECT_EQ(state, std::invoke(query.ask, facade));
-        }
-    }
-}
-
 TEST_F(ConnectionTest, IsUpWhenOneOfTheSelectedIsAndAllOfThemAreAsked)
 {
     for (unsigned bits = 0; bits < 32; ++bits)
@@ -102,6 +90,14 @@ TEST_F(ConnectionTest, IsUpWhenOneOfTheSelectedIsAndAllOfThemAreAsked)
         const bool isUp = cellular || (checkWifi && wifi) || (checkBluetooth && bluetooth);
         EXPECT_EQ(isUp, facade.IsNetworkConnected(checkWifi, checkBluetooth)) << bits;
         EXPECT_EQ(calls, TakeCalls()) << bits;
+    }
+    for (const StateQuery& query : {kCellular, kWifi, kBluetooth})
+    {
+        for (const int state : {0, 99, -1}) // goes through as the platform has it
+        {
+            Set(query.fact, state);
+            EXPECT_EQ(state, std::invoke(query.ask, facade));
+        }
     }
 }
 

@@ -92,9 +92,8 @@ TEST_F(Changes, AreNotBeingToldAnyMoreWhenAnUnregistrationFromAnotherThreadRetur
     changer.join();
 }
 
-TEST_F(Changes, MayEndTheirRegistrationWhileTheyAreToldAndThenNoThreadWaitsForMore)
+TEST_F(Changes, MayEndTheirRegistrationWhileTheyAreTold)
 {
-    const auto countThreads = [] { return std::distance(std::filesystem::directory_iterator("/proc/self/task"), {}); };
     const auto callback = [](runtime_info_key_e key, void* /*userData*/)
     {
         EXPECT_EQ(0, runtime_info_unset_changed_cb(key));
@@ -102,21 +101,11 @@ TEST_F(Changes, MayEndTheirRegistrationWhileTheyAreToldAndThenNoThreadWaitsForMo
         told.Add("once");
     };
     EXPECT_EQ(0, runtime_info_set_changed_cb(kKey, callback, nullptr));
-    const auto threads = countThreads();
     Set("runtime.flight-mode=true");
     EXPECT_THAT(told.Take(1), ElementsAre("once")) << "on the thread that follows the file";
-    const auto end = std::chrono::steady_clock::now() + std::chrono::seconds(10);
-    while (countThreads() >= threads && std::chrono::steady_clock::now() < end)
-        std::this_thread::yield();
-    EXPECT_LT(countThreads(), threads);
-
     Set("runtime.flight-mode=false");
     EXPECT_EQ(0, runtime_info_set_changed_cb(kKey, OnChange, nullptr));
     EXPECT_THAT(told.Take(1), ElementsAre("off")) << "what changed meanwhile";
-    EXPECT_EQ(0, runtime_info_set_changed_cb(kKey, callback, nullptr));
-    ChangeDevice([](Device& device) { device.flightMode = true; });
-    ChangeDevice([](Device& device) { device.flightMode = false; });
-    EXPECT_THAT(told.Take(), ElementsAre("once"));
 }
 
 TEST_F(Changes, OfAFileAreToldHoweverItIsWrittenAndThoseThatBreakItAreComplainedAboutOnce)
