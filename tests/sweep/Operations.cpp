@@ -171,13 +171,16 @@ constexpr bool TakesHandle(Result (Class::*)(Parameters...))
 
 // The table ----------------------------------------------------------------------------------------------------------------------
 
+/// The symbol of a member, readable: "DASystem::GetIMEI(char**)".
 template <class Function>
 std::string SymbolOf(Function function)
 {
     void* address = nullptr;
     std::memcpy(&address, &function, sizeof address);
     Dl_info info{};
-    return dladdr(address, &info) != 0 && info.dli_sname != nullptr ? info.dli_sname : "";
+    const char* const symbol = dladdr(address, &info) == 0 ? nullptr : info.dli_sname;
+    const std::unique_ptr<char, decltype(&std::free)> readable(abi::__cxa_demangle(symbol, nullptr, nullptr, nullptr), std::free);
+    return readable ? readable.get() : "";
 }
 
 struct Table
@@ -195,9 +198,7 @@ struct Table
     /// Adds members that one function calls.
     Table& AddRun(std::vector<std::string> symbols, const std::function<std::string(Session&)>& run, const Story& good)
     {
-        const std::unique_ptr<char, decltype(&std::free)> readable(
-            abi::__cxa_demangle(symbols[0].c_str(), nullptr, nullptr, nullptr), std::free);
-        const std::string name = readable ? readable.get() : symbols[0];
+        const std::string name = symbols[0];
         const auto withoutBlank = [run](Session& session)
         {
             const std::string told = run(session);

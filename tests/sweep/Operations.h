@@ -56,8 +56,8 @@ enum class SimLock
 /// One operation with typical arguments; one that opens and the one that closes are called together.
 struct Operation
 {
-    std::vector<std::string> symbols; ///< as the library exports its members
-    std::string name;
+    std::vector<std::string> symbols; ///< the members that it calls, as the library exports them
+    std::string name;                 ///< the first of them
     Kind kind = Kind::kSingle;
     SimLock lock = SimLock::kAroundReads;
     bool needsHandle = false; ///< the first of the session
