@@ -9,12 +9,6 @@
 #include <DADBusManager.h>
 #include <DASystem.h>
 
-#include <gmock/gmock.h>
-#include <gtest/gtest.h>
-
-#include <string>
-#include <vector>
-
 namespace kiv::test
 {
 

@@ -2,10 +2,7 @@
 //   KIV_KILL_ROUNDS=1000 KIV_KILL_SEED=7 bus_kill_test
 #include "bus/BusTest.h"
 
-#include <atomic>
-#include <cstdlib>
 #include <random>
-#include <thread>
 
 namespace
 {

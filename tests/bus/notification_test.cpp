@@ -113,12 +113,7 @@ TEST_F(RefusedNotification, IsOneWithATextThatTheBusCanNotCarry)
 {
     constexpr char kBad[] = "caf\xe9";
     char badImsi[] = "4500\xff";
-    const struct
-    {
-        const char* function;
-        const char* argument;
-        int code;
-    } cases[] = {
+    const std::tuple<const char*, const char*, int> cases[] = {
         {"SendNotiToServiceManager", "imsi",
             manager.SendNotiToServiceManager(KIV_NOTI_TYPE_AUTH_FAIL, badImsi, 7, "a", "b", "c", "d")},
         {"SendNotiToServiceManager", "PolicyDocURL",
@@ -205,26 +200,6 @@ TEST_F(Notification, ToTheServiceManagerTellsWhetherItWasAnswered)
     EXPECT_EQ(2, NotifyServiceManager(KIV_NOTI_TYPE_ACTIVATED)) << "it is not there";
     const auto noResult = StartsWith(Line("no call result: "));
     EXPECT_THAT(log.TakeErrors(), ElementsAre(AllOf(noResult, HasSubstr("not today")), noResult, noResult));
-}
-
-TEST_F(Notification, RunsNothingOfTheCallersAndLeavesItsContextAlone)
-{
-    Subscribe(client);
-    int ran = 0;
-    const auto count = [](gpointer counter) -> gboolean { return ++*static_cast<int*>(counter) > 0; };
-    g_autoptr(GMainContext) own = g_main_context_new();
-    g_autoptr(GSource) idle = g_idle_source_new();
-    g_source_set_callback(idle, count, &ran, nullptr);
-    g_source_attach(idle, own);
-    const guint idleOfDefault = g_idle_add(count, &ran);
-    g_main_context_push_thread_default(own);
-    EXPECT_EQ(0, NotifySubscribers(KIV_NOTI_TYPE_STATUS_ON));
-    EXPECT_EQ(0, NotifyServiceManager(KIV_NOTI_TYPE_STATUS_ON));
-    EXPECT_EQ(own, g_main_context_get_thread_default());
-    g_main_context_pop_thread_default(own);
-    EXPECT_EQ(0, ran);
-    EXPECT_EQ(1U, client.Calls().size());
-    g_source_remove(idleOfDefault);
 }
 
 TEST_F(BusTest, AsksTheBoardDaemonForTheSerialNumberAfreshEachTime)

@@ -1,17 +1,10 @@
 #ifndef KIV_TESTS_LOOKUPS_H
 #define KIV_TESTS_LOOKUPS_H
 
+#include "support/Test.h"
+
 #include <DASimManager.h>
 #include <DASystem.h>
-
-#include <algorithm>
-#include <cstdlib>
-#include <fstream>
-#include <functional>
-#include <optional>
-#include <sstream>
-#include <string>
-#include <vector>
 
 namespace kiv::test
 {

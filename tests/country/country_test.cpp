@@ -2,11 +2,7 @@
 #include "country/Lookups.h"
 #include "support/LogCapture.h"
 
-#include <gmock/gmock.h>
-#include <gtest/gtest.h>
-
 #include <cctype>
-#include <set>
 
 namespace
 {

@@ -2,8 +2,6 @@
 #include "device/DeviceTest.h"
 
 #include <cmath>
-#include <functional>
-#include <tuple>
 
 namespace
 {

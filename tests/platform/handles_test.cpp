@@ -1,9 +1,9 @@
+#include "support/Test.h"
+
 #include <ITapiSim.h>
 #include <SimulatedDevice.h>
 #include <net_connection.h>
 #include <telephony.h>
-
-#include <gmock/gmock.h>
 
 using namespace kiv::sim;
 using testing::StartsWith;

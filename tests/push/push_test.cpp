@@ -1,9 +1,7 @@
 // Pushes to the client services of a private bus, which go on in the main loop of the caller's thread.
 #include "bus/BusTest.h"
 
-#include <algorithm>
 #include <limits>
-#include <thread>
 
 namespace
 {
@@ -137,12 +135,21 @@ TEST_F(Push, WaitsForTheLoopOfTheThreadDefaultContextOfWhoeverStartedIt)
     const auto deliver = [&]
     {
         g_autoptr(GMainContext) context = g_main_context_new();
+        g_autoptr(GSource) idle = g_idle_source_new();
+        int ran = 0;
+        g_source_set_callback(
+            idle, [](gpointer count) -> gboolean { return ++*static_cast<int*>(count) == 0; }, &ran, nullptr);
+        g_source_attach(idle, context);
         g_main_context_push_thread_default(context);
         Deliver();
+        EXPECT_EQ(
+            0, NotifySubscribers(KIV_NOTI_TYPE_AUTH_SUCCESS)); // a synchronous call gets through, and runs nothing of the caller's
+        EXPECT_EQ(context, g_main_context_get_thread_default());
         g_main_context_pop_thread_default(context);
-        EXPECT_EQ(0, NotifySubscribers(KIV_NOTI_TYPE_AUTH_SUCCESS)); // a synchronous call gets through
+        EXPECT_EQ(0, ran);
         EXPECT_THAT(client.Calls().back(), HasSubstr(".auth "));
         RunUntilEnded(1, "free_user_data", context);
+        EXPECT_EQ(1, ran);
         while (g_main_context_iteration(context, FALSE)) // GDBus tidies up after the proxy
         {
         }

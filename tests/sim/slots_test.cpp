@@ -5,7 +5,6 @@
 #include <DASimManager.h>
 #include <DASystem.h>
 
-#include <algorithm>
 #include <climits>
 #include <numeric>
 
@@ -23,12 +22,6 @@ const std::string kNotAvailable = Line("IsSimAvailable", "Sim is not available")
 
 struct Slots : Sweep
 {
-    static const Operation& Find(const std::string& name)
-    {
-        const auto isIt = [&](const Operation& operation) { return operation.name == name; };
-        return *std::find_if(Operations().begin(), Operations().end(), isIt);
-    }
-
     Story Ask(const Operation& operation)
     {
         return Try(
@@ -42,11 +35,9 @@ TEST_F(Slots, ThatDoNotAnswerArePassedOver)
     const std::vector<sim::SimSlot> slots = {{"modem0", {4}, {}, "449", "04", "0123456789", "0000", {}},
         {"modem1", {3}, {}, {}, "05", "0123456780", {}, {}}, {"modem2", {3}, {}, "451", "012", "0123456781", "", {}},
         {"modem3", {4}, {}, "452", "99", "0123456782", "0003", {}}, {"modem4", {3}, {}, "453", "98", "0123456783", "0004", {}}};
-    const struct
-    {
-        std::string member, line, failed, first, second;
-    } texts[] = {{"MCC", "MCC", "4", "451", "453"}, {"MNC", "MNC", "4", "012", "98"},
-        {"IMSI", "imsi", "4", "4510120123456781", "453980123456783"}, {"PhoneNumber", "phoneNumber", "-39841791", "", "0004"}};
+    const std::tuple<std::string, std::string, std::string, std::string, std::string> texts[] = {{"MCC", "MCC", "4", "451", "453"},
+        {"MNC", "MNC", "4", "012", "98"}, {"IMSI", "imsi", "4", "4510120123456781", "453980123456783"},
+        {"PhoneNumber", "phoneNumber", "-39841791", "", "0004"}};
     for (const auto& [member, what, failed, text2, text4] : texts)
     {
         const Operation& first = Find("DASystem::Get" + member + "FromSim(char**)");
@@ -109,12 +100,7 @@ TEST_F(Slots, AreJudgedByWhatTheModemSays)
     };
     const char kExist[] = "DASystem::IsSimExist()", kRoaming[] = "DASystem::GetRoamingStatus(int, bool*)",
                kSms[] = "DASystem::IsAvaliableSendSMS(int, TelSimCardStatus_t*, int*)";
-    const struct
-    {
-        const char* operation;
-        void (*change)(sim::SimSlot& slot);
-        Story story;
-    } cases[] = {
+    const std::tuple<const char*, void (*)(sim::SimSlot&), Story> cases[] = {
         {kExist, [](sim::SimSlot& slot) { slot.simState = 0; }, state("TELEPHONY_SIM_STATE_UNAVAILABLE")},
         {kExist, [](sim::SimSlot& slot) { slot.simState = 3; }, state("TELEPHONY_SIM_STATE_UNKNOWN")},
         {kExist, [](sim::SimSlot& slot) { slot.simState = 4; }, state("-")},

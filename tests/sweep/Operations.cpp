@@ -7,14 +7,9 @@
 #include <DASystem.h>
 #include <SimulatedLog.h>
 
-#include <cstdlib>
 #include <cstring>
 #include <cxxabi.h>
 #include <dlfcn.h>
-#include <filesystem>
-#include <memory>
-#include <sstream>
-#include <tuple>
 
 namespace kiv::test
 {
@@ -548,6 +543,12 @@ const std::vector<Operation>& Operations()
         return t.rows;
     }();
     return operations;
+}
+
+bool Operation::IsLockedAt(Call call) const
+{
+    return lock == SimLock::kWhole || call == Call::telephony_sim_get_state || call == Call::telephony_sim_get_subscriber_number ||
+           call == Call::tel_get_sim_imsi;
 }
 
 bool IsLong()

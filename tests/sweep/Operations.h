@@ -6,11 +6,6 @@
 #include <SimulatedDevice.h>
 #include <telephony.h>
 
-#include <atomic>
-#include <functional>
-#include <string>
-#include <vector>
-
 namespace kiv::test
 {
 
@@ -65,6 +60,8 @@ struct Operation
     Story good; ///< on the profile "dual"
     std::vector<Failing> failing;
     std::vector<std::string> noMemory; ///< results of another failure: of memory
+
+    bool IsLockedAt(Call call) const;
 };
 
 /// Every public member of the facade and the managers.

@@ -3,12 +3,7 @@
 
 #include <DADBusManager.h>
 
-#include <gtest/gtest.h>
-
 #include <malloc.h>
-#include <optional>
-#include <thread>
-#include <unistd.h>
 
 namespace
 {
@@ -31,25 +26,11 @@ double BytesPerCall(int calls, Run run)
     return (static_cast<double>(mallinfo2().uordblks) - static_cast<double>(before)) / calls;
 }
 
-struct Growth : testing::Test
+TEST(Growth, OfEachOperationIsNextToNothing)
 {
-    Growth()
-    {
-        // The allocator's cache of each thread would look like growth. It is set up before main, so the program starts once more.
-        if (g_getenv("GLIBC_TUNABLES") == nullptr)
-        {
-            setenv("GLIBC_TUNABLES", "glibc.malloc.tcache_count=0", 1);
-            execl("/proc/self/exe", "growth_test", static_cast<char*>(nullptr));
-        }
-        world.emplace();
-    }
-
-    std::optional<World> world;
-};
-
-TEST_F(Growth, OfEachOperationIsNextToNothing)
-{
-    const auto measure = [this](const Operation& operation)
+    ASSERT_STREQ("glibc.malloc.tcache_count=0", g_getenv("GLIBC_TUNABLES")) << "the allocator's cache would look like growth";
+    World world;
+    const auto measure = [&](const Operation& operation)
     {
         const bool isPush = operation.kind == Kind::kPush;
         int error = 0; // held in the short form, since to connect for each call takes ten times as long
@@ -61,7 +42,7 @@ TEST_F(Growth, OfEachOperationIsNextToNothing)
                 Session session;
                 ASSERT_EQ(operation.good[0], operation.run(session)) << operation.name;
                 if (isPush && (i % 50 == 0 || i == -1))
-                    world->FinishPushes();
+                    world.FinishPushes();
             });
         EXPECT_LT(bytes, kMostBytes) << operation.name;
     };
@@ -72,7 +53,7 @@ TEST_F(Growth, OfEachOperationIsNextToNothing)
         else
             std::thread(measure, operation).join();
     }
-    world->FinishPushes();
+    world.FinishPushes();
 }
 
 } // namespace

@@ -9,15 +9,12 @@
 #include <DASimManager.h>
 #include <DASystem.h>
 
-#include <algorithm>
-#include <cstdlib>
 #include <cstring>
 #include <dlfcn.h>
 #include <execinfo.h>
 #include <iostream>
 #include <link.h>
 #include <new>
-#include <utility>
 
 namespace
 {
@@ -213,8 +210,7 @@ TEST_F(MemorySweep, MakesEachInstanceUnderItsNamedLockOnFirstUseAndNotBefore)
         {"DASystem::GetDeviceUniqueID(char const**)", "DADBusManager.cpp::GetInstance"}};
     for (const auto& [name, lock] : expected)
     {
-        const auto isIt = [&, wanted = name](const Operation& operation) { return operation.name == wanted; };
-        const Operation& operation = *std::find_if(Operations().begin(), Operations().end(), isIt);
+        const Operation& operation = Find(name);
         isFirstUse = true;
         EXPECT_EQ(operation.good, TryFailing(operation, 0, 0));
         EXPECT_EQ(lock, injection.lockOfInstance) << name;

@@ -1,11 +1,8 @@
 // Every operation on every profile, with each of its platform calls failing in its turn: alone, and with all that follow.
 #include "sweep/Sweep.h"
 
-#include <algorithm>
-#include <fstream>
 #include <iostream>
 #include <regex>
-#include <set>
 
 namespace
 {
@@ -65,9 +62,7 @@ struct PlatformSweep : Sweep
         failed.clear();
         const auto onCall = [&](Call call, int)
         {
-            const Calls reads{Call::telephony_sim_get_state, Call::telephony_sim_get_subscriber_number, Call::tel_get_sim_imsi};
-            const bool isLocked = operation.lock == SimLock::kWhole || Contains(reads, call);
-            EXPECT_STREQ(isLocked ? kSimAccess : "", heldLock) << operation.name << ": " << sim::NameOf(call);
+            EXPECT_STREQ(operation.IsLockedAt(call) ? kSimAccess : "", heldLock) << operation.name << ": " << sim::NameOf(call);
             made.push_back(call);
             sim::ClearFaults();
             constexpr int kPatience = 120; // who waits for a SIM does so without a bound

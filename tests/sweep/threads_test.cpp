@@ -2,11 +2,6 @@
 // the main loop. With the support library's own locks.
 #include "sweep/Operations.h"
 
-#include <gtest/gtest.h>
-
-#include <algorithm>
-#include <thread>
-
 namespace
 {
 
@@ -19,9 +14,7 @@ thread_local const Operation* current = nullptr;
 std::string CheckSimAccess(Call call, int)
 {
     static std::atomic<int> inside{0};
-    const Calls reads{Call::telephony_sim_get_state, Call::telephony_sim_get_subscriber_number, Call::tel_get_sim_imsi};
-    const bool isRead = std::find(reads.begin(), reads.end(), call) != reads.end();
-    if (current == nullptr || (current->lock != SimLock::kWhole && !isRead))
+    if (current == nullptr || !current->IsLockedAt(call))
         return "";
     EXPECT_EQ(0, inside.fetch_add(1)) << sim::NameOf(call);
     std::this_thread::yield();
@@ -50,26 +43,16 @@ TEST(Threads, DoNotDisturbEachOther)
     for (const Operation& operation : Operations())
         (operation.kind == Kind::kListener ? listening : any).push_back(&operation);
     const int rounds = IsLong() ? 200 : 5;
-    std::vector<std::thread> threads;
-    std::atomic<int> running{0};
-    const auto start = [&](auto work)
-    {
-        ++running;
-        threads.emplace_back(
-            [&running, work]
-            {
-                work();
-                --running;
-                g_main_context_wakeup(nullptr);
-            });
-    };
+    std::vector<std::future<void>> threads;
     for (std::size_t i = 0; i < 8; ++i)
-        start([&, i] { RunAll(any, i * 16, rounds); });
-    start([&] { RunAll(listening, 0, rounds * 20); });
-    while (running > 0)
-        g_main_context_iteration(nullptr, TRUE);
-    for (std::thread& thread : threads)
-        thread.join();
+        threads.push_back(std::async(std::launch::async, [&, i] { RunAll(any, i * 16, rounds); }));
+    threads.push_back(std::async(std::launch::async, [&] { RunAll(listening, 0, rounds * 20); }));
+    for (const std::future<void>& thread : threads)
+    {
+        while (thread.wait_for(std::chrono::milliseconds(1)) != std::future_status::ready)
+            while (g_main_context_iteration(nullptr, FALSE))
+                continue;
+    }
     world.FinishPushes();
     sim::SetCallHook(nullptr);
     EXPECT_EQ(std::vector<std::string>(), sim::OpenHandles());
