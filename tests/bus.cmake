@@ -5,7 +5,7 @@ target_link_libraries(kiv_test_bus PRIVATE kiv_compile PUBLIC GTest::gmock PkgCo
 set_property(TARGET kiv_test_bus PROPERTY KIV_UNOPTIMIZED ON)
 
 foreach(subject IN ITEMS notification outage connection kill traffic)
-  kiv_test(bus_${subject}_test bus/${subject}_test.cpp bus/Subscribers.cpp push/PushSubscribers.cpp)
+  kiv_test(bus_${subject}_test bus/${subject}_test.cpp bus/Subscribers.cpp)
   target_link_libraries(bus_${subject}_test PRIVATE kiv_test_bus)
 endforeach()
 target_link_libraries(bus_connection_test PRIVATE ${CMAKE_DL_LIBS})

@@ -6,6 +6,7 @@ set_property(TARGET kiv_test_operations PROPERTY KIV_UNOPTIMIZED ON)
 kiv_test(sweep_test sweep/Doubles.cpp sweep/Sweep.cpp sweep/platform_sweep.cpp sweep/memory_sweep.cpp
   sim/slots_test.cpp)
 target_link_libraries(sweep_test PRIVATE kiv_test_operations)
+target_compile_definitions(sweep_test PRIVATE KIV_EXPORTED_SYMBOLS="${PROJECT_SOURCE_DIR}/lib/DASystem/exported_symbols.txt")
 kiv_test(threads_test sweep/threads_test.cpp)
 target_link_libraries(threads_test PRIVATE kiv_test_operations)
 
@@ -13,4 +14,5 @@ target_link_libraries(threads_test PRIVATE kiv_test_operations)
 if(NOT KIV_SANITIZE)
   kiv_test(growth_test sweep/growth_test.cpp)
   target_link_libraries(growth_test PRIVATE kiv_test_operations)
+  set_property(TEST growth_test APPEND PROPERTY ENVIRONMENT GLIBC_TUNABLES=glibc.malloc.tcache_count=0)
 endif()

@@ -1,5 +1,6 @@
 #include "bus/Subscribers.h"
 
+#include <DADatabaseManager.h>
 #include <DASubscribeDataManager.h>
 
 DASubscribeDataManager::DASubscribeDataManager() = default;
@@ -14,4 +15,12 @@ bool DASubscribeDataManager::GetSubscriber(const char* kind, const char* key, st
     }
     subscribers.insert(subscribers.end(), store.records.begin(), store.records.end());
     return true;
+}
+
+DADatabaseManager::DADatabaseManager() = default;
+DADatabaseManager::~DADatabaseManager() = default;
+
+bool DADatabaseManager::GetSubscriber(const char* kind, const char* key, std::list<_SubscriberInfo>& subscribers)
+{
+    return DASubscribeDataManager().GetSubscriber(kind, key, subscribers);
 }

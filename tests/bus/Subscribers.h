@@ -1,11 +1,9 @@
 #ifndef KIV_TESTS_SUBSCRIBERS_H
 #define KIV_TESTS_SUBSCRIBERS_H
 
-#include <DASubscriberInfo.h>
+#include "support/Test.h"
 
-#include <mutex>
-#include <string>
-#include <vector>
+#include <DASubscriberInfo.h>
 
 namespace kiv::test
 {

@@ -70,7 +70,7 @@ TEST_F(ConnectionTrouble, IsATimeOutWhenTheMessageSaysTimeAndUnreachableElse)
         std::vector<std::string> expected = {"GDBusConnection is NULL"};
         expected.insert(expected.end(), lines.begin(), lines.end());
         for (auto& line : expected)
-            line.insert(0, "E DADBusManager.cpp InitDbusConnection > ");
+            line = Line(line, "E", "InitDbusConnection");
 
         int error = 77;
         EXPECT_EQ(nullptr, manager.InitDbusConnection(&error));
@@ -81,22 +81,27 @@ TEST_F(ConnectionTrouble, IsATimeOutWhenTheMessageSaysTimeAndUnreachableElse)
         EXPECT_EQ(code, manager.GetDeviceUniqueID(id));
         EXPECT_EQ(nullptr, id);
         auto queryLines = expected;
-        queryLines.emplace_back("E DADBusManager.cpp GetDeviceUniqueID > dbus error occured");
+        queryLines.push_back(Line("dbus error occured", "E", "GetDeviceUniqueID"));
         EXPECT_EQ(queryLines, log.TakeErrors());
 
-        EXPECT_EQ(code, NotifyServiceManager(KIV_NOTI_TYPE_STATUS_ON));
-        expected.emplace_back("E DADBusManager.cpp SendNotiToServiceManager > dbus connection error occured");
-        EXPECT_EQ(expected, log.TakeErrors());
+        expected.push_back(Line("dbus connection error occured"));
+        for (const auto type : {KIV_NOTI_TYPE_STATUS_ON, static_cast<_KIV_NOTI_TYPE_E>(9)})
+        {
+            EXPECT_EQ(code, NotifyServiceManager(type));
+            EXPECT_EQ(expected, log.TakeErrors());
+        }
     }
 }
 
-TEST_F(ConnectionTrouble, LeavesTheErrorAloneWhenThereIsNoneAndDoesNotEndTheProcess)
+TEST_F(ConnectionTrouble, LeavesTheErrorAloneWhenThereIsNoneAndDoesNotEndTheProcessWhoeverConnectedFirst)
 {
+    const Connection agents(g_bus_get_sync(G_BUS_TYPE_SYSTEM, nullptr, nullptr));
+    g_dbus_connection_set_exit_on_close(agents.get(), TRUE);
     int error = 77;
     const Connection connection(manager.InitDbusConnection(&error));
-    ASSERT_TRUE(connection);
+    EXPECT_EQ(agents, connection);
     EXPECT_EQ(77, error);
-    EXPECT_FALSE(g_dbus_connection_get_exit_on_close(connection.get()));
+    EXPECT_FALSE(g_dbus_connection_get_exit_on_close(agents.get()));
 }
 
 TEST_F(ConnectionTrouble, IsCode5WhenNoProxyComesWhichIsNeverToStartTheServiceManager)
@@ -108,8 +113,7 @@ TEST_F(ConnectionTrouble, IsCode5WhenNoProxyComesWhichIsNeverToStartTheServiceMa
         gio.makesProxies = connection != nullptr;
         gio.connection = connection; // the shared one may have closed since it was handed out
         EXPECT_EQ(5, NotifyServiceManager(KIV_NOTI_TYPE_NUMBER_CHANGED));
-        EXPECT_THAT(log.TakeErrors(),
-            ElementsAre(MatchesRegex("E DADBusManager.cpp SendNotiToServiceManager > Unable to create proxy: .+")));
+        EXPECT_THAT(log.TakeErrors(), ElementsAre(MatchesRegex(Line("Unable to create proxy: .+"))));
     }
     EXPECT_EQ(G_DBUS_PROXY_FLAGS_DO_NOT_AUTO_START, gio.proxyFlags);
 }

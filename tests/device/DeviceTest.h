@@ -6,15 +6,6 @@
 #include <DASystem.h>
 #include <SimulatedDevice.h>
 
-#include <gmock/gmock.h>
-#include <gtest/gtest.h>
-
-#include <cstdlib>
-#include <memory>
-#include <string>
-#include <utility>
-#include <vector>
-
 namespace kiv::test
 {
 

@@ -2,11 +2,8 @@
 #include "device/DeviceTest.h"
 
 #include <cctype>
-#include <fstream>
 #include <limits>
-#include <map>
 #include <stdexcept>
-#include <tuple>
 
 namespace
 {
@@ -16,10 +13,10 @@ using namespace kiv::test;
 struct Language : DeviceTest
 {
     /// Asks for the plain code and the ISO 639-2 one; nothing of it is ever logged.
-    void Expect(int code, const std::string& plain, const std::string& iso)
+    void Expect(const std::string& plain, const std::string& iso)
     {
-        EXPECT_EQ(Answer(code, plain), Ask([&](char** out) { return facade.GetDeviceLanguageCode(out, false); }));
-        EXPECT_EQ(Answer(code, iso), Ask([&](char** out) { return facade.GetDeviceLanguageCode(out, true); }));
+        EXPECT_EQ(Answer(0, plain), Ask([&](char** out) { return facade.GetDeviceLanguageCode(out, false); }));
+        EXPECT_EQ(Answer(0, iso), Ask([&](char** out) { return facade.GetDeviceLanguageCode(out, true); }));
         EXPECT_EQ(Lines{}, log.Take());
     }
     const char* Row(const std::string& deviceLang)
@@ -43,7 +40,7 @@ TEST_F(Language, HasAnIsoCodeForTheListedOnesAndNoOther)
         const auto found = listed.find(two);
         const bool isListed = found != listed.end();
         Set(&Device::language, std::string{static_cast<char>(std::tolower(two[0])), two[1]} + "_XX_yy");
-        Expect(0, two, isListed ? found->second : "untouched");
+        Expect(two, isListed ? found->second : "untouched");
         EXPECT_STREQ(isListed ? found->second.c_str() : nullptr, Row(two));
         EXPECT_EQ(Row(two), Row(two)) << "constant text";
     }
@@ -54,10 +51,7 @@ TEST_F(Language, HasAnIsoCodeForTheListedOnesAndNoOther)
 TEST_F(Language, IsThePartOfTheSettingBeforeTheFirstUnderscore)
 {
     const std::string far(10'000, 'z'), farCapital(10'000, 'Z');
-    const struct
-    {
-        std::string setting, plain, iso;
-    } cases[] = {
+    const std::tuple<std::string, std::string, std::string> cases[] = {
         {"ko_KR", "KO", "kor"},
         {"En_us", "EN", "eng"},
         {"de_DE", "DE", "untouched"},
@@ -69,13 +63,13 @@ TEST_F(Language, IsThePartOfTheSettingBeforeTheFirstUnderscore)
         {far + "_en", farCapital, "untouched"},
         {"\xC3\xA9\xFFn\x80_US", "\xC3\xA9\xFFN\x80", "untouched"},
     };
-    for (const auto& row : cases)
+    for (const auto& [setting, plain, iso] : cases)
     {
-        Set(&Device::language, row.setting);
-        Expect(0, row.plain, row.iso);
+        Set(&Device::language, setting);
+        Expect(plain, iso);
     }
     Fail(Call::system_settings_get_value_string, 0);
-    Expect(0, "EN", "eng"); // success without a text
+    Expect("EN", "eng"); // success without a text
 }
 
 TEST_F(Language, IsCutOutWithHelpersThatKnowTheirBounds)

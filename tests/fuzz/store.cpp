@@ -105,17 +105,16 @@ private:
         Require((isAsked || found.empty()) && (isListed ? reason.empty() : listed.empty()), "a store that fails gives nothing");
         if (isDamaged_)
             return;
-        auto next = lines_.begin();
-        Require(isAsked && isListed && listed.size() == lines_.size(), "all is in the store");
+        Lines all, ofEvent;
         for (const auto& [rowKind, rowKey, subscriber] : listed)
-        {
-            Require(Line(rowKind, rowKey, subscriber) == *next++, "what is in the store is listed in order");
-            if (rowKind != kind || rowKey != key)
-                continue;
-            Require(!found.empty() && Line(kind, key, found.front()) == *std::prev(next), "and found in order");
-            found.pop_front();
-        }
-        Require(found.empty(), "nothing else is found");
+            all.push_back(Line(rowKind, rowKey, subscriber));
+        for (const _SubscriberInfo& subscriber : found)
+            ofEvent.push_back(Line(kind, key, subscriber));
+        Require(isAsked && isListed && all == lines_, "what is in the store is listed in order");
+        const std::string event = kind + std::string("\t") + key + '\t';
+        const auto isOther = [&](const std::string& line) { return line.rfind(event, 0) != 0; };
+        all.erase(std::remove_if(all.begin(), all.end(), isOther), all.end());
+        Require(ofEvent == all, "what is of the event is found in order, and nothing else");
     }
 
     DASubscriberStore store_;

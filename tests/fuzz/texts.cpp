@@ -1,15 +1,8 @@
 // Texts for the bus, a line each, behind a line with a letter that picks an operation (a capital one finds no subscriber) and a
 // number: service id, flag or time.
-#include "Fuzz.h"
-#include "bus/Subscribers.h"
-#include "support/Peer.h"
+#include "Bus.h"
 
-#include <DADBusManager.h>
 #include <DASystem.h>
-
-#include <algorithm>
-#include <mutex>
-#include <utility>
 
 using namespace kiv::fuzz;
 
@@ -57,36 +50,23 @@ void Collect(GVariant* value, Texts& texts)
     }
 }
 
-/// A bus, and somebody who is a subscriber and the service manager, and keeps the texts of what he is told.
-struct World
-{
-    kiv::test::PrivateBus bus;
-    kiv::test::Subscribers store;
-    std::mutex mutex;
-    std::vector<Texts> told;
-    kiv::test::Peer peer{bus, "org.tizen.servicemanager.service",
-        [this](GDBusMessage* call)
-        {
-            const std::lock_guard lock(mutex);
-            Collect(g_dbus_message_get_body(call), told.emplace_back());
-            return g_dbus_message_new_method_reply(call);
-        }};
-    int error = 0;
-    GDBusConnection* const connection = manager.InitDbusConnection(&error); ///< held as by an agent
-
-    World() { peer.Forget(); }
-    std::vector<Texts> Told()
-    {
-        const std::lock_guard lock(mutex);
-        return std::exchange(told, {});
-    }
-};
-
 } // namespace
 
 void Try(std::string_view input)
 {
-    static World& world = *new World;
+    static std::mutex mutex;
+    static std::vector<Texts> told;
+    static Bus& bus = *new Bus(
+        [](GDBusMessage* call)
+        {
+            const std::lock_guard lock(mutex);
+            Collect(g_dbus_message_get_body(call), told.emplace_back());
+        });
+    const auto takeTold = []
+    {
+        const std::lock_guard lock(mutex);
+        return std::exchange(told, {});
+    };
     Texts texts = Split(input, '\n', 6);
     const std::string head = texts[0];
     texts.erase(texts.begin());
@@ -97,8 +77,8 @@ void Try(std::string_view input)
     const std::size_t pick = static_cast<unsigned char>(g_ascii_tolower(head[0]) - 'a') % std::size(kOperations);
     const auto& operation = kOperations[pick];
     const bool isPush = operation.texts == 3, isHeard = g_ascii_isupper(head[0]) == FALSE || pick == 0;
-    world.store.records.assign(isHeard ? 1 : 0, {world.peer.Name(), "/example/client", "org.example.Client"});
-    world.store.asked.clear();
+    bus.store.records.assign(isHeard ? 1 : 0, {bus.peer.Name(), "/example/client", "org.example.Client"});
+    bus.store.asked.clear();
 
     texts.resize(static_cast<std::size_t>(operation.texts));
     const bool areTexts =
@@ -106,9 +86,9 @@ void Try(std::string_view input)
     const int code = operation.send(Number(head.empty() ? head : head.substr(1)), arguments.data());
     Require(code == (areTexts ? 0 : operation.refused), "what is no text is refused");
     const std::vector<Texts> sent(areTexts && isHeard ? 1 : 0, texts);
-    std::vector<Texts> told = world.Told();
-    for (; isPush && told.size() < sent.size(); told = world.Told())
+    std::vector<Texts> arrived = takeTold();
+    for (; isPush && arrived.size() < sent.size(); arrived = takeTold())
         g_main_context_iteration(nullptr, TRUE);
-    Require(told == sent, "the texts arrive as they are");
+    Require(arrived == sent, "the texts arrive as they are");
     Feed(1);
 }

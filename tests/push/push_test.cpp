@@ -1,10 +1,7 @@
 // Pushes to the client services of a private bus, which go on in the main loop of the caller's thread.
 #include "bus/BusTest.h"
 
-#include <algorithm>
-#include <cstdlib>
 #include <limits>
-#include <thread>
 
 namespace
 {
@@ -20,27 +17,21 @@ using testing::StartsWith;
 using Lines = std::vector<std::string>;
 using LineMatchers = std::vector<testing::Matcher<std::string>>;
 
-std::string Info(const std::string& function, const std::string& message)
-{
-    return "I DADBusManager.cpp " + function + " > " + message;
-}
-
 struct Push : BusTest
 {
-    void Deliver() { EXPECT_EQ(0, manager.DeliverPushMessage("7", "data", "message", 1'700'000'000)); }
-
-    /// Iterates a main context until a condition holds; fails after twenty seconds.
-    template <class Condition>
-    static void IterateUntil(Condition isMet, GMainContext* context = nullptr)
+    static std::string Info(const std::string& function, const std::string& message)
     {
-        const gint64 deadline = g_get_monotonic_time() + 20 * G_TIME_SPAN_SECOND;
-        while (!isMet())
-        {
-            ASSERT_LT(g_get_monotonic_time(), deadline);
-            if (!g_main_context_iteration(context, FALSE))
-                g_usleep(1000); // for what comes true outside the loop
-        }
+        return Line(message, "I", function.c_str());
     }
+    Lines Begin(const Peer& peer)
+    {
+        Lines lines{"begin", "busname: " + peer.Name(), "objectpath: /example/client", "interface: org.example.Client", "end"};
+        for (std::string& line : lines)
+            line = Info("DeliverPushMessage", line);
+        lines.push_back(Info("proxy_new_cb", "begin"));
+        return lines;
+    }
+    void Deliver() { EXPECT_EQ(0, manager.DeliverPushMessage("7", "data", "message", 1'700'000'000)); }
 
     /// Iterates until so many deliveries came to the end of a function. @return what was logged until then
     Lines RunUntilEnded(std::ptrdiff_t count, const std::string& function = "free_user_data", GMainContext* context = nullptr)
@@ -63,8 +54,8 @@ struct Push : BusTest
     }
 
     const std::string call = "/example/client org.example.Client.push ((sssx)) (('7', 'data', 'message', 1700000000),)";
-    const std::string callFailed = "E DADBusManager.cpp proxy_call_cb > g_dbus_proxy_call_finish error (";
-    const std::string error = "E DADBusManager.cpp DeliverPushMessage > ";
+    const std::string callFailed = Line("g_dbus_proxy_call_finish error (", "E", "proxy_call_cb");
+    const std::string error = Line("", "E", "DeliverPushMessage");
 };
 
 TEST_F(Push, ReachesEverySubscriberWithTheTextsAndTheTimeThatWereHandedIn)
@@ -94,15 +85,10 @@ TEST_F(Push, LogsEachStepOfADelivery)
     EXPECT_THAT(log.Take(), ElementsAre(Info("DeliverPushMessage", "begin"), Info("DeliverPushMessage", "end")));
 
     Subscribe(client);
-    Lines steps = {Info("DeliverPushMessage", "begin"), Info("DeliverPushMessage", "busname: " + client.Name()),
-        Info("DeliverPushMessage", "objectpath: /example/client"), Info("DeliverPushMessage", "interface: org.example.Client"),
-        Info("DeliverPushMessage", "end"), Info("proxy_new_cb", "begin"),
-        Info("proxy_new_cb", "service_id (7), noti_data (data), noti_msg (message), noti_time (1700000000)"),
-        Info("proxy_new_cb", "end"), Info("proxy_call_cb", "begin"), Info("free_user_data", "begin"), Info("free_user_data", "end"),
-        Info("proxy_call_cb", "end")};
-    LineMatchers notCreated(steps.begin(), steps.begin() + 6);
-    notCreated.emplace_back(StartsWith("E DADBusManager.cpp proxy_new_cb > Unable to create proxy: "));
-    notCreated.insert(notCreated.end(), steps.begin() + 9, steps.begin() + 11);
+    Lines steps = Begin(client);
+    steps.insert(steps.end(), {Info("proxy_new_cb", "service_id (7), noti_data (data), noti_msg (message), noti_time (1700000000)"),
+                                  Info("proxy_new_cb", "end"), Info("proxy_call_cb", "begin"), Info("free_user_data", "begin"),
+                                  Info("free_user_data", "end"), Info("proxy_call_cb", "end")});
     Deliver();
     EXPECT_EQ(steps, RunUntilEnded(1));
 
@@ -110,50 +96,22 @@ TEST_F(Push, LogsEachStepOfADelivery)
     Deliver();
     steps.insert(steps.begin() + 9, 2, callFailed + "GDBus.Error:org.example.Refused: not today)");
     EXPECT_EQ(steps, RunUntilEnded(1));
-
-    bus.Stop();
-    int code = 0;
-    IterateUntil([&] { return Connection(manager.InitDbusConnection(&code)) == nullptr; });
-    log.Take();
-    Deliver();
-    EXPECT_THAT(RunUntilEnded(1), testing::ElementsAreArray(notCreated));
-    bus.Start();
-    Peer again(bus);
-    store.records = {Record(again)};
-    const auto arrives = [&]
-    {
-        Deliver();
-        return Errors(RunUntilEnded(1)).empty();
-    };
-    IterateUntil(arrives); // GDBus shares what could not connect as well, until it is gone
 }
 
 TEST_F(Push, ReachesTheOthersWhenARecordBetweenThemCanNotBeCalled)
 {
     const std::string notMade = error + "Unable to create proxy: ";
-    const struct
-    {
-        _SubscriberInfo record;
-        int started;
-        LineMatchers errors;
-    } cases[] = {
-        {{"org.example.Nobody", "/x", "a.b"}, 3, {StartsWith(callFailed), StartsWith(callFailed)}},
-        {{"no name", "/x", "a.b"}, 2, {notMade + "busname is not a bus name"}},
-        {{"a.b", "x", "a.b"}, 2, {notMade + "objectpath is not an object path"}},
-        {{"a.b", "/x", "a"}, 2, {notMade + "interface is not an interface name"}},
-        {{"a.b", "/org/freedesktop/DBus/Local", "a.b"}, 2, {notMade + "objectpath is reserved"}},
-        {{"a.b", "/org/freedesktop/DBus/Locale/x", "a.b"}, 2, {notMade + "objectpath is reserved"}},
-        {{"a.b", "/x", "org.freedesktop.DBus.Local"}, 2, {notMade + "interface is reserved"}},
-        {{"a.b", "/x", "org.freedesktop.DBus.Locale"}, 2, {notMade + "interface is reserved"}},
-    };
     Peer first(bus), third(bus);
-    for (const auto& row : cases)
+    for (const auto& [record, flaw] : kBadRecords)
     {
-        store.records = {Record(first), row.record, Record(third)};
+        store.records = {Record(first), record, Record(third)};
         Deliver();
-        EXPECT_THAT(Errors(RunUntilEnded(row.started)), testing::ElementsAreArray(row.errors));
+        EXPECT_THAT(Errors(RunUntilEnded(2)), ElementsAre(error + "Unable to create proxy: " + flaw));
     }
-    EXPECT_THAT(first.Calls(), AllOf(SizeIs(std::size(cases)), Each(call)));
+    store.records = {Record(first), {"org.example.Nobody", "/x", "a.b"}, Record(third)};
+    Deliver();
+    EXPECT_THAT(Errors(RunUntilEnded(3)), AllOf(SizeIs(2), Each(StartsWith(callFailed))));
+    EXPECT_THAT(first.Calls(), AllOf(SizeIs(std::size(kBadRecords) + 1), Each(call)));
     EXPECT_EQ(first.Calls(), third.Calls());
 }
 
@@ -177,12 +135,21 @@ TEST_F(Push, WaitsForTheLoopOfTheThreadDefaultContextOfWhoeverStartedIt)
     const auto deliver = [&]
     {
         g_autoptr(GMainContext) context = g_main_context_new();
+        g_autoptr(GSource) idle = g_idle_source_new();
+        int ran = 0;
+        g_source_set_callback(
+            idle, [](gpointer count) -> gboolean { return ++*static_cast<int*>(count) == 0; }, &ran, nullptr);
+        g_source_attach(idle, context);
         g_main_context_push_thread_default(context);
         Deliver();
+        EXPECT_EQ(
+            0, NotifySubscribers(KIV_NOTI_TYPE_AUTH_SUCCESS)); // a synchronous call gets through, and runs nothing of the caller's
+        EXPECT_EQ(context, g_main_context_get_thread_default());
         g_main_context_pop_thread_default(context);
-        EXPECT_EQ(0, NotifySubscribers(KIV_NOTI_TYPE_AUTH_SUCCESS)); // a synchronous call gets through
+        EXPECT_EQ(0, ran);
         EXPECT_THAT(client.Calls().back(), HasSubstr(".auth "));
         RunUntilEnded(1, "free_user_data", context);
+        EXPECT_EQ(1, ran);
         while (g_main_context_iteration(context, FALSE)) // GDBus tidies up after the proxy
         {
         }
@@ -192,53 +159,57 @@ TEST_F(Push, WaitsForTheLoopOfTheThreadDefaultContextOfWhoeverStartedIt)
     EXPECT_THAT(client.Calls(), ElementsAre(HasSubstr(".auth "), call, HasSubstr(".auth "), call));
 }
 
-struct PushWhenTheBusDies : Push
+TEST_F(Push, FailsWhenTheBusDiesAndTheNextOneGoesToTheNewBus)
 {
-    /// The bus dies under a call, and comes back.
-    /// @param agents  the agent's own hold on the shared connection, or null
-    void DieAndComeBack(Connection agents)
-    {
-        Peer silent(bus, "", Peer::Silence());
-        store.records = {Record(silent), Record(silent)};
-        Deliver();
-        EXPECT_EQ(Lines{}, Errors(RunUntilEnded(2, "proxy_new_cb")));
-        silent.AwaitCalls(2);
-        Connection held(g_bus_get_sync(G_BUS_TYPE_SYSTEM, nullptr, nullptr));
-        bus.Stop();
-        EXPECT_THAT(Errors(RunUntilEnded(2)), AllOf(SizeIs(4), Each(StartsWith(callFailed))));
-        IterateUntil([&] { return g_dbus_connection_is_closed(held.get()) != FALSE; });
-        Deliver();
-        const std::string refused = error + "Unable to create proxy: The connection is closed";
-        EXPECT_THAT(log.TakeErrors(), ElementsAre(refused, refused));
-        held.reset();
-        agents.reset();
-        bus.Start();
+    Peer silent(bus, "", Peer::Silence());
+    store.records = {Record(silent), Record(silent)};
+    Connection held(g_bus_get_sync(G_BUS_TYPE_SYSTEM, nullptr, nullptr));
+    g_dbus_connection_set_exit_on_close(held.get(), TRUE); // as GDBus makes it for the agent
+    Deliver();
+    EXPECT_EQ(Lines{}, Errors(RunUntilEnded(2, "proxy_new_cb")));
+    silent.AwaitCalls(2);
+    bus.Stop();
+    EXPECT_THAT(Errors(RunUntilEnded(2)), AllOf(SizeIs(4), Each(StartsWith(callFailed))));
+    IterateUntil([&] { return g_dbus_connection_is_closed(held.get()) != FALSE; });
+    Deliver();
+    const std::string refused = error + "Unable to create proxy: The connection is closed";
+    EXPECT_THAT(log.TakeErrors(), ElementsAre(refused, refused));
 
-        Peer client(bus);
-        store.records = {Record(client)};
-        const auto isStarted = [&]
-        {
-            Deliver();
-            return log.TakeErrors().empty();
-        };
-        IterateUntil(isStarted); // GDBus itself holds the dead connection for a moment
-        EXPECT_EQ(Lines{}, Errors(RunUntilEnded(1)));
-        EXPECT_THAT(client.Calls(), ElementsAre(call));
-    }
-};
+    held.reset();
+    int code = 0;
+    IterateUntil([&] { return Connection(manager.InitDbusConnection(&code)) == nullptr; });
+    log.Take();
+    store.records.pop_back();
+    Deliver();
+    const Lines begin = Begin(silent);
+    LineMatchers notCreated(begin.begin(), begin.end());
+    notCreated.emplace_back(StartsWith(Line("Unable to create proxy: ", "E", "proxy_new_cb")));
+    notCreated.insert(notCreated.end(), {Info("free_user_data", "begin"), Info("free_user_data", "end")});
+    EXPECT_THAT(RunUntilEnded(1), testing::ElementsAreArray(notCreated));
 
-TEST_F(PushWhenTheBusDies, LeavesTheProcessAliveAndTheNextOneGoesToTheNewBusWhoeverMadeTheConnection)
-{
-    GTEST_FLAG_SET(death_test_style, "threadsafe"); // a new process, which has no connection yet
-    const auto die = [&](bool isAgents)
+    bus.Start();
+    Peer client(bus);
+    store.records = {Record(client)};
+    const auto arrives = [&]
     {
-        for (int i = 0; i < 3; ++i)
-            DieAndComeBack(Connection(isAgents ? g_bus_get_sync(G_BUS_TYPE_SYSTEM, nullptr, nullptr) : nullptr));
-        std::_Exit(HasFailure() ? 1 : 0);
+        Deliver();
+        return Errors(RunUntilEnded(1)).empty();
     };
-    EXPECT_EXIT(die(false), testing::ExitedWithCode(0), "");
-    EXPECT_EXIT(die(true), testing::ExitedWithCode(0), "");
-    DieAndComeBack(nullptr); // in this process, where leaks are looked for
+    IterateUntil(arrives); // GDBus shares what could not connect as well, until it is gone
+    EXPECT_THAT(client.Calls(), ElementsAre(call));
+}
+
+TEST_F(Push, ThatEndedKeepsNoThreadFromTheNextBusThoughItsContextIsIteratedNoMore)
+{
+    Peer client(bus);
+    Subscribe(client);
+    Deliver();
+    RunUntilEnded(1, "proxy_call_cb");
+    bus.Stop();
+    bus.Start();
+    Peer serviceManager(bus, kServiceManager);
+    std::thread([this] { EXPECT_EQ(0, NotifyServiceManager(KIV_NOTI_TYPE_ACTIVATED)); }).join();
+    EXPECT_THAT(serviceManager.Calls(), SizeIs(1));
 }
 
 TEST_F(Push, FailsBeyondTheRepliesThatTheBusLetsAConnectionWaitFor)

@@ -1,11 +1,10 @@
-// The facade's questions about all SIMs, each beside what its contract makes of a device; slots that are not there; and values that
+// The facade's questions about all SIMs, on devices where some do not answer; slots that are not there; and values that
 // no profile holds.
 #include "sweep/Sweep.h"
 
 #include <DASimManager.h>
 #include <DASystem.h>
 
-#include <algorithm>
 #include <climits>
 #include <numeric>
 
@@ -15,14 +14,6 @@ namespace
 using namespace kiv::test;
 namespace sim = kiv::sim;
 
-enum class Sim
-{
-    kAnswers,
-    kSilent, ///< usable, without IMSI and number
-    kLocked
-};
-using Sims = std::vector<Sim>;
-
 std::string Line(const std::string& function, const std::string& text)
 {
     return "E DASimManager.cpp " + function + " > " + text;
@@ -31,131 +22,74 @@ const std::string kNotAvailable = Line("IsSimAvailable", "Sim is not available")
 
 struct Slots : Sweep
 {
-    static const Operation& Find(const std::string& name)
-    {
-        const auto isIt = [&](const Operation& operation) { return operation.name == name; };
-        return *std::find_if(Operations().begin(), Operations().end(), isIt);
-    }
-
     Story Ask(const Operation& operation)
     {
         return Try(
             operation, [] {}, [] {});
     }
-
-    void Insert(const Sims& sims)
-    {
-        const std::vector<sim::SimSlot> slots = {{"modem0", {3}, {}, "450", "05", "0123456780", "", {}},
-            {"modem1", {3}, {}, "451", "012", "0123456781", "+491515550001", {}},
-            {"modem2", {3}, {}, "452", "99", "0123456782", "0002", {}}};
-        device.slots.assign(slots.begin(), slots.begin() + static_cast<std::ptrdiff_t>(sims.size()));
-        for (std::size_t slot = 0; slot < sims.size(); ++slot)
-        {
-            if (sims[slot] == Sim::kLocked)
-                device.slots[slot].cardStatus = {4};
-            if (sims[slot] == Sim::kSilent)
-                device.slots[slot].mcc = device.slots[slot].number = std::nullopt;
-        }
-    }
-
-    /// @param texts  what a member reads of the SIMs, in slot order
-    void ExpectTexts(const Sims& sims, const std::string& member, const std::string& failure, const Story& texts)
-    {
-        Story first{member.find("Phone") == 0 ? "-39841791 before" : "4 before"}, every{"before"};
-        int count = 0;
-        for (std::size_t slot = 0; slot < sims.size(); ++slot)
-        {
-            Story lines;
-            if (sims[slot] == Sim::kLocked)
-                lines.push_back(kNotAvailable);
-            if (sims[slot] != Sim::kAnswers)
-                lines.push_back(Line("Get" + member + "FromSim", "fail to get " + failure));
-            every.insert(every.end(), lines.begin(), lines.end());
-            if (count == 0)
-                first.insert(first.end(), lines.begin(), lines.end());
-            if (sims[slot] != Sim::kAnswers)
-                continue;
-            every[0] += ' ' + texts[slot];
-            first[0] = ++count == 1 ? "0 " + texts[slot] : first[0];
-        }
-        every[0] += ' ' + std::to_string(count);
-        EXPECT_EQ(first, Ask(Find("DASystem::Get" + member + "FromSim(char**)")));
-        const std::string vector = "std::vector<char*, std::allocator<char*> >*";
-        EXPECT_EQ(every, Ask(Find("DASystem::Get" + member + "FromSim(" + vector + ", int*)")));
-    }
 };
 
-TEST_F(Slots, AnswerTheFacadeInEveryPatternOfUpToThree)
+TEST_F(Slots, ThatDoNotAnswerArePassedOver)
 {
-    std::vector<Sims> patterns = {{}};
-    for (std::size_t i = 0; i < patterns.size(); ++i)
+    // The first and the fourth are locked, the second is without IMSI and number.
+    const std::vector<sim::SimSlot> slots = {{"modem0", {4}, {}, "449", "04", "0123456789", "0000", {}},
+        {"modem1", {3}, {}, {}, "05", "0123456780", {}, {}}, {"modem2", {3}, {}, "451", "012", "0123456781", "", {}},
+        {"modem3", {4}, {}, "452", "99", "0123456782", "0003", {}}, {"modem4", {3}, {}, "453", "98", "0123456783", "0004", {}}};
+    const std::tuple<std::string, std::string, std::string, std::string, std::string> texts[] = {{"MCC", "MCC", "4", "451", "453"},
+        {"MNC", "MNC", "4", "012", "98"}, {"IMSI", "imsi", "4", "4510120123456781", "453980123456783"},
+        {"PhoneNumber", "phoneNumber", "-39841791", "", "0004"}};
+    for (const auto& [member, what, failed, text2, text4] : texts)
     {
-        const Sims sims = patterns[i];
-        for (const Sim next : {Sim::kAnswers, Sim::kSilent, Sim::kLocked})
-        {
-            if (sims.size() < 3)
-                patterns.insert(patterns.end(), sims)->push_back(next);
-        }
-        if (sims.empty())
-            continue; // as when telephony can not be opened
-        SCOPED_TRACE(testing::PrintToString(sims));
-        Insert(sims);
-        ExpectTexts(sims, "MCC", "MCC", {"450", "451", "452"});
-        ExpectTexts(sims, "MNC", "MNC", {"05", "012", "99"});
-        ExpectTexts(sims, "IMSI", "imsi", {"450050123456780", "4510120123456781", "452990123456782"});
-        ExpectTexts(sims, "PhoneNumber", "phoneNumber", {"", "+491515550001", "0002"});
-
-        const auto usable = std::find_if(sims.begin(), sims.end(), [](Sim sim) { return sim != Sim::kLocked; });
-        Story any{usable != sims.end() ? "true" : "false"}, exists = any;
-        any.resize(1 + static_cast<std::size_t>(usable - sims.begin()), kNotAvailable);
-        for (std::size_t slot = 0; slot < sims.size(); ++slot)
-        {
-            if (sims[slot] == Sim::kLocked)
-                exists.push_back(Line("IsSimExist", "SIM STATE[" + std::to_string(slot) + "] : TELEPHONY_SIM_STATE_LOCKED"));
-        }
-        EXPECT_EQ(any, Ask(Find("DASystem::IsSimAvailable()")));
-        EXPECT_EQ(exists, Ask(Find("DASystem::IsSimExist()")));
-        Story dual{"true"};
-        if (sims.size() < 2)
-            dual = {"false", "E DASystem.cpp IsDualSimAvailable > [Single Sim Device] Not support Dual Sim."};
-        else if (sims[0] == Sim::kLocked || sims[1] == Sim::kLocked)
-            dual = {"false", kNotAvailable};
-        EXPECT_EQ(dual, Ask(Find("DASystem::IsDualSimAvailable()")));
+        const Operation& first = Find("DASystem::Get" + member + "FromSim(char**)");
+        const Operation& every = Find("DASystem::Get" + member + "FromSim(std::vector<char*, std::allocator<char*> >*, int*)");
+        const std::string line = Line("Get" + member + "FromSim", "fail to get " + what);
+        device.slots = slots;
+        EXPECT_EQ((Story{"0 " + text2, kNotAvailable, line, line}), Ask(first));
+        EXPECT_EQ((Story{"before " + text2 + ' ' + text4 + " 2", kNotAvailable, line, line, kNotAvailable, line}), Ask(every));
+        device.slots.resize(2);
+        EXPECT_EQ((Story{failed + " before", kNotAvailable, line, line}), Ask(first));
+        EXPECT_EQ((Story{"before 0", kNotAvailable, line, line}), Ask(every));
     }
-    EXPECT_EQ(1U + 3 + 9 + 27, patterns.size());
+    const auto locked = [](const char* slot)
+    { return Line("IsSimExist", std::string("SIM STATE[") + slot + "] : TELEPHONY_SIM_STATE_LOCKED"); };
+    device.slots = slots;
+    EXPECT_EQ((Story{"true", kNotAvailable}), Ask(Find("DASystem::IsSimAvailable()")));
+    EXPECT_EQ((Story{"true", locked("0"), locked("3")}), Ask(Find("DASystem::IsSimExist()")));
+    EXPECT_EQ((Story{"false", kNotAvailable}), Ask(Find("DASystem::IsDualSimAvailable()")));
+    device.slots.resize(1);
+    EXPECT_EQ((Story{"false", kNotAvailable}), Ask(Find("DASystem::IsSimAvailable()")));
+    EXPECT_EQ((Story{"false", locked("0")}), Ask(Find("DASystem::IsSimExist()")));
+    EXPECT_EQ((Story{"false", "E DASystem.cpp IsDualSimAvailable > [Single Sim Device] Not support Dual Sim."}),
+        Ask(Find("DASystem::IsDualSimAvailable()")));
 }
 
 TEST_F(Slots, ThatAreNotThereFailWithoutACallToAModem)
 {
+    auto& manager = *DASimManager::GetInstance();
+    const Session session;
+    sim::SetCallHook(
+        [](Call call, int)
+        {
+            EXPECT_THAT((Calls{Call::telephony_init, Call::telephony_deinit, Call::tel_get_cp_name_list}), testing::Contains(call));
+            return "";
+        });
     for (const int slot : {-1, 2, INT_MAX, INT_MIN})
     {
-        auto& manager = *DASimManager::GetInstance();
-        const auto run = [&](Session& session) -> std::string
-        {
-            char* text = nullptr;
-            const char* mcc = nullptr;
-            bool isRoaming = true;
-            auto status = TAPI_SIM_STATUS_UNKNOWN;
-            int serviceType = 0;
-            const bool isAnyDone =
-                manager.IsSimAvailable(session.given, slot) || manager.IsAvaliableState(slot, &status) ||
-                manager.IsAvaliableSendSMS(slot, &status, &serviceType) || manager.GetRoamingStatus(slot, &isRoaming) ||
-                manager.GetMCCFromSim(session.given, slot, &mcc) == 0 || manager.GetIMSIFromSim(session.given, slot, &text) == 0 ||
-                manager.GetPhoneNumberFromSim(session.given, slot, &text) == 0 ||
-                manager.IsAvaliableSimStateOnPolling(slot, 0, &status);
-            return isAnyDone || !isRoaming ? "done" : "failed";
-        };
-        const auto onCall = [](Call call, int)
-        {
-            const Calls harmless{Call::telephony_init, Call::telephony_deinit, Call::tel_get_cp_name_list};
-            EXPECT_THAT(harmless, testing::Contains(call)) << sim::NameOf(call);
-            return "";
-        };
-        EXPECT_EQ("failed",
-            Try(
-                {{}, "", {}, {}, false, run, {}, {}, {}}, [&] { sim::SetCallHook(onCall); }, [] { sim::SetCallHook(nullptr); })[0]);
+        char* text = nullptr;
+        const char* mcc = nullptr;
+        bool isRoaming = true;
+        auto status = TAPI_SIM_STATUS_UNKNOWN;
+        int serviceType = 0;
+        pauses = 0;
+        EXPECT_FALSE(manager.IsSimAvailable(session.given, slot) || manager.IsAvaliableState(slot, &status) ||
+                     manager.IsAvaliableSendSMS(slot, &status, &serviceType) || manager.GetRoamingStatus(slot, &isRoaming) ||
+                     manager.GetMCCFromSim(session.given, slot, &mcc) == 0 ||
+                     manager.GetIMSIFromSim(session.given, slot, &text) == 0 ||
+                     manager.GetPhoneNumberFromSim(session.given, slot, &text) == 0 ||
+                     manager.IsAvaliableSimStateOnPolling(slot, 0, &status) || !isRoaming);
         EXPECT_EQ(100, pauses) << "of the one that waits for a modem";
     }
+    sim::SetCallHook(nullptr);
 }
 
 TEST_F(Slots, AreJudgedByWhatTheModemSays)
@@ -166,12 +100,7 @@ TEST_F(Slots, AreJudgedByWhatTheModemSays)
     };
     const char kExist[] = "DASystem::IsSimExist()", kRoaming[] = "DASystem::GetRoamingStatus(int, bool*)",
                kSms[] = "DASystem::IsAvaliableSendSMS(int, TelSimCardStatus_t*, int*)";
-    const struct
-    {
-        const char* operation;
-        void (*change)(sim::SimSlot& slot);
-        Story story;
-    } cases[] = {
+    const std::tuple<const char*, void (*)(sim::SimSlot&), Story> cases[] = {
         {kExist, [](sim::SimSlot& slot) { slot.simState = 0; }, state("TELEPHONY_SIM_STATE_UNAVAILABLE")},
         {kExist, [](sim::SimSlot& slot) { slot.simState = 3; }, state("TELEPHONY_SIM_STATE_UNKNOWN")},
         {kExist, [](sim::SimSlot& slot) { slot.simState = 4; }, state("-")},
@@ -179,6 +108,7 @@ TEST_F(Slots, AreJudgedByWhatTheModemSays)
             {"false", kNotAvailable}},
         {kRoaming, [](sim::SimSlot& slot) { slot.serviceState = 2; }, {"false true"}},
         {kRoaming, [](sim::SimSlot& slot) { slot.roaming = true; }, {"true true"}},
+        {"DASystem::IsDualSimAvailable()", [](sim::SimSlot& slot) { slot.cardStatus = {4}; }, {"false", kNotAvailable}},
         {kSms, [](sim::SimSlot& slot) { slot.serviceType = 3; }, service("false", "3")},
         {kSms, [](sim::SimSlot& slot) { slot.serviceType = 4; }, service("true 3 4", "4")},
         {kSms, [](sim::SimSlot& slot) { slot.cardStatus = {99}; }, service("true 99 6", "6")},

@@ -1,12 +1,12 @@
 #ifndef KIV_TESTS_LOGCAPTURE_H
 #define KIV_TESTS_LOGCAPTURE_H
 
+#include "support/Test.h"
+
 #include <SimulatedLog.h>
 #include <dlog.h>
 
 #include <cstdio>
-#include <string>
-#include <vector>
 
 namespace kiv::test
 {

@@ -1,12 +1,7 @@
 #include "support/Peer.h"
 
-#include <gtest/gtest.h>
-
 #include <chrono>
 #include <condition_variable>
-#include <list>
-#include <mutex>
-#include <utility>
 
 namespace kiv::test
 {

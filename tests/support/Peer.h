@@ -3,10 +3,6 @@
 
 #include "support/PrivateBus.h"
 
-#include <functional>
-#include <string>
-#include <vector>
-
 namespace kiv::test
 {
 

@@ -1,13 +1,7 @@
 #include "support/PrivateBus.h"
 
-#include <gtest/gtest.h>
-
 #include <csignal>
-#include <cstdlib>
-#include <fcntl.h>
-#include <poll.h>
 #include <sys/prctl.h>
-#include <sys/wait.h>
 #include <unistd.h>
 
 namespace kiv::test
@@ -47,38 +41,25 @@ PrivateBus::~PrivateBus()
 void PrivateBus::Start()
 {
     const std::lock_guard lock(mutex_);
-    int ready[2];
-    ASSERT_EQ(0, pipe(ready));
-    const std::string address = "--address=" + address_;
-    const std::string print = "--print-address=" + std::to_string(ready[1]);
-    const pid_t parent = getpid();
-    pid_ = fork();
-    if (pid_ == 0)
-    {
-        prctl(PR_SET_PDEATHSIG, SIGKILL);
-        dup2(open("/dev/null", O_WRONLY | O_CLOEXEC), STDERR_FILENO); // where it may not raise its limits it says so, each time
-        if (getppid() == parent)
-            execlp("dbus-daemon", "dbus-daemon", "--config-file=" KIV_PRIVATE_BUS_CONF, "--nofork", address.c_str(), print.c_str(),
-                static_cast<char*>(nullptr));
-        _exit(127);
-    }
-    close(ready[1]);
-    pollfd said{ready[0], POLLIN, 0};
+    g_autoptr(GSubprocessLauncher) launcher = g_subprocess_launcher_new(
+        static_cast<GSubprocessFlags>(G_SUBPROCESS_FLAGS_STDOUT_PIPE | G_SUBPROCESS_FLAGS_STDERR_SILENCE));
+    g_subprocess_launcher_set_child_setup(
+        launcher, [](gpointer) { prctl(PR_SET_PDEATHSIG, SIGKILL); }, nullptr, nullptr);
+    daemon_.reset(g_subprocess_launcher_spawn(launcher, nullptr, "dbus-daemon", "--config-file=" KIV_PRIVATE_BUS_CONF, "--nofork",
+        "--print-address", ("--address=" + address_).c_str(), nullptr));
     char first = 0;
-    const bool answered = poll(&said, 1, 10'000) == 1 && read(ready[0], &first, 1) == 1;
-    close(ready[0]);
-    ASSERT_TRUE(pid_ > 0 && answered) << "dbus-daemon does not start";
+    ASSERT_TRUE(daemon_ && g_input_stream_read(g_subprocess_get_stdout_pipe(daemon_.get()), &first, 1, nullptr, nullptr) == 1)
+        << "dbus-daemon does not start";
 }
 
 void PrivateBus::Stop()
 {
     const std::lock_guard lock(mutex_);
-    if (pid_ > 0)
-    {
-        kill(pid_, SIGKILL);
-        waitpid(pid_, nullptr, 0);
-    }
-    pid_ = -1;
+    if (!daemon_)
+        return;
+    g_subprocess_force_exit(daemon_.get());
+    g_subprocess_wait(daemon_.get(), nullptr, nullptr);
+    daemon_.reset();
 }
 
 void PrivateBus::Tolerate(const char* message)

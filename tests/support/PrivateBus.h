@@ -1,11 +1,7 @@
 #ifndef KIV_TESTS_PRIVATEBUS_H
 #define KIV_TESTS_PRIVATEBUS_H
 
-#include <gio/gio.h>
-
-#include <memory>
-#include <mutex>
-#include <string>
+#include "support/Test.h"
 
 namespace kiv::test
 {
@@ -45,7 +41,7 @@ public:
 private:
     std::string address_;
     std::mutex mutex_; ///< of what follows
-    int pid_ = -1;
+    std::unique_ptr<GSubprocess, Unref> daemon_;
 };
 
 } // namespace kiv::test

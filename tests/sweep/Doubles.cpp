@@ -1,13 +1,9 @@
-#include "sweep/Doubles.h"
+#include "sweep/Sweep.h"
 
 #include <DAMutex.h>
 
-#include <gtest/gtest.h>
-
 #include <new>
-#include <string>
 #include <unistd.h>
-#include <utility>
 
 using namespace kiv::test;
 

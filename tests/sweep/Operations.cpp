@@ -7,14 +7,9 @@
 #include <DASystem.h>
 #include <SimulatedLog.h>
 
-#include <cstdlib>
 #include <cstring>
 #include <cxxabi.h>
 #include <dlfcn.h>
-#include <filesystem>
-#include <memory>
-#include <sstream>
-#include <tuple>
 
 namespace kiv::test
 {
@@ -171,13 +166,16 @@ constexpr bool TakesHandle(Result (Class::*)(Parameters...))
 
 // The table ----------------------------------------------------------------------------------------------------------------------
 
+/// The symbol of a member, readable: "DASystem::GetIMEI(char**)".
 template <class Function>
 std::string SymbolOf(Function function)
 {
     void* address = nullptr;
     std::memcpy(&address, &function, sizeof address);
     Dl_info info{};
-    return dladdr(address, &info) != 0 && info.dli_sname != nullptr ? info.dli_sname : "";
+    const char* const symbol = dladdr(address, &info) == 0 ? nullptr : info.dli_sname;
+    const std::unique_ptr<char, decltype(&std::free)> readable(abi::__cxa_demangle(symbol, nullptr, nullptr, nullptr), std::free);
+    return readable ? readable.get() : "";
 }
 
 struct Table
@@ -195,9 +193,7 @@ struct Table
     /// Adds members that one function calls.
     Table& AddRun(std::vector<std::string> symbols, const std::function<std::string(Session&)>& run, const Story& good)
     {
-        const std::unique_ptr<char, decltype(&std::free)> readable(
-            abi::__cxa_demangle(symbols[0].c_str(), nullptr, nullptr, nullptr), std::free);
-        const std::string name = readable ? readable.get() : symbols[0];
+        const std::string name = symbols[0];
         const auto withoutBlank = [run](Session& session)
         {
             const std::string told = run(session);
@@ -547,6 +543,12 @@ const std::vector<Operation>& Operations()
         return t.rows;
     }();
     return operations;
+}
+
+bool Operation::IsLockedAt(Call call) const
+{
+    return lock == SimLock::kWhole || call == Call::telephony_sim_get_state || call == Call::telephony_sim_get_subscriber_number ||
+           call == Call::tel_get_sim_imsi;
 }
 
 bool IsLong()

@@ -6,11 +6,6 @@
 #include <SimulatedDevice.h>
 #include <telephony.h>
 
-#include <atomic>
-#include <functional>
-#include <string>
-#include <vector>
-
 namespace kiv::test
 {
 
@@ -56,8 +51,8 @@ enum class SimLock
 /// One operation with typical arguments; one that opens and the one that closes are called together.
 struct Operation
 {
-    std::vector<std::string> symbols; ///< as the library exports its members
-    std::string name;
+    std::vector<std::string> symbols; ///< the members that it calls, as the library exports them
+    std::string name;                 ///< the first of them
     Kind kind = Kind::kSingle;
     SimLock lock = SimLock::kAroundReads;
     bool needsHandle = false; ///< the first of the session
@@ -65,6 +60,8 @@ struct Operation
     Story good; ///< on the profile "dual"
     std::vector<Failing> failing;
     std::vector<std::string> noMemory; ///< results of another failure: of memory
+
+    bool IsLockedAt(Call call) const;
 };
 
 /// Every public member of the facade and the managers.

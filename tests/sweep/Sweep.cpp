@@ -1,8 +1,6 @@
 #include "sweep/Sweep.h"
 
-#include <algorithm>
 #include <cstring>
-#include <sstream>
 
 namespace kiv::test
 {
@@ -73,6 +71,12 @@ void Sweep::Use(const std::string& name)
         device.slots.push_back(device.slots[device.slots.size() % 2]);
         device.slots.back().cpName += '_' + std::to_string(device.slots.size());
     }
+}
+
+const Operation& Sweep::Find(const std::string& name)
+{
+    return *std::find_if(
+        Operations().begin(), Operations().end(), [&](const Operation& operation) { return operation.name == name; });
 }
 
 Story Sweep::Try(const Operation& operation, const std::function<void()>& arm, const std::function<void()>& disarm)

@@ -2,14 +2,18 @@
 #define KIV_TESTS_SWEEP_H
 
 #include "support/LogCapture.h"
-#include "sweep/Doubles.h"
 #include "sweep/Operations.h"
-
-#include <gmock/gmock.h>
-#include <gtest/gtest.h>
 
 namespace kiv::test
 {
+
+constexpr char kSimAccess[] = "CORE_MUTEX_NAME_SIM_ACCESS";
+
+// What the doubles of the named locks and of sleep() keep; they stand in front of those that the library links. One thread only.
+inline const char* heldLock = "";           ///< its name, empty for none; the test fails when a second one is taken
+inline std::set<std::string> lockNames;     ///< of the locks made
+inline std::function<bool()> isLockRefused; ///< whether a lock of a new name can not be made
+inline int pauses = 0;                      ///< the seconds that were to be slept
 
 /// How many calls or allocations are to fail in a row: one, two, three, all; more in the long form.
 std::vector<unsigned> Lengths();
@@ -23,6 +27,9 @@ struct Sweep : testing::Test
     /// The profiles, and one device with many slots.
     static std::vector<std::string> Devices();
     void Use(const std::string& name);
+
+    /// The operation of that name.
+    static const Operation& Find(const std::string& name);
 
     /// Runs an operation between two actions; nothing may be open and no lock held in the end.
     Story Try(const Operation& operation, const std::function<void()>& arm, const std::function<void()>& disarm);

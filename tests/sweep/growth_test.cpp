@@ -3,12 +3,7 @@
 
 #include <DADBusManager.h>
 
-#include <gtest/gtest.h>
-
 #include <malloc.h>
-#include <optional>
-#include <thread>
-#include <unistd.h>
 
 namespace
 {
@@ -31,62 +26,34 @@ double BytesPerCall(int calls, Run run)
     return (static_cast<double>(mallinfo2().uordblks) - static_cast<double>(before)) / calls;
 }
 
-struct Growth : testing::Test
+TEST(Growth, OfEachOperationIsNextToNothing)
 {
-    Growth()
+    ASSERT_STREQ("glibc.malloc.tcache_count=0", g_getenv("GLIBC_TUNABLES")) << "the allocator's cache would look like growth";
+    World world;
+    const auto measure = [&](const Operation& operation)
     {
-        // The allocator's cache of each thread would look like growth. It is set up before main, so the program starts once more.
-        if (g_getenv("GLIBC_TUNABLES") == nullptr)
-        {
-            setenv("GLIBC_TUNABLES", "glibc.malloc.tcache_count=0", 1);
-            execl("/proc/self/exe", "growth_test", static_cast<char*>(nullptr));
-        }
-        world.emplace();
-    }
-
-    std::optional<World> world;
-};
-
-TEST_F(Growth, OfEachOperationIsNextToNothingInAThreadWithoutAMainLoop)
-{
-    const auto measure = [](const Operation& operation)
-    {
+        const bool isPush = operation.kind == Kind::kPush;
         int error = 0; // held in the short form, since to connect for each call takes ten times as long
-        const Connection connection(IsLong() ? nullptr : DADBusManager::GetInstance()->InitDbusConnection(&error));
+        const Connection connection(IsLong() || isPush ? nullptr : DADBusManager::GetInstance()->InitDbusConnection(&error));
         const int shortly = operation.kind == Kind::kBus ? 300 : 1000;
-        const double bytes = BytesPerCall(IsLong() ? 5000 : shortly,
-            [&](int)
+        const double bytes = BytesPerCall(IsLong() || isPush ? 5000 : shortly,
+            [&](int i)
             {
                 Session session;
                 ASSERT_EQ(operation.good[0], operation.run(session)) << operation.name;
+                if (isPush && (i % 50 == 0 || i == -1))
+                    world.FinishPushes();
             });
         EXPECT_LT(bytes, kMostBytes) << operation.name;
     };
     for (const Operation& operation : Operations())
     {
-        if (operation.kind != Kind::kPush)
+        if (operation.kind == Kind::kPush)
+            measure(operation);
+        else
             std::thread(measure, operation).join();
     }
-}
-
-TEST_F(Growth, OfPushesThroughALoopIsNextToNothing)
-{
-    constexpr int kAtOnce = 50;
-    for (const Operation& operation : Operations())
-    {
-        if (operation.kind != Kind::kPush)
-            continue;
-        const double bytes = BytesPerCall(IsLong() ? 10'000 : 5'000,
-            [&](int i)
-            {
-                Session session;
-                ASSERT_EQ(operation.good[0], operation.run(session));
-                if (i % kAtOnce == 0 || i == -1)
-                    world->FinishPushes();
-            });
-        EXPECT_LT(bytes, kMostBytes);
-        world->FinishPushes();
-    }
+    world.FinishPushes();
 }
 
 } // namespace

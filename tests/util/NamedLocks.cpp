@@ -1,14 +1,8 @@
+#include "support/Test.h"
+
 #include <DAMutex.h>
 
-#include <gtest/gtest.h>
-
-#include <atomic>
-#include <cstdlib>
 #include <deque>
-#include <future>
-#include <string>
-#include <thread>
-#include <vector>
 
 namespace
 {

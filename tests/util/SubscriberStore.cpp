@@ -1,19 +1,15 @@
+#include "support/Test.h"
+
 #include <DADatabaseManager.h>
 #include <DASubscribeDataManager.h>
 #include <DASubscriberStore.h>
 #include <SimulatedLog.h>
 
-#include <gtest/gtest.h>
 #include <sys/wait.h>
 #include <unistd.h>
 
 #include <chrono>
 #include <csignal>
-#include <cstdlib>
-#include <filesystem>
-#include <fstream>
-#include <functional>
-#include <sstream>
 
 namespace
 {

@@ -1,9 +1,9 @@
+#include "support/Test.h"
+
 #include <ITapiSim.h>
 #include <SimulatedDevice.h>
 #include <net_connection.h>
 #include <telephony.h>
-
-#include <gmock/gmock.h>
 
 using namespace kiv::sim;
 using testing::StartsWith;
@@ -11,35 +11,7 @@ using testing::StartsWith;
 namespace
 {
 
-class DeviceTest : public testing::Test
-{
-protected:
-    ~DeviceTest() override { ResetDevice(); }
-};
-
-TEST_F(DeviceTest, OfEachProfileIsWhatItsDescriptionSays)
-{
-    const std::map<std::string, std::vector<int>> simStates = {{"dual", {2, 2}}, {"dual-first-locked", {1, 2}}, {"single", {2}},
-        {"pin-required", {1}}, {"slow-sim", {3}}, {"roaming", {2}}, {"none", {0, 0}}, {"no-telephony", {}}};
-    std::map<std::string, std::vector<int>> told;
-    for (const Profile& profile : ListProfiles())
-    {
-        EXPECT_EQ("", UseProfile(profile.name));
-        telephony_handle_list_s list{};
-        EXPECT_EQ(profile.name != "no-telephony", telephony_init(&list) == 0);
-        std::vector<int>& states = told[profile.name];
-        for (unsigned slot = 0; slot < list.count; ++slot)
-        {
-            telephony_sim_state_e state{};
-            EXPECT_EQ(0, telephony_sim_get_state(list.handle[slot], &state));
-            states.push_back(state);
-        }
-        EXPECT_EQ(0, telephony_deinit(&list));
-    }
-    EXPECT_EQ(simStates, told);
-}
-
-TEST_F(DeviceTest, TellsWhatIsOpenAndWhatWasUsedWrongly)
+TEST(Handles, ThatAreOpenAndWhatWasDoneWronglyWithThemAreTold)
 {
     telephony_handle_list_s list{};
     connection_h connection = nullptr;
