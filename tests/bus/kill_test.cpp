@@ -17,6 +17,8 @@ unsigned long Wish(const char* variable, unsigned long otherwise)
     return value == nullptr ? otherwise : std::strtoul(value, nullptr, 10);
 }
 
+constexpr const char* operations[] = {"serial", "service manager", "walk", "several", "push"};
+
 struct Kill : BusTest
 {
     /// A bus operation, of which what comes back has to be one of its results.
@@ -80,7 +82,6 @@ TEST_F(Kill, AtAnyMomentLeavesTheProcessAliveNothingOwnedAndTheNextCallGoesToThe
     std::mt19937 random(static_cast<std::mt19937::result_type>(seed));
     for (unsigned long round = 0; round < rounds && !HasFailure(); ++round)
     {
-        const char* const operations[] = {"serial", "service manager", "walk", "several", "push"};
         const std::string name = operations[random() % std::size(operations)];
         SCOPED_TRACE(name + ", round " + std::to_string(round));
         const gulong delayUs = random() % 3000;
@@ -129,9 +130,9 @@ TEST_F(Kill, IsFoundByEveryCallAsLongAsTheAgentHoldsTheDeadConnection)
     store.records = {Record(client)};
     while (!g_dbus_connection_is_closed(agents.get()))
         std::this_thread::yield();
-    for (const auto& [name, operation] : operations)
+    for (const char* const name : operations)
     {
-        operation();
+        Run(name);
         EXPECT_THAT(log.TakeErrors(), testing::Not(IsEmpty())) << name;
     }
     EXPECT_EQ(5, NotifyServiceManager(KIV_NOTI_TYPE_ACTIVATED));
