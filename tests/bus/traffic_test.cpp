@@ -93,7 +93,7 @@ TEST_F(Traffic, OfANotificationIsThatOfTheBareLoop)
     {
         g_autoptr(GDBusProxy) proxy = g_dbus_proxy_new_for_bus_sync(G_BUS_TYPE_SYSTEM, G_DBUS_PROXY_FLAGS_NONE, nullptr,
             record.busname.c_str(), record.objectpath.c_str(), record.interface.c_str(), nullptr, nullptr);
-        g_autoptr(GVariant) reply = g_dbus_proxy_call_sync(
+        [[maybe_unused]] g_autoptr(GVariant) reply = g_dbus_proxy_call_sync(
             proxy, "status", g_variant_new("((sis))", imsi, 7, "on"), G_DBUS_CALL_FLAGS_NONE, G_MAXINT, nullptr, nullptr);
     }
     EXPECT_EQ(monitor.Take(), librarys);
@@ -123,7 +123,7 @@ TEST_F(Traffic, OfAPushIsThatOfTheBareCallbacks)
     bareEnded = 0;
     const auto called = [](GObject* proxy, GAsyncResult* result, gpointer)
     {
-        g_autoptr(GVariant) reply = g_dbus_proxy_call_finish(G_DBUS_PROXY(proxy), result, nullptr);
+        [[maybe_unused]] g_autoptr(GVariant) reply = g_dbus_proxy_call_finish(G_DBUS_PROXY(proxy), result, nullptr);
         g_object_unref(proxy);
         ++bareEnded;
     };
