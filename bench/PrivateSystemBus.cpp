@@ -48,7 +48,7 @@ double ProcessNs(GSubprocess* process)
 {
     clockid_t clock{};
     timespec used{};
-    clock_getcpuclockid(std::atoi(g_subprocess_get_identifier(process)), &clock);
+    clock_getcpuclockid(std::stoi(g_subprocess_get_identifier(process)), &clock);
     clock_gettime(clock, &used);
     return static_cast<double>(used.tv_sec) * 1e9 + static_cast<double>(used.tv_nsec);
 }

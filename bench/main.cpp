@@ -3,8 +3,8 @@
 
 #include <CLI/CLI.hpp>
 
+#include <cstdio>
 #include <exception>
-#include <iostream>
 
 namespace
 {
@@ -30,9 +30,7 @@ bool MeasureAll(const std::string& only, const std::string& json)
     return table.IsMet();
 }
 
-} // namespace
-
-int main(int argc, char** argv)
+int Run(int argc, char** argv)
 {
     CLI::App options("Measures what the library costs, as ratios to the same done without it, and against its goals.");
     options.footer("Exit codes: 0 every goal met, 1 one missed, 2 trouble.");
@@ -43,17 +41,24 @@ int main(int argc, char** argv)
     options.add_flag(kServe, isService)->group("");
     options.add_flag(kGrowth, isGrowth)->group("");
     CLI11_PARSE(options, argc, argv);
+    if (isService)
+        return Serve();
+    if (isGrowth)
+        return PrintGrowth();
+    return MeasureAll(only, json) ? 0 : 1;
+}
+
+} // namespace
+
+int main(int argc, char** argv)
+{
     try
     {
-        if (isService)
-            return Serve();
-        if (isGrowth)
-            return PrintGrowth();
-        return MeasureAll(only, json) ? 0 : 1;
+        return Run(argc, argv);
     }
     catch (const std::exception& trouble)
     {
-        std::cerr << "kiv_bench: " << trouble.what() << '\n';
+        std::fprintf(stderr, "kiv_bench: %s\n", trouble.what());
         return 2;
     }
 }
