@@ -9,13 +9,23 @@ namespace
 
 using namespace kiv::test;
 
+/// What the monitor saw. The program's own from the start on, because GLib hands the filter to its thread under locks that
+/// ThreadSanitizer does not see.
+struct
+{
+    std::mutex mutex;
+    std::condition_variable changed;
+    std::vector<std::string> lines;
+    bool isMarked = false;
+} seen;
+
 /// Sees every message on the bus. A mark that is sent over the connection in question tells where its messages end.
 class Monitor
 {
 public:
     Monitor(const PrivateBus& bus, GDBusConnection* marking) : marking_(marking), connection_(bus.Connect())
     {
-        g_dbus_connection_add_filter(connection_.get(), See, this, nullptr);
+        g_dbus_connection_add_filter(connection_.get(), See, nullptr, nullptr);
         g_autoptr(GVariant) reply = g_dbus_connection_call_sync(connection_.get(), "org.freedesktop.DBus", "/org/freedesktop/DBus",
             "org.freedesktop.DBus.Monitoring", "BecomeMonitor", g_variant_new_parsed("(@as [], uint32 0)"), nullptr,
             G_DBUS_CALL_FLAGS_NONE, -1, nullptr, nullptr);
@@ -28,16 +38,15 @@ public:
     std::vector<std::string> Take()
     {
         g_dbus_connection_emit_signal(marking_, nullptr, "/", "a.b", "Mark", nullptr, nullptr);
-        std::unique_lock lock(mutex_);
-        EXPECT_TRUE(changed_.wait_for(lock, std::chrono::seconds(10), [this] { return isMarked_; }));
-        isMarked_ = false;
-        return std::exchange(seen_, {});
+        std::unique_lock lock(seen.mutex);
+        EXPECT_TRUE(seen.changed.wait_for(lock, std::chrono::seconds(10), [] { return seen.isMarked; }));
+        seen.isMarked = false;
+        return std::exchange(seen.lines, {});
     }
 
 private:
-    static GDBusMessage* See(GDBusConnection*, GDBusMessage* message, gboolean incoming, gpointer data)
+    static GDBusMessage* See(GDBusConnection*, GDBusMessage* message, gboolean incoming, gpointer)
     {
-        auto& self = *static_cast<Monitor*>(data);
         const auto text = [](const char* value) { return std::string(" ") + (value == nullptr ? "-" : value); };
         GVariant* const body = g_dbus_message_get_body(message);
         g_autofree gchar* values = body == nullptr ? nullptr : g_variant_print(body, TRUE);
@@ -45,22 +54,18 @@ private:
                                  text(g_dbus_message_get_sender(message)) + text(g_dbus_message_get_destination(message)) +
                                  text(g_dbus_message_get_path(message)) + text(g_dbus_message_get_interface(message)) +
                                  text(g_dbus_message_get_member(message)) + text(values);
-        const std::lock_guard lock(self.mutex_);
+        const std::lock_guard lock(seen.mutex);
         if (incoming && g_strcmp0(g_dbus_message_get_member(message), "Mark") == 0)
-            self.isMarked_ = true;
+            seen.isMarked = true;
         else if (incoming)
-            self.seen_.push_back(line);
-        self.changed_.notify_all();
+            seen.lines.push_back(line);
+        seen.changed.notify_all();
         if (!incoming || g_dbus_message_get_message_type(message) != G_DBUS_MESSAGE_TYPE_METHOD_CALL)
             return message;
         g_object_unref(message); // who only watches must not answer
         return nullptr;
     }
 
-    std::mutex mutex_;
-    std::condition_variable changed_;
-    std::vector<std::string> seen_;
-    bool isMarked_ = false;
     GDBusConnection* marking_;
     Connection connection_;
 };
