@@ -23,7 +23,7 @@ find_package(kiv_system 1.0 REQUIRED)
 add_executable(agent ../agent.cpp)
 target_link_libraries(agent kiv::system)
 CMAKE
-    cmake -S "$scratch/with-cmake" -B "$scratch/with-cmake" -DCMAKE_PREFIX_PATH="$prefix" -DCMAKE_CXX_COMPILER="$cxx" \
+    cmake -G Ninja -S "$scratch/with-cmake" -B "$scratch/with-cmake" -DCMAKE_PREFIX_PATH="$prefix" -DCMAKE_CXX_COMPILER="$cxx" \
         -DCMAKE_CXX_STANDARD=17 >"$scratch/cmake.log"
     cmake --build "$scratch/with-cmake" >>"$scratch/cmake.log"
     run_agent "$scratch/with-cmake/agent"

@@ -49,7 +49,7 @@ cp -r "$sources/lib/DASystem" "$scratch/tree/lib"
 export PKG_CONFIG_PATH=$device/lib/pkgconfig
 configure() # option...
 {
-    cmake -S "$scratch/tree" -B "$scratch/build" -DKIV_PLATFORM=native -DCMAKE_BUILD_TYPE=Debug -DCMAKE_CXX_COMPILER="$cxx" \
+    cmake -G Ninja -S "$scratch/tree" -B "$scratch/build" -DKIV_PLATFORM=native -DCMAKE_BUILD_TYPE=Debug -DCMAKE_CXX_COMPILER="$cxx" \
         "$@" >"$scratch/log" 2>&1
 }
 if configure || ! grep --quiet "None of the required 'dlog' found" "$scratch/log"; then
