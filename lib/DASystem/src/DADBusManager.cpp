@@ -181,15 +181,9 @@ void DrainIfFree()
         Drain(ConnectContext());
 }
 
-/// The shared connection that was seen last; null when nobody holds it any more. Lets go of one that closed first.
+/// The shared connection that was seen last; null when nobody holds it any more.
 GDBusConnection* SeenConnection()
 {
-    g_autoptr(GDBusConnection) connection = static_cast<GDBusConnection*>(g_weak_ref_get(&lastConnection));
-    if (connection == nullptr || !g_dbus_connection_is_closed(connection))
-        return static_cast<GDBusConnection*>(g_steal_pointer(&connection));
-
-    g_clear_object(&connection);
-    DrainIfFree();
     return static_cast<GDBusConnection*>(g_weak_ref_get(&lastConnection));
 }
 
@@ -610,8 +604,8 @@ int DADBusManager::SendActivatedNotification(char* imsi, int flag)
 int DADBusManager::SendNumberChangedNotification(
     char* imsi, const char* first, const char* second, const char* third, const char* fourth)
 {
-    return Notify(KIV_HERE, kNumberChanged, 0,
-        {{"imsi", imsi}, {"first text", first}, {"second text", second}, {"third text", third}, {"fourth text", fourth}});
+    return Notify(
+        KIV_HERE, kNumberChanged, 0, {{"imsi", imsi}, {"first", first}, {"second", second}, {"third", third}, {"fourth", fourth}});
 }
 
 // Push -------------------------------------------------------------------------------------------------------------------------
@@ -663,8 +657,11 @@ void proxy_new_cb(GObject*, GAsyncResult* result, gpointer user_data)
     if (proxy == nullptr)
     {
         KIV_ERROR("Unable to create proxy: %s", Reason(error));
+        delivery.reset();
+        DrainIfFree();
         return;
     }
+    Adopt(g_dbus_proxy_get_connection(proxy)); // which may have been made for this proxy
 
     const auto item = [&](guint position) { return static_cast<const char*>(g_list_nth_data(delivery.get(), position)); };
     const gint64 noti_time = *static_cast<const gint64*>(g_list_nth_data(delivery.get(), 3));
@@ -693,7 +690,6 @@ void RequestConnection()
     const std::unique_lock<std::recursive_mutex> lock(connectLock, std::try_to_lock);
     if (lock.owns_lock())
     {
-        Drain(ConnectContext());
         const ThreadDefault isDefault(ConnectContext());
         g_bus_get(G_BUS_TYPE_SYSTEM, nullptr, connection_cb, nullptr);
     }
@@ -712,6 +708,12 @@ bool PrepareDelivery(const _SubscriberInfo& subscriber, GDBusConnection*& connec
         return false;
     }
     connection = SeenConnection();
+    if (!isRequested && (connection == nullptr || g_dbus_connection_is_closed(connection)))
+    {
+        g_clear_object(&connection);
+        DrainIfFree(); // lets go of a closed one, and tells of one that an earlier push asked for
+        connection = SeenConnection();
+    }
     if (connection != nullptr)
         return IsUsable(connection, error);
     if (!isRequested)
