@@ -179,6 +179,41 @@ std::string ValuesOf(const Field<Owner>& field)
     return std::visit([&](auto member) { return ValuesOf(owner.*member, field.limits); }, field.member);
 }
 
+// What stands for a key that the file leaves out, in words.
+std::string DefaultOf(const std::string& /*value*/)
+{
+    return "required";
+}
+
+template <class Value>
+std::string DefaultOf(const std::optional<Value>& /*value*/)
+{
+    return "none";
+}
+
+std::string DefaultOf(bool value)
+{
+    return value ? "true" : "false";
+}
+
+template <class Number, std::enable_if_t<std::is_integral_v<Number>, int> = 0>
+std::string DefaultOf(Number value)
+{
+    return std::to_string(value);
+}
+
+std::string DefaultOf(const std::vector<int>& value)
+{
+    return DefaultOf(value.back());
+}
+
+template <class Owner>
+std::string DefaultOf(const Field<Owner>& field)
+{
+    const Owner owner{};
+    return std::visit([&](auto member) { return DefaultOf(owner.*member); }, field.member);
+}
+
 using KeyFile = std::unique_ptr<GKeyFile, decltype(&g_key_file_unref)>;
 using Owned = std::unique_ptr<char, decltype(&g_free)>;
 using OwnedList = std::unique_ptr<char*, decltype(&g_strfreev)>;
@@ -326,7 +361,7 @@ template <class Owner, std::size_t count>
 void List(const Field<Owner> (&fields)[count], const char* groupEnd, std::vector<FieldInfo>& all)
 {
     for (const Field<Owner>& field : fields)
-        all.push_back({std::string(field.group) + groupEnd, field.key, ValuesOf(field), field.meaning});
+        all.push_back({std::string(field.group) + groupEnd, field.key, ValuesOf(field), DefaultOf(field), field.meaning});
 }
 
 } // namespace
@@ -361,7 +396,7 @@ std::vector<FieldInfo> ListFields()
     std::vector<FieldInfo> all;
     List(kDeviceFields, "", all);
     List(kSlotFields, "0", all);
-    all.push_back({kPackages, "PACKAGE-ID", "text", "version of an installed package"});
+    all.push_back({kPackages, "PACKAGE-ID", "text", "none", "version of an installed package"});
     return all;
 }
 

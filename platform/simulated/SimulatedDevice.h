@@ -98,7 +98,8 @@ struct FieldInfo
 {
     std::string group; ///< "sim0" stands for that of every slot
     std::string key;
-    std::string values; ///< what it may hold
+    std::string values;   ///< what it may hold
+    std::string fallback; ///< what it is without the key: "none" for a value that is missing, "required" where there is no device
     std::string meaning;
 };
 

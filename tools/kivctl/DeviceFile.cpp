@@ -63,7 +63,10 @@ Exit ShowDeviceKeys(const Command& command)
 {
     std::vector<Record> rows;
     for (const kiv::sim::FieldInfo& field : kiv::sim::ListFields())
-        rows.push_back({{"key", field.group + "." + field.key}, {"values", field.values}, {"meaning", field.meaning}});
+    {
+        rows.push_back({{"key", field.group + "." + field.key}, {"values", field.values}, {"default", field.fallback},
+            {"meaning", field.meaning}});
+    }
     PrintTable(rows, command.form);
     return Exit::Done;
 }
