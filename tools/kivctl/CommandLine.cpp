@@ -5,6 +5,7 @@
 #include "Verbs.h"
 
 #include <CLI/CLI.hpp>
+#include <DASubscriberStore.h>
 
 #include <algorithm>
 #include <cstring>
@@ -202,7 +203,7 @@ void AddSubscribe(CLI::App& app, Command& command)
 {
     const auto [verb, options] =
         AddVerb(app, command, "subscribe", "Be a client service: subscribe and print each call, until Ctrl-C", Subscribe);
-    Restrict(verb->add_option("--kind", options->kinds, "Event to hear of; may come several times"), SubscriptionKinds());
+    Restrict(verb->add_option("--kind", options->kinds, "Event to hear of; may come several times"), DASubscriberStore::Kinds());
     verb->add_option("--key", options->key, "Service of policy and status (a number) and of push (a name)")->type_name("SERVICE");
     verb->add_option("--push", options->pushes, "The same as --kind push --key SERVICE")->type_name("SERVICE");
     verb->add_option("--name", options->name, "Bus name to own; the connection's unique name without it")->type_name("BUS_NAME");
@@ -215,7 +216,7 @@ void AddSubscribers(CLI::App& app, Command& command)
 
     const auto addFields = [](CLI::App* verb, SubscriptionOptions& options)
     {
-        Restrict(verb->add_option("KIND", options.kind, "Event to hear of")->required(), SubscriptionKinds());
+        Restrict(verb->add_option("KIND", options.kind, "Event to hear of")->required(), DASubscriberStore::Kinds());
         verb->add_option("KEY", options.key, "Service id, service name for push, or \"all\"")->required();
         verb->add_option("BUS_NAME", options.busName, "Such as org.example.Client")->required();
         verb->add_option("OBJECT_PATH", options.objectPath, "Such as /org/example/Client")->required();

@@ -65,11 +65,6 @@ std::vector<std::pair<std::string, std::string>> Wanted(const SubscribeOptions& 
 
 } // namespace
 
-std::vector<std::string> SubscriptionKinds()
-{
-    return {"policy", "status", "auth", "activated", "number_changed", "push"};
-}
-
 Exit Subscribe(const SubscribeOptions& options, const Command& command)
 {
     const auto wanted = Wanted(options);

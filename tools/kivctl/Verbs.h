@@ -107,12 +107,11 @@ Exit RunServices(const ServicesOptions& options, const Command& command);
 /// @{
 struct SubscribeOptions
 {
-    std::vector<std::string> kinds; ///< of SubscriptionKinds()
+    std::vector<std::string> kinds; ///< of DASubscriberStore::Kinds()
     std::string key;
     std::vector<std::string> pushes;
     std::string name; ///< empty for the connection's unique name alone
 };
-std::vector<std::string> SubscriptionKinds();
 Exit Subscribe(const SubscribeOptions& options, const Command& command);
 /// @}
 

@@ -10,7 +10,7 @@
 /// One line of the store: who hears of which event.
 struct DASubscription
 {
-    std::string kind;           ///< "policy", "status", "auth", "activated", "number_changed" or "push"
+    std::string kind;           ///< one of DASubscriberStore::Kinds()
     std::string key;            ///< decimal service id, service name for "push", or "all"
     _SubscriberInfo subscriber; ///< where to call
 };
@@ -33,6 +33,9 @@ public:
         Refused,   ///< the subscription can not be one: the reason names the field, the value and what would be right
         Failed     ///< the file can not be used: the reason names file and trouble
     };
+
+    /// The kinds of events that there are; "push" is that of push messages.
+    static std::vector<std::string> Kinds();
 
     /// Where the store is, or would be made: an absolute path.
     static std::string Path();

@@ -86,6 +86,14 @@ bool IsKind(const std::string& text)
     return std::find(std::begin(kKinds), std::end(kKinds), text) != std::end(kKinds);
 }
 
+std::string KindWanted()
+{
+    std::string wanted = "one of these is needed:";
+    for (const char* const kind : kKinds)
+        wanted.append(" ").append(kind);
+    return wanted;
+}
+
 bool IsKey(const std::string& text)
 {
     if (text.empty() || text.size() > 255 || g_utf8_validate(text.data(), static_cast<gssize>(text.size()), nullptr) == FALSE)
@@ -107,9 +115,9 @@ std::string Objection(const DASubscription& subscription)
         const char* field;
         const std::string& value;
         bool (*isPossible)(const std::string&);
-        const char* wanted;
+        std::string wanted;
     } rules[] = {
-        {"kind", subscription.kind, IsKind, "policy, status, auth, activated, number_changed or push is needed"},
+        {"kind", subscription.kind, IsKind, KindWanted()},
         {"key", subscription.key, IsKey, "1 to 255 bytes of UTF-8 without control characters are needed, such as 7 or all"},
         {"bus name", subscriber.busname, [](const std::string& text) { return g_dbus_is_name(text.c_str()) != FALSE; },
             "two or more elements joined by dots are needed, such as org.example.Client"},
@@ -136,6 +144,11 @@ std::string Objection(const DASubscription& subscription)
 }
 
 } // namespace
+
+std::vector<std::string> DASubscriberStore::Kinds()
+{
+    return {std::begin(kKinds), std::end(kKinds)};
+}
 
 std::string DASubscriberStore::Path()
 {
