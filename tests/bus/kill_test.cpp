@@ -109,17 +109,27 @@ TEST_F(Kill, AtAnyMomentLeavesTheProcessAliveNothingOwnedAndTheNextCallGoesToThe
             Settle();
         }
         bus.Start();
-        Peer serviceManager(bus, kServiceManager);
+        Peer client(bus), daemon(bus, kBoardDaemon, Peer::Reply("('KIV2',)")), serviceManager(bus, kServiceManager);
+        store.records = {Record(client)};
         // What a push asked for may be told of in the loop a moment after its deliveries ended, and until then GDBus goes on
         // failing.
         if (name == "push")
             IterateUntil([this] { return NotifyServiceManager(KIV_NOTI_TYPE_ACTIVATED) == 0; });
         const std::size_t calls = serviceManager.Calls().size();
         log.Take();
-        EXPECT_EQ(0, NotifyServiceManager(KIV_NOTI_TYPE_ACTIVATED));
-        std::thread([this] { EXPECT_EQ(0, NotifyServiceManager(KIV_NOTI_TYPE_ACTIVATED)); }).join();
-        EXPECT_EQ(calls + 2, serviceManager.Calls().size());
+        const auto callAll = [this]
+        {
+            for (const char* const operation : {"serial", "service manager", "walk"})
+                Run(operation);
+        };
+        callAll();
+        std::thread(callAll).join();
         EXPECT_THAT(log.TakeErrors(), IsEmpty());
+        Run("push");
+        Settle();
+        EXPECT_EQ(2U, daemon.Calls().size());
+        EXPECT_EQ(calls + 2, serviceManager.Calls().size());
+        EXPECT_EQ(3U, client.Calls().size());
     }
     PrivateBus::Tolerate(nullptr);
 }

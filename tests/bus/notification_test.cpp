@@ -189,6 +189,30 @@ TEST_F(Notification, PassesOverSubscribersThatCanNotBeCalledAreGoneRefuseOrLeave
         EXPECT_THAT(peer->Calls(), ElementsAre(Status("7, 'on'")));
 }
 
+TEST_F(Notification, GoesToWhoOwnsTheNameWhenItsRecordIsReached)
+{
+    constexpr char kName[] = "org.example.Moving";
+    Peer before(bus, kName), after(bus);
+    store.records.assign(3, Record(before));
+    Subscribe(client);
+    int record = 0;
+    kiv::sim::SetLogSink(
+        [&](const kiv::sim::LogLine& line)
+        {
+            record += line.text.find("] interface: ") != std::string::npos;
+            if (record == 2)
+                after.Own(kName);
+            if (record == 3)
+                after.Close();
+        });
+    EXPECT_EQ(0, manager.SendStatusNotification(imsi, 7, "on"));
+    kiv::sim::SetLogSink(nullptr);
+    EXPECT_EQ(4, record);
+    for (const Peer* peer : {&before, &after, &client})
+        EXPECT_THAT(peer->Calls(), ElementsAre(Status("7, 'on'")));
+    EXPECT_THAT(log.TakeErrors(), ElementsAre(StartsWith(Line("no call result: ", "E", "SendStatusNotification"))));
+}
+
 TEST_F(Notification, ToTheServiceManagerTellsWhetherItWasAnswered)
 {
     serviceManager.Set(Peer::Reply("('no', 13)"));

@@ -106,3 +106,13 @@ org.tizen.servicemanager.service $manager/other  org.tizen.servicemanager.auth
 org.freedesktop.DBus             /               org.freedesktop.DBus.ListNames
 org.example.Other                /               org.kiv.ClientService.auth
 CALLS
+
+# Where not even the owner of a name may be asked for, nothing can be addressed.
+deny='<deny send_interface="org.freedesktop.DBus" send_member="GetNameOwner"/>'
+sed --in-place "s|</busconfig>|<policy context=\"mandatory\">$deny</policy>&|" "$scratch/bus.conf"
+kill -HUP "${pids[0]}"
+deadline=$((SECONDS + 20)) code=0
+while ((code != 5)); do
+    ((SECONDS < deadline)) || fail "exit code $code, not 5"
+    "$kivctl" notify auth-success --to manager >/dev/null 2>"$scratch/last.log" && code=0 || code=$?
+done

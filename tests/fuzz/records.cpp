@@ -1,5 +1,6 @@
-// Records of subscribers, one a line: bus name, object path and interface with tabs between them. A good record stands somewhere
-// among them. A line "push" in front has a push delivered, anything else has a notification.
+// Lines of bus name, object path and interface with tabs between them; each line's name with each line's path and interface is a
+// record of a subscriber. A good record stands somewhere among them. A line "push" in front has a push delivered, anything else
+// has a notification.
 #include "Bus.h"
 
 using namespace kiv::fuzz;
@@ -19,17 +20,18 @@ std::string Path()
 
 void Try(std::string_view input)
 {
-    constexpr std::size_t kMostRecords = 16;
+    constexpr std::size_t kMostLines = 10; // the bus lets a connection wait for 128 replies at once
     static Bus& bus = *new Bus([](GDBusMessage* call) { delivered += g_dbus_message_get_path(call) == Path() ? 1 : 0; });
     auto lines = Split(input, '\n');
-    lines.resize(std::min(lines.size(), kMostRecords));
+    lines.resize(std::min(lines.size(), kMostLines));
     auto& records = bus.store.records;
     records.clear();
+    std::vector<std::vector<std::string>> fields;
     for (const auto& line : lines)
-    {
-        const auto fields = Split(line, '\t', 3);
-        records.push_back({fields[0], fields[1], fields[2]});
-    }
+        fields.push_back(Split(line, '\t', 3));
+    for (const auto& name : fields)
+        for (const auto& object : fields)
+            records.push_back({name[0], object[1], object[2]});
     Feed(records.size() + 1);
     ++number;
     delivered = 0;

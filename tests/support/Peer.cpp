@@ -44,12 +44,18 @@ Peer::Peer(const PrivateBus& bus, const std::string& name, Answer answer) : conn
     }
     Set(std::move(answer));
     g_dbus_connection_add_filter(connection_.get(), Filter, state_, nullptr);
-    name_ = name.empty() ? g_dbus_connection_get_unique_name(connection_.get()) : name;
-    if (name.empty())
-        return;
-    g_autoptr(GVariant) reply =
-        g_dbus_connection_call_sync(connection_.get(), "org.freedesktop.DBus", "/org/freedesktop/DBus", "org.freedesktop.DBus",
-            "RequestName", g_variant_new("(su)", name.c_str(), 0), nullptr, G_DBUS_CALL_FLAGS_NONE, 10'000, nullptr, nullptr);
+    name_ = g_dbus_connection_get_unique_name(connection_.get());
+    if (!name.empty())
+        Own(name);
+}
+
+void Peer::Own(const std::string& name)
+{
+    name_ = name;
+    constexpr guint kReplacesAndIsReplacedForGood = 1 | 2 | 4;
+    g_autoptr(GVariant) reply = g_dbus_connection_call_sync(connection_.get(), "org.freedesktop.DBus", "/org/freedesktop/DBus",
+        "org.freedesktop.DBus", "RequestName", g_variant_new("(su)", name.c_str(), kReplacesAndIsReplacedForGood), nullptr,
+        G_DBUS_CALL_FLAGS_NONE, 10'000, nullptr, nullptr);
     EXPECT_NE(nullptr, reply);
 }
 

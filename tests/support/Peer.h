@@ -33,6 +33,8 @@ public:
 
     /// The name to call it by: the well-known one, else the unique one.
     const std::string& Name() const { return name_; }
+    /// Owns a well-known name from now on, instead of whoever did.
+    void Own(const std::string& name);
     std::vector<std::string> Calls() const;
     /// Waits until that many calls arrived since the beginning; fails after ten seconds.
     void AwaitCalls(std::size_t count);

@@ -2,7 +2,6 @@
 #include "sweep/Sweep.h"
 
 #include <iostream>
-#include <regex>
 
 namespace
 {
@@ -89,12 +88,12 @@ struct PlatformSweep : Sweep
 
 TEST_F(PlatformSweep, HasEveryPublicMemberInItsTable)
 {
-    const std::regex memberFunction(R"((\w+)::(?!~|\1\().*\))");
     std::set<std::string> exported, listed;
     std::ifstream in(KIV_EXPORTED_SYMBOLS);
     for (std::string symbol; std::getline(in, symbol);)
     {
-        if (std::regex_match(symbol, memberFunction))
+        // Neither a destructor nor a constructor nor a variable.
+        if (g_regex_match_simple(R"(^(\w+)::(?!~|\1\().*\)$)", symbol.c_str(), GRegexCompileFlags(0), GRegexMatchFlags(0)))
             exported.insert(symbol);
     }
     for (const Operation& operation : Operations())
