@@ -4,8 +4,8 @@
 #include <chrono>
 #include <condition_variable>
 #include <mutex>
-#include <regex>
 #include <stdexcept>
+#include <utility>
 
 namespace kiv::bench
 {
@@ -33,8 +33,10 @@ std::string Line(GDBusMessage* message)
         const g_autofree char* text = g_variant_print(body, TRUE);
         line.append(" ").append(text);
     }
-    static const std::regex uniqueName(":1\\.[0-9]+");
-    return std::regex_replace(line, uniqueName, ":1.*");
+    static GRegex* const uniqueName = g_regex_new(":1\\.[0-9]+", G_REGEX_OPTIMIZE, static_cast<GRegexMatchFlags>(0), nullptr);
+    const g_autofree char* same =
+        g_regex_replace_literal(uniqueName, line.c_str(), -1, 0, ":1.*", static_cast<GRegexMatchFlags>(0), nullptr);
+    return same;
 }
 
 } // namespace

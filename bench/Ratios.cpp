@@ -113,11 +113,8 @@ void Compare(Table& table, const Pair& pair)
     const bool isMet = ratio * bare <= pair.goal.factor * bare + pair.goal.slackNs;
     char times[64];
     std::snprintf(times, sizeof times, "%.4g ns to %.4g ns", library, bare);
-    Row row{pair.item, Text(pair.goal), isMet ? Outcome::Met : Outcome::Missed, ratio, summary.Of("low", "ratio"),
-        summary.Of("high", "ratio"), {}, times, {{"library_ns", library}, {"bare_ns", bare}}};
-    if (!pair.more.is_null())
-        row.more.update(pair.more);
-    table.Add(std::move(row));
+    table.Add({pair.item, Text(pair.goal), isMet ? Outcome::Met : Outcome::Missed, ratio, summary.Of("low", "ratio"),
+        summary.Of("high", "ratio"), {}, times, library, bare, pair.series, pair.subscribers});
 }
 
 } // namespace kiv::bench

@@ -1,5 +1,7 @@
 #include "Table.h"
 
+#include <nlohmann/json.hpp>
+
 #include <algorithm>
 #include <cstdio>
 #include <fstream>
@@ -47,8 +49,10 @@ bool Table::WriteJson(const std::string& path) const
         nlohmann::json line = {{"item", row.item}, {"goal", row.goal}, {"outcome", Word(row.outcome)}, {"remark", row.remark}};
         if (row.outcome != Outcome::NotMeasured)
             line.update({{"measured", row.measured}, {"low", row.low}, {"high", row.high}, {"unit", row.unit}});
-        if (!row.more.is_null())
-            line.update(row.more);
+        if (row.bareNs > 0)
+            line.update({{"library_ns", row.libraryNs}, {"bare_ns", row.bareNs}});
+        if (!row.series.empty())
+            line.update({{"series", row.series}, {"subscribers", row.subscribers}});
         all.push_back(std::move(line));
     }
     std::ofstream file(path);

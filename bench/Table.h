@@ -1,8 +1,6 @@
 #ifndef KIV_BENCH_TABLE_H
 #define KIV_BENCH_TABLE_H
 
-#include <nlohmann/json.hpp>
-
 #include <string>
 #include <vector>
 
@@ -23,10 +21,12 @@ struct Row
     std::string goal;
     Outcome outcome = Outcome::NotMeasured;
     double measured = 0;
-    double low = 0, high = 0; ///< between which the middle half of the rounds lies; equal when there is nothing to spread
-    std::string unit = {};    ///< empty for a ratio
-    std::string remark = {};  ///< what the number was made of, or why there is none
-    nlohmann::json more = {}; ///< further members of the row in JSON
+    double low = 0, high = 0;         ///< between which the middle half of the rounds lies; equal when there is nothing to spread
+    std::string unit = {};            ///< empty for a ratio
+    std::string remark = {};          ///< what the number was made of, or why there is none
+    double libraryNs = 0, bareNs = 0; ///< of which it is the ratio
+    std::string series = {};          ///< of the picture, for which this is the point at so many subscribers
+    int subscribers = 0;
 };
 
 /// What was measured, printed row by row as it comes.

@@ -1,7 +1,7 @@
 #include "Items.h"
 #include "PrivateSystemBus.h"
 
-#include <CLI/CLI.hpp>
+#include <gio/gio.h>
 
 #include <cstdio>
 #include <exception>
@@ -32,20 +32,30 @@ bool MeasureAll(const std::string& only, const std::string& json)
 
 int Run(int argc, char** argv)
 {
-    CLI::App options("Measures what the library costs, as ratios to the same done without it, and against its goals.");
-    options.footer("Exit codes: 0 every goal met, 1 one missed, 2 trouble.");
-    std::string only, json;
-    bool isService = false, isGrowth = false;
-    options.add_option("--only", only, "Only the items whose text holds this")->type_name("TEXT");
-    options.add_option("--json", json, "Writes the table to a file, too")->type_name("FILE");
-    options.add_flag(kServe, isService)->group("");
-    options.add_flag(kGrowth, isGrowth)->group("");
-    CLI11_PARSE(options, argc, argv);
+    g_autofree char *only = nullptr, *json = nullptr;
+    gboolean isService = FALSE, isGrowth = FALSE;
+    const GOptionEntry entries[] = {
+        {"only", 0, 0, G_OPTION_ARG_STRING, &only, "Only the items whose text holds this", "TEXT"},
+        {"json", 0, 0, G_OPTION_ARG_FILENAME, &json, "Writes the table to a file, too", "FILE"},
+        {kServe + 2, 0, G_OPTION_FLAG_HIDDEN, G_OPTION_ARG_NONE, &isService, nullptr, nullptr},
+        {kGrowth + 2, 0, G_OPTION_FLAG_HIDDEN, G_OPTION_ARG_NONE, &isGrowth, nullptr, nullptr},
+        {},
+    };
+    g_autoptr(GOptionContext) options = g_option_context_new(nullptr);
+    g_option_context_set_summary(
+        options, "Measures what the library costs, as ratios to the same done without it, and against its goals.");
+    g_option_context_set_description(options, "Exit codes: 0 every goal met, 1 one missed, 2 trouble.");
+    g_option_context_add_main_entries(options, entries, nullptr);
+    g_autoptr(GError) error = nullptr;
+    if (!g_option_context_parse(options, &argc, &argv, &error))
+        throw std::runtime_error(error->message);
+    if (argc > 1)
+        throw std::runtime_error(std::string(argv[1]) + ": one word too many");
     if (isService)
         return Serve();
     if (isGrowth)
         return PrintGrowth();
-    return MeasureAll(only, json) ? 0 : 1;
+    return MeasureAll(only == nullptr ? "" : only, json == nullptr ? "" : json) ? 0 : 1;
 }
 
 } // namespace

@@ -25,7 +25,7 @@ void CompareFor(Table& table, const PrivateSystemBus& bus, int count)
     const auto bare = [count, paths = SubscriberPaths(count)] { NotifyBare(paths, count); };
 
     Compare(table, {"notification to " + number + ", a subscriber, against bare", {1.03}, work, static_cast<double>(count),
-                       {library, Drain}, {bare, Drain}, {{"series", "notification"}, {"subscribers", count}}, kRoundSeconds});
+                       {library, Drain}, {bare, Drain}, kRoundSeconds, "notification", count});
     CompareMessages(table, bus, "notification to " + number + ", messages on the bus", Order::Same, library, bare);
     if (count == 1)
     {
@@ -35,7 +35,7 @@ void CompareFor(Table& table, const PrivateSystemBus& bus, int count)
             bare();
         };
         Compare(table, {"notification to 1, against a store lookup and bare", {1.03}, work, 1, {library, Drain},
-                           {findAndBare, Drain}, {}, kRoundSeconds});
+                           {findAndBare, Drain}, kRoundSeconds});
     }
     Drain();
 }

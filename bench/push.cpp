@@ -44,9 +44,8 @@ void CompareFor(Table& table, const PrivateSystemBus& bus, int count)
     const auto library = [&] { PushByLibrary(number, count); };
     const auto bare = [&, paths = SubscriberPaths(count)] { PushBare(paths, number.c_str()); };
 
-    Compare(table,
-        {"push to " + number + ", a subscriber, against bare", {1.05}, [&] { return bus.WorkNs(); }, static_cast<double>(count),
-            {library, Drain}, {bare, Drain}, {{"series", "push"}, {"subscribers", count}}, kRoundSeconds});
+    Compare(table, {"push to " + number + ", a subscriber, against bare", {1.05}, [&] { return bus.WorkNs(); },
+                       static_cast<double>(count), {library, Drain}, {bare, Drain}, kRoundSeconds, "push", count});
     CompareMessages(table, bus, "push to " + number + ", messages on the bus", Order::Any, library, bare);
 }
 
