@@ -56,7 +56,8 @@ fi
 run_tests() # preset
 {
     say "$1: tests"
-    "${fixed_addresses[@]}" ctest --preset "$1" --parallel "$(nproc)"
+    # Twice the processors: half of the time a test waits for the programs that it started.
+    "${fixed_addresses[@]}" ctest --preset "$1" --parallel $((2 * $(nproc)))
 }
 
 sources()
