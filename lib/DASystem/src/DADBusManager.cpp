@@ -658,7 +658,7 @@ void proxy_new_cb(GObject*, GAsyncResult* result, gpointer user_data)
     {
         KIV_ERROR("Unable to create proxy: %s", Reason(error));
         delivery.reset();
-        DrainIfFree();
+        DrainIfFree(); // as below: the request may have failed too
         return;
     }
     Adopt(g_dbus_proxy_get_connection(proxy)); // which may have been made for this proxy
