@@ -4,8 +4,15 @@ target_compile_definitions(kiv_test_bus PRIVATE KIV_PRIVATE_BUS_CONF="${PROJECT_
 target_link_libraries(kiv_test_bus PRIVATE kiv_compile PUBLIC GTest::gmock PkgConfig::GIO)
 set_property(TARGET kiv_test_bus PROPERTY KIV_UNOPTIMIZED ON)
 
+# Stores in memory instead of the support library's, for the programs that ask for them.
+add_library(kiv_test_subscribers OBJECT bus/Subscribers.cpp)
+target_link_libraries(kiv_test_subscribers PRIVATE kiv_compile kiv_util GTest::gmock PkgConfig::GIO Threads::Threads)
+target_precompile_headers(kiv_test_subscribers REUSE_FROM kiv_test_headers)
+set_target_properties(kiv_test_subscribers PROPERTIES KIV_UNOPTIMIZED ON POSITION_INDEPENDENT_CODE OFF UNITY_BUILD OFF)
+target_include_directories(kiv_test_subscribers PRIVATE ${CMAKE_CURRENT_SOURCE_DIR})
+
 foreach(subject IN ITEMS notification outage connection kill traffic)
-  kiv_test(bus_${subject}_test bus/${subject}_test.cpp bus/Subscribers.cpp)
+  kiv_test(bus_${subject}_test bus/${subject}_test.cpp $<TARGET_OBJECTS:kiv_test_subscribers>)
   target_link_libraries(bus_${subject}_test PRIVATE kiv_test_bus)
 endforeach()
 target_link_libraries(bus_connection_test PRIVATE ${CMAKE_DL_LIBS})

@@ -11,7 +11,7 @@ kiv_check(native_build ${CMAKE_CURRENT_SOURCE_DIR}/install/native.sh ${PROJECT_B
 kiv_check(same_bytes ${CMAKE_CURRENT_SOURCE_DIR}/install/same_bytes.sh ${PROJECT_BINARY_DIR} ${PROJECT_SOURCE_DIR})
 
 # Uses nothing of the library's by name, so that the linker leaves it out.
-kiv_test(loading_test install/loading_test.cpp bus/Subscribers.cpp)
+kiv_test(loading_test install/loading_test.cpp $<TARGET_OBJECTS:kiv_test_subscribers>)
 target_link_libraries(loading_test PRIVATE kiv_test_bus ${CMAKE_DL_LIBS})
 target_compile_definitions(loading_test PRIVATE KIV_LIBRARY="$<TARGET_FILE:kiv_system>")
 set_property(TARGET loading_test PROPERTY ENABLE_EXPORTS ON)
