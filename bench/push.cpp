@@ -1,7 +1,6 @@
 #include "BareBus.h"
-#include "BusMonitor.h"
 #include "Items.h"
-#include "Ratios.h"
+#include "Walk.h"
 
 #include <DADBusManager.h>
 #include <dlog.h>
@@ -32,25 +31,6 @@ int __dlog_print(log_id_t, int, const char*, const char* fmt, ...)
 namespace kiv::bench
 {
 
-namespace
-{
-
-constexpr double kRoundSeconds = 1;
-
-void CompareFor(Table& table, const PrivateSystemBus& bus, int count)
-{
-    Subscribe("push", count);
-    const std::string number = std::to_string(count);
-    const auto library = [&] { PushByLibrary(number, count); };
-    const auto bare = [&, paths = SubscriberPaths(count)] { PushBare(paths, number.c_str()); };
-
-    Compare(table, {"push to " + number + ", a subscriber, against bare", {1.05}, [&] { return bus.WorkNs(); },
-                       static_cast<double>(count), {library, Drain}, {bare, Drain}, kRoundSeconds, "push", count});
-    CompareMessages(table, bus, "push to " + number + ", messages on the bus", Order::Any, library, bare);
-}
-
-} // namespace
-
 void PushByLibrary(const std::string& service, int count)
 {
     endedDeliveries = 0;
@@ -62,7 +42,11 @@ void PushByLibrary(const std::string& service, int count)
 void MeasurePushes(Table& table, const PrivateSystemBus& bus)
 {
     for (const int count : {1, 10, 100})
-        CompareFor(table, bus, count);
+    {
+        const auto library = [count] { PushByLibrary(std::to_string(count), count); };
+        const auto bare = [count, paths = SubscriberPaths(count)] { PushBare(paths, std::to_string(count).c_str()); };
+        CompareWalk(table, bus, {"push", "push", count, {1.05}, Order::Any, library, bare});
+    }
 }
 
 } // namespace kiv::bench
