@@ -1,48 +1,37 @@
 #ifndef KIV_BENCH_BUSMONITOR_H
 #define KIV_BENCH_BUSMONITOR_H
 
-#include "PrivateSystemBus.h"
-#include "Table.h"
+#include <gio/gio.h>
 
 #include <functional>
+#include <memory>
 #include <string>
 #include <vector>
 
 namespace kiv::bench
 {
 
-/// Sees every message that goes over the bus, as long as it lives.
+/// Sees every message that goes over a bus, as long as it lives. One at a time.
 class BusMonitor
 {
 public:
-    explicit BusMonitor(const PrivateSystemBus& bus);
+    /// @param marking   the connection whose messages are in question: a mark that is sent over it tells where they end
+    /// @param watching  one that nobody else uses, kept and closed at the end
+    BusMonitor(GDBusConnection* marking, GDBusConnection* watching);
     BusMonitor(const BusMonitor&) = delete;
     BusMonitor& operator=(const BusMonitor&) = delete;
     ~BusMonitor();
 
-    /// The messages that an operation causes: a line each with all of it but serials and unique names, in the order of the bus.
+    /// The messages that an operation causes: a line each with all of it but serials, in the order of the bus.
     std::vector<std::string> During(const std::function<void()>& operation);
 
 private:
-    struct Seen;
-
-    static GDBusMessage* Filter(GDBusConnection* connection, GDBusMessage* message, gboolean incoming, gpointer seen);
+    static GDBusMessage* Filter(GDBusConnection* connection, GDBusMessage* message, gboolean incoming, gpointer);
     void AwaitMarker();
 
-    GDBusConnection* shared_;
-    std::shared_ptr<Seen> seen_;
-    Connection connection_;
+    GDBusConnection* marking_;
+    GDBusConnection* watching_;
 };
-
-enum class Order
-{
-    Same,
-    Any ///< where it depends on when the replies arrive
-};
-
-/// Adds to the table whether the library causes the same messages as the bare loop.
-void CompareMessages(Table& table, const PrivateSystemBus& bus, const std::string& item, Order order,
-    const std::function<void()>& library, const std::function<void()>& bare);
 
 } // namespace kiv::bench
 

@@ -1,11 +1,17 @@
 #ifndef KIV_BENCH_WALK_H
 #define KIV_BENCH_WALK_H
 
-#include "BusMonitor.h"
+#include "PrivateSystemBus.h"
 #include "Ratios.h"
 
 namespace kiv::bench
 {
+
+enum class Order
+{
+    Same,
+    Any ///< where it depends on when the replies arrive
+};
 
 /// What is told to a number of subscribers, by the library and by the bare loop.
 struct Walk

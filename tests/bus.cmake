@@ -16,6 +16,8 @@ foreach(subject IN ITEMS notification outage connection kill traffic)
   target_link_libraries(bus_${subject}_test PRIVATE kiv_test_bus)
 endforeach()
 target_link_libraries(bus_connection_test PRIVATE ${CMAKE_DL_LIBS})
+target_sources(bus_traffic_test PRIVATE ${PROJECT_SOURCE_DIR}/bench/BusMonitor.cpp)
+target_include_directories(bus_traffic_test PRIVATE ${PROJECT_SOURCE_DIR}/bench)
 # A bus that dies at the wrong moment makes GDBus print a critical; the test itself fails on any other.
 get_test_property(bus_kill_test ENVIRONMENT environment)
 list(REMOVE_ITEM environment G_DEBUG=fatal-criticals)
