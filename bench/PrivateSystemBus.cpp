@@ -5,12 +5,9 @@
 
 #include <DASubscriberStore.h>
 
-#include <csignal>
 #include <cstdio>
 #include <cstdlib>
 #include <ctime>
-#include <sys/prctl.h>
-#include <vector>
 
 namespace kiv::bench
 {
@@ -26,22 +23,6 @@ GDBusMessage* AnswerCall(GDBusConnection* connection, GDBusMessage* message, gbo
     g_dbus_connection_send_message(connection, reply, G_DBUS_SEND_MESSAGE_FLAGS_NONE, nullptr, nullptr);
     g_object_unref(message);
     return nullptr;
-}
-
-/// Starts a process that says in a line when it is ready, and dies with this one.
-std::unique_ptr<GSubprocess, Unref> Start(std::vector<const char*> command)
-{
-    constexpr auto kFlags = static_cast<GSubprocessFlags>(G_SUBPROCESS_FLAGS_STDOUT_PIPE | G_SUBPROCESS_FLAGS_STDERR_SILENCE);
-    const std::unique_ptr<GSubprocessLauncher, Unref> launcher(g_subprocess_launcher_new(kFlags));
-    g_subprocess_launcher_set_child_setup(
-        launcher.get(), [](gpointer) { prctl(PR_SET_PDEATHSIG, SIGKILL); }, nullptr, nullptr);
-    g_autoptr(GError) error = nullptr;
-    command.push_back(nullptr);
-    std::unique_ptr<GSubprocess, Unref> process(g_subprocess_launcher_spawnv(launcher.get(), command.data(), &error));
-    char ready = 0;
-    if (!process || g_input_stream_read(g_subprocess_get_stdout_pipe(process.get()), &ready, 1, nullptr, &error) != 1)
-        throw std::runtime_error(std::string(command[0]) + ": " + (error == nullptr ? "ended" : error->message));
-    return process;
 }
 
 double ProcessNs(GSubprocess* process)
@@ -90,14 +71,10 @@ int Serve()
     return 0;
 }
 
-PrivateSystemBus::PrivateSystemBus() : address_("unix:path=" + folder_.File("bus"))
+PrivateSystemBus::PrivateSystemBus()
 {
-    const std::string address = "--address=" + address_;
-    bus_ = Start({"dbus-daemon", "--config-file=" KIV_PRIVATE_BUS_CONF, "--nofork", "--print-address", address.c_str()});
-    g_setenv("DBUS_SYSTEM_BUS_ADDRESS", address_.c_str(), TRUE);
     g_setenv("KIV_SUBSCRIBERS", folder_.File("subscribers.db").c_str(), TRUE);
-
-    service_ = Start({"/proc/self/exe", kServe});
+    service_ = StartProgram({"/proc/self/exe", kServe});
     g_autoptr(GError) error = nullptr;
     shared_.reset(g_bus_get_sync(G_BUS_TYPE_SYSTEM, nullptr, &error));
     if (!shared_)
@@ -107,27 +84,12 @@ PrivateSystemBus::PrivateSystemBus() : address_("unix:path=" + folder_.File("bus
 
 PrivateSystemBus::~PrivateSystemBus()
 {
-    for (GSubprocess* const process : {service_.get(), bus_.get()})
-    {
-        g_subprocess_force_exit(process);
-        g_subprocess_wait(process, nullptr, nullptr);
-    }
+    Kill(service_.get());
 }
 
 double PrivateSystemBus::WorkNs() const
 {
-    return CpuNs() + ProcessNs(bus_.get()) + ProcessNs(service_.get());
-}
-
-Connection PrivateSystemBus::Connect() const
-{
-    constexpr auto kFlags = static_cast<GDBusConnectionFlags>(
-        G_DBUS_CONNECTION_FLAGS_AUTHENTICATION_CLIENT | G_DBUS_CONNECTION_FLAGS_MESSAGE_BUS_CONNECTION);
-    g_autoptr(GError) error = nullptr;
-    Connection connection(g_dbus_connection_new_for_address_sync(address_.c_str(), kFlags, nullptr, nullptr, &error));
-    if (!connection)
-        throw std::runtime_error(error->message);
-    return connection;
+    return CpuNs() + ProcessNs(bus_.Daemon()) + ProcessNs(service_.get());
 }
 
 void Find(const char* kind, const char* key)

@@ -1,12 +1,10 @@
 #ifndef KIV_BENCH_PRIVATESYSTEMBUS_H
 #define KIV_BENCH_PRIVATESYSTEMBUS_H
 
+#include "BusDaemon.h"
 #include "TemporaryFolder.h"
 
-#include <gio/gio.h>
 #include <sched.h>
-
-#include <memory>
 
 namespace kiv::bench
 {
@@ -24,12 +22,6 @@ public:
 private:
     cpu_set_t before_;
 };
-
-struct Unref
-{
-    void operator()(gpointer object) const { g_object_unref(object); }
-};
-using Connection = std::unique_ptr<GDBusConnection, Unref>;
 
 /// A bus of the benchmark's own as the system bus, a client service in a process of its own that answers every call, and a place
 /// for the subscriber store. All of it is gone at the end. Program, bus and service share one processor, so that no processor is
@@ -50,13 +42,13 @@ public:
     double WorkNs() const;
 
     /// Another connection.
-    Connection Connect() const;
+    Connection Connect() const { return bus_.Connect(); }
 
 private:
     OneProcessor processor_;
     TemporaryFolder folder_;
-    std::string address_;
-    std::unique_ptr<GSubprocess, Unref> bus_, service_;
+    BusDaemon bus_;
+    Process service_;
     Connection shared_;
 };
 

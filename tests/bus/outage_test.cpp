@@ -23,7 +23,7 @@ struct Outage : BusTest
 
 TEST_F(Outage, InTheMiddleOfAWalkIsReportedForTheRestAndOverWithTheNextCall)
 {
-    Peer first(bus), killing(bus, "", Peer::After([this] { bus.Stop(); }, Peer::Silence())), third(bus);
+    Peer first(bus), killing(bus, "", Peer::InsteadDo([this] { bus.Stop(); })), third(bus);
     for (const Peer* peer : {&first, &killing, &third})
         Subscribe(*peer);
     EXPECT_EQ(0, NotifyAuth());
@@ -51,7 +51,7 @@ TEST_F(Outage, ThatIsOverWhileASubscriberIsCalledIsOverForTheRestOfTheWalk)
             bus.Stop();
             bus.Start();
         };
-        Peer killing(bus, "", Peer::After(restart, Peer::Silence()));
+        Peer killing(bus, "", Peer::InsteadDo(restart));
         store.records = {Record(killing), Record(killing), Record(killing)};
         EXPECT_EQ(0, NotifyAuth());
         // The new bus was asked for the other two, whom it does not know.
@@ -63,7 +63,7 @@ TEST_F(Outage, ThatIsOverWhileASubscriberIsCalledIsOverForTheRestOfTheWalk)
 
 TEST_F(Outage, WhileTheSerialNumberIsAskedForIsAFailedReply)
 {
-    Peer daemon(bus, kBoardDaemon, Peer::After([this] { bus.Stop(); }, Peer::Silence()));
+    Peer daemon(bus, kBoardDaemon, Peer::InsteadDo([this] { bus.Stop(); }));
     const char* id = "stale";
     EXPECT_EQ(2, manager.GetDeviceUniqueID(id));
     EXPECT_EQ(nullptr, id);

@@ -6,8 +6,6 @@
 #include <SimulatedLog.h>
 #include <dlog.h>
 
-#include <cstdio>
-
 namespace kiv::test
 {
 
@@ -34,7 +32,7 @@ private:
         for (const auto& line : sim::TakeLog())
         {
             std::string text = Text(line);
-            if (text.compare(0, prefix.size(), prefix) == 0 || text.compare(0, 3, "bad") == 0)
+            if (text.rfind(prefix, 0) == 0 || text.rfind("bad", 0) == 0)
                 texts.push_back(std::move(text));
         }
         return texts;
@@ -42,18 +40,13 @@ private:
 
     static std::string Text(const sim::LogLine& line)
     {
-        char file[64] = "", function[64] = "", number[12] = "", level[8] = "";
-        int size = 0;
-        std::sscanf(
-            line.text.c_str(), "%63[^:]: %63[A-Za-z0-9_](%11[0-9]) > [*%7[A-Za-z]*]%n", file, function, number, level, &size);
-        const std::string message = line.text.substr(static_cast<std::size_t>(size));
-        const bool error = line.priority == DLOG_ERROR;
-        // What was read, written again, is the line when it had the form to the letter.
-        if (line.id != LOG_ID_SYSTEM || line.tag != "KIV_AGENT" || (!error && line.priority != DLOG_INFO) || number[0] < '1' ||
-            line.text != std::string(file) + ": " + function + '(' + number + ") > [*" + (error ? "Error" : "Info") + "*] " +
-                             message.substr(1, message.size() - 2) + '\n')
-            return "bad line: " + std::to_string(line.id) + ' ' + std::to_string(line.priority) + ' ' + line.tag + ' ' + line.text;
-        return (error ? "E " : "I ") + std::string(file) + ' ' + function + " >" + message.substr(0, message.size() - 1);
+        constexpr auto kForm = R"(\A([EI])2 KIV_AGENT ([^:]+): (\w+)\([1-9]\d*\) > \[\*\1(?:rror|nfo)\*\] (.*)\n\z)";
+        static GRegex* const form =
+            g_regex_new(kForm, GRegexCompileFlags(G_REGEX_RAW | G_REGEX_DOTALL | G_REGEX_OPTIMIZE), GRegexMatchFlags(0), nullptr);
+        const char letter = line.priority == DLOG_ERROR ? 'E' : line.priority == DLOG_INFO ? 'I' : '?';
+        const std::string whole = letter + std::to_string(line.id) + ' ' + line.tag + ' ' + line.text;
+        g_autofree char* text = g_regex_replace(form, whole.c_str(), -1, 0, R"(\1 \2 \3 > \4)", GRegexMatchFlags(0), nullptr);
+        return whole == text ? "bad line: " + whole : text;
     }
 };
 

@@ -1,8 +1,5 @@
 #include "support/Peer.h"
 
-#include <chrono>
-#include <condition_variable>
-
 namespace kiv::test
 {
 
@@ -13,7 +10,6 @@ namespace
 /// locks ThreadSanitizer does not see.
 std::mutex mutex;
 
-/// A call in one line: "/object/path an.interface.Method (signature) (body)".
 std::string Describe(GDBusMessage* message)
 {
     GVariant* const body = g_dbus_message_get_body(message);
@@ -26,12 +22,25 @@ std::string Describe(GDBusMessage* message)
 
 struct Peer::State
 {
-    std::condition_variable changed;
     Answer answer;
     std::vector<std::string> calls;
-    std::size_t count = 0;
     int busy = 0; ///< answers being worked at
     bool forgetful = false;
+
+    /// Waits until a condition on it holds. @return whether it does, at the latest after ten seconds
+    template <class Condition>
+    bool Await(Condition isMet)
+    {
+        const gint64 deadline = g_get_monotonic_time() + 10 * G_TIME_SPAN_SECOND;
+        for (std::unique_lock lock(mutex); !isMet(); lock.lock())
+        {
+            lock.unlock();
+            if (g_get_monotonic_time() > deadline)
+                return false;
+            g_usleep(500);
+        }
+        return true;
+    }
 };
 
 Peer::Peer(const PrivateBus& bus, const std::string& name, Answer answer) : connection_(bus.Connect())
@@ -74,13 +83,8 @@ GDBusMessage* Peer::Filter(GDBusConnection* connection, GDBusMessage* message, g
     Answer answer = state.answer;
     if (g_strcmp0(g_dbus_message_get_interface(message), "org.freedesktop.DBus.Properties") == 0)
         answer = Reply("(@a{sv} {},)"); // which every proxy asks for when it is made
-    else
-    {
-        ++state.count;
-        if (!state.forgetful)
-            state.calls.push_back(Describe(message));
-        state.changed.notify_all();
-    }
+    else if (!state.forgetful)
+        state.calls.push_back(Describe(message));
     ++state.busy;
     lock.unlock();
 
@@ -89,7 +93,6 @@ GDBusMessage* Peer::Filter(GDBusConnection* connection, GDBusMessage* message, g
 
     lock.lock();
     --state.busy;
-    state.changed.notify_all();
     return nullptr;
 }
 
@@ -109,23 +112,18 @@ Peer::Answer Peer::Refuse()
     return [](GDBusMessage* call) { return g_dbus_message_new_method_error_literal(call, "org.example.Refused", "not today"); };
 }
 
-Peer::Answer Peer::Silence()
+Peer::Answer Peer::InsteadDo(std::function<void()> action)
 {
-    return [](GDBusMessage*) { return nullptr; };
-}
-
-Peer::Answer Peer::After(std::function<void()> action, Answer answer)
-{
-    return [action = std::move(action), answer = std::move(answer)](GDBusMessage* call)
+    return [action = std::move(action)](GDBusMessage*)
     {
         action();
-        return answer(call);
+        return nullptr;
     };
 }
 
 Peer::Answer Peer::Leave()
 {
-    return After([this] { g_dbus_connection_close(connection_.get(), nullptr, nullptr, nullptr); }, Silence());
+    return InsteadDo([this] { g_dbus_connection_close(connection_.get(), nullptr, nullptr, nullptr); });
 }
 
 void Peer::Set(Answer answer)
@@ -142,9 +140,7 @@ std::vector<std::string> Peer::Calls() const
 
 void Peer::AwaitCalls(std::size_t count)
 {
-    std::unique_lock lock(mutex);
-    EXPECT_TRUE(state_->changed.wait_for(lock, std::chrono::seconds(10), [&] { return state_->count >= count; }))
-        << state_->count << " calls of " << count;
+    EXPECT_TRUE(state_->Await([&] { return state_->calls.size() >= count; })) << Calls().size() << " calls of " << count;
 }
 
 void Peer::Forget()
@@ -156,8 +152,7 @@ void Peer::Forget()
 void Peer::Close()
 {
     g_dbus_connection_close_sync(connection_.get(), nullptr, nullptr);
-    std::unique_lock lock(mutex);
-    state_->changed.wait(lock, [this] { return state_->busy == 0; });
+    EXPECT_TRUE(state_->Await([this] { return state_->busy == 0; }));
 }
 
 } // namespace kiv::test

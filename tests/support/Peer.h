@@ -24,9 +24,12 @@ public:
     /// Answers with a body in GVariant's text form, a tuple.
     static Answer Reply(const char* body);
     static Answer Refuse();
-    static Answer Silence();
-    /// Does something first, then answers.
-    static Answer After(std::function<void()> action, Answer answer);
+    /// Does something and gives no answer.
+    static Answer InsteadDo(std::function<void()> action);
+    static Answer Silence()
+    {
+        return InsteadDo([] {});
+    }
     /// Leaves the bus without an answer.
     Answer Leave();
     void Set(Answer answer);
