@@ -15,7 +15,7 @@ inline std::set<std::string> lockNames;     ///< of the locks made
 inline std::function<bool()> isLockRefused; ///< whether a lock of a new name can not be made
 inline int pauses = 0;                      ///< the seconds that were to be slept
 
-/// How many calls or allocations are to fail in a row: one to four, all; more in the long form.
+/// How many calls or allocations are to fail in a row: one, two, … all; more in the long form.
 std::vector<unsigned> Lengths();
 
 /// Tries operations one by one in one world, each on a device that nobody used before.
@@ -24,9 +24,7 @@ struct Sweep : testing::Test
     Sweep();
     ~Sweep() override;
 
-    /// The profiles, and one device with many slots.
-    static std::vector<std::string> Devices();
-    void Use(const std::string& name);
+    void Use(const std::string& profile);
 
     /// The operation of that name.
     static const Operation& Find(const std::string& name);

@@ -172,14 +172,14 @@ struct MemorySweep : Sweep
 TEST_F(MemorySweep, GivesFailureResultsWhicheverAllocationFails)
 {
     unsigned injections = 0;
-    for (const std::string& name : Devices())
+    for (const auto& [profile, description] : kiv::sim::ListProfiles())
     {
-        SCOPED_TRACE(name);
-        Use(name);
+        SCOPED_TRACE(profile);
+        Use(profile);
         for (const Operation& operation : Operations())
         {
             const bool isOnBus = operation.kind == Kind::kBus || operation.kind == Kind::kPush;
-            if ((!operation.needsHandle || !device.slots.empty()) && (!isOnBus || name == "dual"))
+            if ((!operation.needsHandle || !device.slots.empty()) && (!isOnBus || profile == "dual"))
                 injections += TryAll(operation);
         }
     }

@@ -114,10 +114,10 @@ TEST_F(PlatformSweep, GivesFailureResultsAndReleasesAllWhicheverCallFails)
 {
     const std::size_t kMostCalls = IsLong() ? 200 : 20; // of one operation: polling makes more, all alike
     int pairs = 0;
-    for (const std::string& name : Devices())
+    for (const auto& [profile, description] : sim::ListProfiles())
     {
-        SCOPED_TRACE(name);
-        Use(name);
+        SCOPED_TRACE(profile);
+        Use(profile);
         for (const Operation& operation : Operations())
         {
             if (operation.needsHandle && device.slots.empty())
