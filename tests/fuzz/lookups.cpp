@@ -13,6 +13,6 @@ void Try(std::string_view input)
     Require(isSilent, "nobody reads the log");
     const Lookup& lookup = kLookups[input.empty() ? 0 : static_cast<unsigned char>(input[0] - 'a') % std::size(kLookups)];
     const std::string key = input.empty() ? "" : std::string(input.substr(1)).c_str(); // up to the first null
-    Require(lookup.facade(key.c_str()) == Expected(lookup, key), "a row answers its key, and no other key has an answer");
+    Require(lookup.ask(key.c_str()) == lookup.Answer(key), "a row answers its key, and no other key has an answer");
     Feed(1);
 }
