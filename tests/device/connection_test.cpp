@@ -10,65 +10,23 @@ namespace
 {
 
 using namespace kiv::test;
-using testing::ElementsAre;
-using testing::IsEmpty;
+using C = DAConnectionManager;
 
-const struct StateQuery
-{
-    int (DASystem::*ask)();
-    Call call;
-    int Device::*fact;
-} kCellular = {&DASystem::GetCellularNetworkState, Call::connection_get_cellular_state, &Device::cellularState},
-  kWifi = {&DASystem::GetWifiNetworkState, Call::connection_get_wifi_state, &Device::wifiState},
-  kBluetooth = {&DASystem::GetBTNetworkState, Call::connection_get_bt_state, &Device::bluetoothState};
-
-/// What the listener heard: what changed, the new value, and the text that the user data stands for.
 struct Listener : IDAConnectionStateListener
 {
-    void OnWifiDeviceStateChanged(wifi_device_state_e state, void* userData) override { Hear("device", state, userData); }
-    void OnWifiConnectionStateChanged(wifi_connection_state_e state, void* ap, void* userData) override
-    {
-        accessPoint = ap;
-        Hear("connection", state, userData);
-    }
-    void OnFlightModeChanged(bool enabled, void* userData) override { Hear("flight", enabled, userData); }
-    void OnPacketDataChanged(bool enabled, void* userData) override { Hear("packet", enabled, userData); }
-    void OnWifiConnectedChanged(bool connected, void* userData) override { Hear("wifi", connected, userData); }
-
-    void Hear(const char* what, int value, void* userData)
-    {
-        heard.push_back(what + (' ' + std::to_string(value)) + ' ' + static_cast<const char*>(userData));
-    }
-    Lines Take() { return std::exchange(heard, {}); }
-
-    Lines heard;
-    void* accessPoint = nullptr;
+    MOCK_METHOD(void, OnWifiDeviceStateChanged, (wifi_device_state_e state, void* userData), (override));
+    MOCK_METHOD(void, OnWifiConnectionStateChanged, (wifi_connection_state_e state, void* ap, void* userData), (override));
+    MOCK_METHOD(void, OnFlightModeChanged, (bool enabled, void* userData), (override));
+    MOCK_METHOD(void, OnPacketDataChanged, (bool enabled, void* userData), (override));
+    MOCK_METHOD(void, OnWifiConnectedChanged, (bool connected, void* userData), (override));
 };
 
-/// Nothing of it is ever logged.
 struct ConnectionTest : DeviceTest
 {
-    ConnectionTest()
-    {
-        after.wifiDeviceState = 0;
-        after.wifiConnectionState = 3;
-        after.wifiStatus = 2;
-        after.flightMode = after.dataRoaming = true;
-        after.packetData = false;
-    }
-    ~ConnectionTest() override
-    {
-        DAConnectionManager::__pListener = nullptr;
-        EXPECT_THAT(log.Take(), IsEmpty());
-    }
-    void Register(IDAConnectionStateListener* to, const char* userData)
-    {
-        facade.SetConnectionEventListener(to, const_cast<char*>(userData));
-    }
+    ~ConnectionTest() override { C::__pListener = nullptr; }
 
-    const Device before = kiv::sim::GetDevice();
-    Device after = before;
-    Listener listener;
+    testing::StrictMock<Listener> listener;
+    char first = 0, second = 0; ///< user data
 };
 
 TEST_F(ConnectionTest, IsUpWhenOneOfTheSelectedIsAndAllOfThemAreAsked)
@@ -77,99 +35,78 @@ TEST_F(ConnectionTest, IsUpWhenOneOfTheSelectedIsAndAllOfThemAreAsked)
     {
         const std::bitset<5> bit(bits);
         const bool checkWifi = bit[0], checkBluetooth = bit[1], cellular = bit[2], wifi = bit[3], bluetooth = bit[4];
-        Set(kCellular.fact, cellular ? 5 : 2); // what means connected to one means something else to the others
-        Set(kWifi.fact, wifi ? 2 : 5);
-        Set(kBluetooth.fact, bluetooth ? 2 : 5);
-        std::vector<Call> calls;
-        for (const auto& [query, isSelected] : {std::pair(kCellular, true), {kWifi, checkWifi}, {kBluetooth, checkBluetooth}})
-        {
-            if (isSelected)
-                calls.insert(calls.end(), {Call::connection_create, query.call, Call::connection_destroy});
-        }
+        Set(&Device::cellularState, cellular ? 5 : 2); // what means connected to one means something else to the others
+        Set(&Device::wifiState, wifi ? 2 : 5);
+        Set(&Device::bluetoothState, bluetooth ? 2 : 5);
         const bool isUp = cellular || (checkWifi && wifi) || (checkBluetooth && bluetooth);
         EXPECT_EQ(isUp, facade.IsNetworkConnected(checkWifi, checkBluetooth)) << bits;
-        EXPECT_EQ(calls, TakeCalls()) << bits;
-    }
-    for (const StateQuery& query : {kCellular, kWifi, kBluetooth})
-    {
-        for (const int state : {0, 99, -1}) // goes through as the platform has it
-        {
-            Set(query.fact, state);
-            EXPECT_EQ(state, std::invoke(query.ask, facade));
-        }
+        EXPECT_EQ(3U * (1 + bit[0] + bit[1]), TakeCalls()) << bits;
     }
 }
 
-TEST_F(ConnectionTest, ListenerIsRegisteredForFiveChangesAndUnregisteredFromThemWhateverFails)
+TEST_F(ConnectionTest, ListenerHearsOfFiveChangesWhileItIsRegisteredWhateverFails)
 {
-    constexpr Call kStart = Call::wifi_initialize, kSetDevice = Call::wifi_set_device_state_changed_cb,
-                   kUnsetDevice = Call::wifi_unset_device_state_changed_cb, kSetWifi = Call::wifi_set_connection_state_changed_cb,
-                   kUnsetWifi = Call::wifi_unset_connection_state_changed_cb, kSet = Call::runtime_info_set_changed_cb,
-                   kUnset = Call::runtime_info_unset_changed_cb;
-    Register(nullptr, "a"); // there is nothing to unregister
-    EXPECT_THAT(TakeCalls(), ElementsAre(kStart, kUnsetDevice, kUnsetWifi, kUnset, kUnset, kUnset));
-    Register(&listener, "a");
-    EXPECT_THAT(TakeCalls(), ElementsAre(kStart, kSetDevice, kSetWifi, kSet, kSet, kSet));
-    const std::string values[] = {"wifi 1 a", "packet 0 a", "flight 1 a"};
-    for (unsigned number = 1; number <= 3; ++number)
-    {
-        kiv::sim::ClearFaults();
-        Register(nullptr, "a");
-        kiv::sim::SetDevice(before);
-        kiv::sim::FailCall(kSet, -1, kiv::sim::Only(number));
-        Register(&listener, "a");
-        kiv::sim::SetDevice(after);
-        EXPECT_THAT(listener.Take(), testing::AllOf(testing::SizeIs(4), testing::Not(testing::Contains(values[number - 1]))));
+    const Device before = kiv::sim::GetDevice();
+    Device after = before;
+    after.wifiDeviceState = WIFI_DEVICE_STATE_DEACTIVATED;
+    after.wifiConnectionState = WIFI_CONNECTION_STATE_CONNECTED;
+    after.wifiStatus = 2;
+    after.flightMode = after.dataRoaming = true;
+    after.packetData = false;
+    for (const Call call : {Call::wifi_initialize, Call::wifi_set_device_state_changed_cb, Call::runtime_info_set_changed_cb,
+             Call::wifi_set_connection_state_changed_cb, Call::wifi_unset_device_state_changed_cb,
+             Call::wifi_unset_connection_state_changed_cb, Call::runtime_info_unset_changed_cb})
+        kiv::sim::FailCall(call, -1, kEveryCall, kNoSlot, Leavings::kItsResults);
 
-        kiv::sim::SetDevice(before);
-        Register(&listener, "a");
-        kiv::sim::FailCall(kUnset, -1, kiv::sim::Only(number));
-        Register(nullptr, "a");
-        DAConnectionManager::__pListener = &listener;
-        listener.Take();
-        kiv::sim::SetDevice(after);
-        EXPECT_THAT(listener.Take(), ElementsAre(values[number - 1])) << "the one registration that stayed";
-    }
-}
-
-TEST_F(ConnectionTest, ListenerHearsOfEachChangedValueOnceWithTheUserDataOfTheLastRegistration)
-{
-    Register(&listener, "a");
-    for (int i = 0; i < 2; ++i)
-        kiv::sim::SetDevice(after);
-    EXPECT_THAT(
-        listener.Take(), testing::UnorderedElementsAre("device 0 a", "connection 3 a", "wifi 1 a", "packet 0 a", "flight 1 a"));
-
-    Register(&listener, "b");
-    for (const int status : {1, 2, 0, 3})
-        Set(&Device::wifiStatus, status);
-    EXPECT_THAT(listener.Take(), ElementsAre("wifi 0 b", "wifi 1 b", "wifi 0 b", "wifi 0 b"));
-
-    Listener next;
-    Register(&next, "c");
-    Set(&Device::flightMode, false);
-    EXPECT_THAT(next.Take(), ElementsAre("flight 0 c"));
-    Register(nullptr, "d");
-    kiv::sim::SetDevice(before);
-    EXPECT_THAT(next.Take(), IsEmpty());
-    EXPECT_THAT(listener.Take(), IsEmpty());
-}
-
-TEST_F(ConnectionTest, ListenerIsCalledByTheEntriesThemselvesWhenThereIsOneAndTheValueCanBeRead)
-{
-    char text[] = "a";
+    facade.SetConnectionEventListener(&listener, &first);
+    EXPECT_CALL(listener, OnWifiDeviceStateChanged(WIFI_DEVICE_STATE_DEACTIVATED, &first));
+    EXPECT_CALL(listener, OnWifiConnectionStateChanged(WIFI_CONNECTION_STATE_CONNECTED, nullptr, &first));
+    EXPECT_CALL(listener, OnFlightModeChanged(true, &first));
+    EXPECT_CALL(listener, OnPacketDataChanged(false, &first));
+    EXPECT_CALL(listener, OnWifiConnectedChanged(true, &first));
     kiv::sim::SetDevice(after);
-    for (Listener* const to : {static_cast<Listener*>(nullptr), &listener})
+    EXPECT_EQ(6U + 3U, TakeCalls()) << "the registrations, and one read for each value to tell";
+
+    for (int i = 0; i < 2; ++i) // also when there is nothing to unregister
     {
-        DAConnectionManager::__pListener = to;
-        DAConnectionManager::wifi_device_state_changed(WIFI_DEVICE_STATE_ACTIVATED, text);
-        DAConnectionManager::wifi_connection_state_changed(WIFI_CONNECTION_STATE_FAILURE, &text, text);
-        for (const int key : {1, 9, 0, 10, 2, -1})
-            DAConnectionManager::OnConnectionStateChanged(static_cast<runtime_info_key_e>(key), text);
-        EXPECT_THAT(TakeCalls(), testing::SizeIs(to == nullptr ? 0 : 3)) << "one read for each value to tell";
+        facade.SetConnectionEventListener(nullptr, nullptr);
+        EXPECT_EQ(6U, TakeCalls());
     }
-    EXPECT_THAT(listener.Take(), ElementsAre("device 1 a", "connection -1 a", "wifi 1 a", "packet 0 a", "flight 1 a"));
-    EXPECT_EQ(&text, listener.accessPoint);
+    C::__pListener = &listener;
+    kiv::sim::SetDevice(before); // would be told, if anything were still registered
+}
+
+TEST_F(ConnectionTest, ListenerAndUserDataAreThoseOfTheLastRegistration)
+{
+    facade.SetConnectionEventListener(&listener, &first);
+    facade.SetConnectionEventListener(&listener, &second);
+    for (const int status : {2, 1, 3, 0})
+    {
+        EXPECT_CALL(listener, OnWifiConnectedChanged(status == 2, &second)).RetiresOnSaturation();
+        Set(&Device::wifiStatus, status);
+    }
+    testing::StrictMock<Listener> next;
+    facade.SetConnectionEventListener(&next, &first);
+    EXPECT_CALL(next, OnFlightModeChanged(true, &first));
+    Set(&Device::flightMode, true);
+}
+
+TEST_F(ConnectionTest, EntriesTellNothingWithoutAListenerForAnotherKeyOrWhenTheValueCanNotBeRead)
+{
+    const auto change = [this](int key) { C::OnConnectionStateChanged(static_cast<runtime_info_key_e>(key), &first); };
+    C::wifi_device_state_changed(WIFI_DEVICE_STATE_ACTIVATED, &first);
+    C::wifi_connection_state_changed(WIFI_CONNECTION_STATE_FAILURE, &second, &first);
+    change(RUNTIME_INFO_KEY_FLIGHT_MODE_ENABLED);
+
+    C::__pListener = &listener;
+    for (const int key : {10, 2, -1})
+        change(key);
+    for (const Call read : {Call::runtime_info_get_value_bool, Call::runtime_info_get_value_int})
+        kiv::sim::FailCall(read, -1);
+    for (const int key : {1, 9, 0})
+        change(key);
+    EXPECT_CALL(listener, OnWifiConnectionStateChanged(WIFI_CONNECTION_STATE_FAILURE, &second, &first));
+    C::wifi_connection_state_changed(WIFI_CONNECTION_STATE_FAILURE, &second, &first);
 }
 
 } // namespace

@@ -10,10 +10,7 @@ using namespace kiv::test;
 using testing::ElementsAre;
 using testing::IsEmpty;
 
-struct DeviceFacts : DeviceTest
-{
-    static std::string Line(const std::string& text) { return "E DASystem.cpp " + text; }
-};
+using DeviceFacts = DeviceTest;
 
 TEST_F(DeviceFacts, ThatAreTextsAreNullWhereThePlatformSucceedsWithoutOne)
 {
@@ -22,8 +19,8 @@ TEST_F(DeviceFacts, ThatAreTextsAreNullWhereThePlatformSucceedsWithoutOne)
         kiv::sim::FailCall(call, 0);
     for (const auto read : {&DASystem::GetDeviceName, &DASystem::GetPlatformName, &DASystem::GetSWVersion, &DASystem::GetModelName,
              &DASystem::GetTizenIdN, &DASystem::GetIMEI})
-        EXPECT_EQ(Answer(0, "null"), Ask([&](char** out) { return std::invoke(read, facade, out); }));
-    EXPECT_EQ(Answer(0, "null"), Ask([&](char** out) { return facade.GetPackageVersion("org.example.mail", out); }));
+        EXPECT_EQ("null", Out([&](char** out) { EXPECT_EQ(0, std::invoke(read, facade, out)); }));
+    EXPECT_EQ("null", Out([&](char** out) { EXPECT_EQ(0, facade.GetPackageVersion("org.example.mail", out)); }));
     EXPECT_THAT(log.Take(), IsEmpty());
 }
 
@@ -42,85 +39,55 @@ TEST_F(DeviceFacts, ThatAreSwitchesAreReadEachForItself)
 
 TEST_F(DeviceFacts, OfAPackageAreThoseOfOneThatIsInstalledUnderThatVeryName)
 {
-    const std::pair<const char*, std::string> cases[] = {{nullptr, "PackageName is empty. IsPackageInstalled finish."},
-        {"", "PackageName is empty. IsPackageInstalled finish."}, {"org.example.mai", "No Such Package [org.example.mai]"}};
-    for (const auto& [package, line] : cases)
-    {
+    const std::string place = "E DASystem.cpp IsPackageInstalled > ", empty = "PackageName is empty. IsPackageInstalled finish.";
+    for (const char* const package : {static_cast<const char*>(nullptr), "", "org.example.mai"})
         EXPECT_FALSE(facade.IsPackageInstalled(const_cast<char*>(package)));
-        EXPECT_THAT(log.Take(), ElementsAre(Line("IsPackageInstalled > " + line)));
-    }
-    EXPECT_EQ(1U, TakeCalls().size()) << "an empty name is not asked for";
+    EXPECT_THAT(log.Take(), ElementsAre(place + empty, place + empty, place + "No Such Package [org.example.mai]"));
+    EXPECT_EQ(1U, TakeCalls()) << "an empty name is not asked for";
 }
 
 TEST_F(DeviceFacts, CompareFreeStorageStrictlyInMebibytes)
 {
-    constexpr std::uint32_t kLargestBlock = 0xFFFFFFFF;
     const std::tuple<std::uint32_t, std::uint64_t, double> sizes[] = {
-        {4096, 256, 1.0},
-        {1, 1, 0x1p-20},
-        {512, 3, 0x3p-11},
-        {kLargestBlock, 1, 0x1p12 - 0x1p-20},
-        {1, (std::uint64_t{1} << 53) + 1, 0x1p33},
-        {kLargestBlock, ~std::uint64_t{0}, 0x1.fffffffep75},
-        {4096, 0, 0.0},
-    };
-    const auto expect = [&](bool isAvailable, double required)
-    {
-        const Lines refused = {Line("IsSystemMemoryAvailable > Total mem under " + std::to_string(required))};
-        EXPECT_EQ(isAvailable, facade.IsSystemMemoryAvailable(required)) << required;
-        EXPECT_EQ(isAvailable ? Lines{} : refused, log.Take());
-    };
+        {4096, 256, 1.0}, {1, 1, 0x1p-20}, {0xFFFFFFFF, ~std::uint64_t{0}, 0x1.fffffffep75}, {4096, 0, 0.0}};
     for (const auto& [blockSize, blocks, free] : sizes)
     {
         Set(&Device::blockSize, blockSize);
         Set(&Device::blocksAvailable, blocks);
-        expect(false, free);
-        expect(false, std::nextafter(free, HUGE_VAL));
-        expect(true, std::nextafter(free, -1.0));
-        expect(false, std::nan(""));
-    }
-    Fail(Call::storage_get_internal_memory_size64, 1, Leavings::kItsResults);
-    expect(true, -1.0); // what is not negative is a success
-}
-
-TEST_F(DeviceFacts, HaveTheImeiOfTheFirstModemThatAnswers)
-{
-    constexpr Call kOpen = Call::telephony_init, kAsk = Call::telephony_modem_get_imei, kClose = Call::telephony_deinit;
-    const auto expect = [&](const std::string& imei, const std::vector<Call>& calls)
-    {
-        EXPECT_THAT(Ask([&](char** out) { return facade.GetIMEI(out); }), testing::Pair(0, testing::EndsWith(imei)));
-        EXPECT_EQ(calls, TakeCalls());
-    };
-    expect("356938035643809", {kOpen, kAsk, kClose});
-    kiv::sim::FailCall(kAsk, -1, kEvery, 0);
-    expect("490154203237518", {kOpen, kAsk, kAsk, kClose});
-    kiv::sim::FailCall(kAsk, -1, kEvery, 1);
-    expect("00000000", {kOpen, kAsk, kAsk, kClose}); // what stands in for it
-    EXPECT_THAT(log.Take(), IsEmpty());
-}
-
-TEST_F(DeviceFacts, HaveTheOffsetFromUtcFilledUpWithZerosForAnImeiWithoutTelephony)
-{
-    const std::pair<const char*, std::string> zones[] = {
-        {"EAST-9", "324000000000000"}, {"ZERO0", "000000000000000"}, {"WEST5", "-18000000000000"}, {"HALF-5:30", "198000000000000"},
-        {"ODD-1:02:03", "372300000000000"}, {"STD0DST-2,0/0,J365/25", "720000000000000"}, // summer all the year
-    };
-    const Lines failed = {"E DASimManager.cpp SuccessToInitTelephonyHandle > telephony_init Failed.",
-        Line("GetIMEI > telephony_init Failed. Start to get IMEI from current time")};
-    for (const int code : {-1, 0}) // no telephony, and a list of no handles
-    {
-        Fail(Call::telephony_init, code);
-        for (const auto& [zone, imei] : zones)
+        EXPECT_TRUE(facade.IsSystemMemoryAvailable(std::nextafter(free, -1.0))) << free;
+        for (const double required : {free, std::nan("")})
         {
-            setenv("TZ", zone, 1);
-            tzset();
-            EXPECT_EQ(Answer(0, imei), Ask([&](char** out) { return facade.GetIMEI(out); })) << zone;
-            EXPECT_EQ(failed, log.Take());
-            EXPECT_THAT(TakeCalls(), ElementsAre(Call::telephony_init));
+            EXPECT_FALSE(facade.IsSystemMemoryAvailable(required)) << required;
+            EXPECT_THAT(
+                log.Take(), ElementsAre("E DASystem.cpp IsSystemMemoryAvailable > Total mem under " + std::to_string(required)));
         }
     }
-    setenv("TZ", "UTC", 1);
-    tzset();
+    kiv::sim::FailCall(Call::storage_get_internal_memory_size64, 1, kEveryCall, kNoSlot, Leavings::kItsResults);
+    EXPECT_TRUE(facade.IsSystemMemoryAvailable(-1.0)) << "what is not negative is a success";
+}
+
+TEST_F(DeviceFacts, HaveTheImeiOfTheFirstModemThatAnswersElseTheOffsetFromUtcFilledUpWithZeros)
+{
+    const auto imei = [&] { return Out([&](char** out) { EXPECT_EQ(0, facade.GetIMEI(out)); }); };
+    kiv::sim::FailCall(Call::telephony_modem_get_imei, -1, kEveryCall, 0);
+    EXPECT_EQ("490154203237518", imei());
+
+    kiv::sim::FailCall(Call::telephony_modem_get_imei, -1);
+    const std::pair<const char*, const char*> zones[] = {{"EAST-9", "324000000000000"}, {"WEST5", "-18000000000000"},
+        {"STD0DST-2,0/0,J365/25", "720000000000000"}, // summer all the year
+        {"UTC", "000000000000000"}};
+    for (const auto& [zone, digits] : zones)
+    {
+        setenv("TZ", zone, 1);
+        tzset();
+        EXPECT_EQ(digits, imei()) << zone;
+    }
+    EXPECT_THAT(log.Take(), IsEmpty());
+
+    kiv::sim::FailCall(Call::telephony_init, 0); // a list of no handles
+    EXPECT_EQ("000000000000000", imei());
+    EXPECT_THAT(log.Take(), ElementsAre("E DASimManager.cpp SuccessToInitTelephonyHandle > telephony_init Failed.",
+                                "E DASystem.cpp GetIMEI > telephony_init Failed. Start to get IMEI from current time"));
 }
 
 } // namespace
