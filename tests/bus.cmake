@@ -15,7 +15,6 @@ foreach(subject IN ITEMS notification outage connection kill)
   kiv_test(bus_${subject}_test bus/${subject}_test.cpp $<TARGET_OBJECTS:kiv_test_subscribers>)
   target_link_libraries(bus_${subject}_test PRIVATE kiv_test_bus)
 endforeach()
-target_link_libraries(bus_connection_test PRIVATE ${CMAKE_DL_LIBS})
 # A bus that dies at the wrong moment makes GDBus print a critical; the test itself fails on any other.
 get_test_property(bus_kill_test ENVIRONMENT environment)
 list(REMOVE_ITEM environment G_DEBUG=fatal-criticals)
