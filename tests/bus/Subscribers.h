@@ -13,8 +13,6 @@ namespace kiv::test
 struct Subscribers
 {
     Subscribers() { current = this; }
-    Subscribers(const Subscribers&) = delete;
-    Subscribers& operator=(const Subscribers&) = delete;
     ~Subscribers() { current = nullptr; }
 
     std::vector<_SubscriberInfo> records;

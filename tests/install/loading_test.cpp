@@ -1,14 +1,8 @@
 // An agent that opens the library while it runs, and closes it with changes and deliveries still to come.
-#include "bus/Subscribers.h"
-#include "support/Peer.h"
-#include "support/PrivateBus.h"
+#include "bus/BusTest.h"
 
 #include <IDAConnectionStateListener.h>
 #include <SimulatedDevice.h>
-
-#include <gtest/gtest.h>
-
-#include <atomic>
 #include <dlfcn.h>
 
 namespace
@@ -24,7 +18,7 @@ struct Listener : IDAConnectionStateListener
     void OnPacketDataChanged(bool, void*) override {}
     void OnWifiConnectedChanged(bool, void*) override {}
 
-    std::atomic<int> heard{0};
+    std::atomic<unsigned> heard{0};
 };
 
 /// A function of the library by its name there; a member takes its object first.
@@ -36,15 +30,14 @@ Function* Symbol(void* library, const char* name)
 
 TEST(Library, ThatIsClosedWithAListenerAndAPushUnderWayStaysForThem)
 {
-    constexpr int kTimes = 1000;
     const PrivateBus bus;
     Peer client(bus);
     Subscribers store;
-    store.records = {{client.Name(), "/example/client", "org.example.Client"}};
+    store.records = {BusTest::Record(client)};
     Listener listener;
     ASSERT_EQ(nullptr, dlopen(KIV_LIBRARY, RTLD_NOW | RTLD_NOLOAD)) << "the test has to open it";
 
-    for (int i = 1; i <= kTimes; ++i)
+    for (unsigned i = 1; i <= 1000 && !HasFailure(); ++i)
     {
         void* const library = dlopen(KIV_LIBRARY, RTLD_NOW | RTLD_LOCAL);
         ASSERT_NE(nullptr, library) << dlerror();
@@ -58,10 +51,7 @@ TEST(Library, ThatIsClosedWithAListenerAndAPushUnderWayStaysForThem)
 
         kiv::sim::ChangeDevice([](kiv::sim::Device& device) { device.flightMode = !device.flightMode; });
         EXPECT_EQ(i, listener.heard);
-        const gint64 deadline = g_get_monotonic_time() + 20 * G_TIME_SPAN_SECOND;
-        while (client.Calls().size() < static_cast<std::size_t>(i) && g_get_monotonic_time() < deadline)
-            g_main_context_iteration(nullptr, FALSE);
-        ASSERT_EQ(static_cast<std::size_t>(i), client.Calls().size());
+        BusTest::IterateUntil([&] { return client.Calls().size() == i; });
     }
     kiv::sim::ResetDevice();
 }
