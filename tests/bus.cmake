@@ -11,7 +11,7 @@ target_precompile_headers(kiv_test_subscribers REUSE_FROM kiv_test_headers)
 set_target_properties(kiv_test_subscribers PROPERTIES KIV_UNOPTIMIZED ON POSITION_INDEPENDENT_CODE OFF UNITY_BUILD OFF)
 target_include_directories(kiv_test_subscribers PRIVATE ${CMAKE_CURRENT_SOURCE_DIR})
 
-foreach(subject IN ITEMS notification outage connection kill)
+foreach(subject IN ITEMS notification connection kill)
   kiv_test(bus_${subject}_test bus/${subject}_test.cpp $<TARGET_OBJECTS:kiv_test_subscribers>)
   target_link_libraries(bus_${subject}_test PRIVATE kiv_test_bus)
 endforeach()

@@ -17,46 +17,46 @@ constexpr char kBoardDaemon[] = "org.tizen.system.deviced";
 
 /// Records that can not be called, and what is wrong with them.
 const std::pair<_SubscriberInfo, std::string> kBadRecords[] = {
-    {{"", "/x", "a.b"}, "busname is not a bus name"},
-    {{"org.ex\xe9mple", "/x", "a.b"}, "busname is not a bus name"},
-    {{"no name", "/x", "a.b"}, "busname is not a bus name"},
-    {{"a.b", "", "a.b"}, "objectpath is not an object path"},
+    {{"", "", ""}, "busname is not a bus name"},
     {{"a.b", "/x/", "a.b"}, "objectpath is not an object path"},
-    {{"a.b", "/org/freedesktop/DBus/Local", "a.b"}, "objectpath is reserved"},
     {{"a.b", "/org/freedesktop/DBus/Locale/x", "a.b"}, "objectpath is reserved"},
     {{"a.b", "/x", "undotted"}, "interface is not an interface name"},
-    {{"a.b", "/x", "org.freedesktop.DBus.Local"}, "interface is reserved"},
     {{"a.b", "/x", "org.freedesktop.DBus.Locale"}, "interface is reserved"},
-    {{"", "", ""}, "busname is not a bus name"},
 };
 
 /// The library between a private bus and a subscriber store in memory.
 struct BusTest : testing::Test
 {
-    static PrivateBus& Bus()
+    BusTest()
     {
-        static PrivateBus bus;
-        return bus;
+        sim::SetLogSink(
+            [this](const sim::LogLine& line)
+            {
+                const auto has = [&](const char* text) { return line.text.find(text) != std::string::npos; };
+                deliveries += has("DeliverPushMessage(") && has("] interface: ");
+                deliveries -= has("DeliverPushMessage(") && has("] Unable to create proxy: ");
+                deliveries -= has("free_user_data(") && has("] end");
+            });
+    }
+    ~BusTest() override
+    {
+        Settle();
+        sim::SetLogSink(nullptr);
     }
 
-    PrivateBus& bus = Bus();
+    PrivateBus bus;
     Subscribers store;
     DASystem& facade = *DASystem::GetInstance();
     DADBusManager& manager = *DADBusManager::GetInstance();
     LogCapture log;
+    std::atomic<int> deliveries{0}; ///< of push messages, started and not ended
     char imsi[4] = "450";
 
     static _SubscriberInfo Record(const Peer& peer) { return {peer.Name(), "/example/client", "org.example.Client"}; }
     void Subscribe(const Peer& peer) { store.records.push_back(Record(peer)); }
 
-    int NotifySubscribers(_KIV_NOTI_TYPE_E type, int serviceId = 7)
-    {
-        return facade.SendNotiToServiceManager(type, imsi, serviceId, "on", "voice", "1.0", "url");
-    }
-    int NotifyServiceManager(_KIV_NOTI_TYPE_E type, int serviceId = 7)
-    {
-        return manager.SendNotiToServiceManager(type, imsi, serviceId, "on", "voice", "1.0", "url");
-    }
+    int NotifySubscribers(_KIV_NOTI_TYPE_E type) { return facade.SendNotiToServiceManager(type, imsi, 7, "a", "b", "c", "d"); }
+    int NotifyServiceManager(_KIV_NOTI_TYPE_E type) { return manager.SendNotiToServiceManager(type, imsi, 7, "a", "b", "c", "d"); }
 
     static std::string Line(const std::string& message, const char* level = "E", const char* function = "SendNotiToServiceManager")
     {
@@ -76,12 +76,12 @@ struct BusTest : testing::Test
         }
     }
 
-    /// The four error lines of a record that no proxy could be made for.
-    static std::vector<testing::Matcher<std::string>> NoProxyLines(const std::string& function, const _SubscriberInfo& record)
+    /// Iterates a main context until every delivery of a push message has ended, and what GDBus leaves there is gone, too.
+    void Settle(GMainContext* context = nullptr)
     {
-        const std::string place = Line("", "E", function.c_str());
-        return {testing::MatchesRegex(place + "Unable to create proxy: .+"), place + " subscriber busname: " + record.busname,
-            place + " subscriber objectpath: " + record.objectpath, place + " subscriber interface: " + record.interface};
+        IterateUntil([this] { return deliveries == 0; }, context);
+        while (g_main_context_iteration(context, FALSE))
+            continue;
     }
 };
 
