@@ -2,6 +2,7 @@
 #define KIV_TESTS_BUSTEST_H
 
 #include "bus/Subscribers.h"
+#include "support/Deliveries.h"
 #include "support/LogCapture.h"
 #include "support/Peer.h"
 #include "support/PrivateBus.h"
@@ -27,29 +28,14 @@ const std::pair<_SubscriberInfo, std::string> kBadRecords[] = {
 /// The library between a private bus and a subscriber store in memory.
 struct BusTest : testing::Test
 {
-    BusTest()
-    {
-        sim::SetLogSink(
-            [this](const sim::LogLine& line)
-            {
-                const auto has = [&](const char* text) { return line.text.find(text) != std::string::npos; };
-                deliveries += has("DeliverPushMessage(") && has("] interface: ");
-                deliveries -= has("DeliverPushMessage(") && has("] Unable to create proxy: ");
-                deliveries -= has("free_user_data(") && has("] end");
-            });
-    }
-    ~BusTest() override
-    {
-        Settle();
-        sim::SetLogSink(nullptr);
-    }
+    ~BusTest() override { Settle(); }
 
     PrivateBus bus;
     Subscribers store;
     DASystem& facade = *DASystem::GetInstance();
     DADBusManager& manager = *DADBusManager::GetInstance();
     LogCapture log;
-    std::atomic<int> deliveries{0}; ///< of push messages, started and not ended
+    Deliveries deliveries;
     char imsi[4] = "450";
 
     static _SubscriberInfo Record(const Peer& peer) { return {peer.Name(), "/example/client", "org.example.Client"}; }
@@ -63,26 +49,7 @@ struct BusTest : testing::Test
         return level + std::string(" DADBusManager.cpp ") + function + " > " + message;
     }
 
-    /// Iterates a main context until a condition holds; fails after twenty seconds.
-    template <class Condition>
-    static void IterateUntil(Condition isMet, GMainContext* context = nullptr)
-    {
-        const gint64 deadline = g_get_monotonic_time() + 20 * G_TIME_SPAN_SECOND;
-        while (!isMet())
-        {
-            ASSERT_LT(g_get_monotonic_time(), deadline);
-            if (!g_main_context_iteration(context, FALSE))
-                g_usleep(1000); // for what comes true outside the loop
-        }
-    }
-
-    /// Iterates a main context until every delivery of a push message has ended, and what GDBus leaves there is gone, too.
-    void Settle(GMainContext* context = nullptr)
-    {
-        IterateUntil([this] { return deliveries == 0; }, context);
-        while (g_main_context_iteration(context, FALSE))
-            continue;
-    }
+    void Settle(GMainContext* context = nullptr) const { deliveries.Settle(context); }
 };
 
 } // namespace kiv::test

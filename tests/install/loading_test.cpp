@@ -51,7 +51,7 @@ TEST(Library, ThatIsClosedWithAListenerAndAPushUnderWayStaysForThem)
 
         kiv::sim::ChangeDevice([](kiv::sim::Device& device) { device.flightMode = !device.flightMode; });
         EXPECT_EQ(i, listener.heard);
-        BusTest::IterateUntil([&] { return client.Calls().size() == i; });
+        IterateUntil([&] { return client.Calls().size() == i; });
     }
     kiv::sim::ResetDevice();
 }

@@ -130,7 +130,7 @@ TEST_F(Push, FailsWhenTheBusDiesAndTheNextOneGoesToTheNewBus)
     const auto arrives = [this]
     {
         Deliver();
-        IterateUntil([this] { return deliveries == 0; });
+        IterateUntil([this] { return deliveries.HaveEnded(); });
         return log.TakeErrors().empty();
     };
     IterateUntil(arrives); // GDBus shares what could not connect as well, until it is gone

@@ -15,11 +15,7 @@ const std::string kManager = "E DASimManager.cpp ";
 struct Slots : Sweep
 {
     /// What the operation of that name comes to on the device.
-    Story Ask(const std::string& operation)
-    {
-        return Try(
-            Find(operation), [] {}, sim::ClearFaults);
-    }
+    Story Ask(const std::string& operation) { return Try(Find(operation)); }
 
     DASystem& facade = *DASystem::GetInstance();
 };

@@ -24,23 +24,8 @@ struct Peer::State
 {
     Answer answer;
     std::vector<std::string> calls;
-    int busy = 0; ///< answers being worked at
     bool forgetful = false;
-
-    /// Waits until a condition on it holds. @return whether it does, at the latest after ten seconds
-    template <class Condition>
-    bool Await(Condition isMet)
-    {
-        const gint64 deadline = g_get_monotonic_time() + 10 * G_TIME_SPAN_SECOND;
-        for (std::unique_lock lock(mutex); !isMet(); lock.lock())
-        {
-            lock.unlock();
-            if (g_get_monotonic_time() > deadline)
-                return false;
-            g_usleep(500);
-        }
-        return true;
-    }
+    std::atomic<int> busy{0}; ///< answers being worked at
 };
 
 Peer::Peer(const PrivateBus& bus, const std::string& name, Answer answer) : connection_(bus.Connect())
@@ -91,7 +76,6 @@ GDBusMessage* Peer::Filter(GDBusConnection* connection, GDBusMessage* message, g
     if (const Message reply{answer ? answer(message) : g_dbus_message_new_method_reply(message)})
         g_dbus_connection_send_message(connection, reply.get(), G_DBUS_SEND_MESSAGE_FLAGS_NONE, nullptr, nullptr);
 
-    lock.lock();
     --state.busy;
     return nullptr;
 }
@@ -138,11 +122,6 @@ std::vector<std::string> Peer::Calls() const
     return state_->calls;
 }
 
-void Peer::AwaitCalls(std::size_t count)
-{
-    EXPECT_TRUE(state_->Await([&] { return state_->calls.size() >= count; })) << Calls().size() << " calls of " << count;
-}
-
 void Peer::Forget()
 {
     const std::lock_guard lock(mutex);
@@ -152,7 +131,8 @@ void Peer::Forget()
 void Peer::Close()
 {
     g_dbus_connection_close_sync(connection_.get(), nullptr, nullptr);
-    EXPECT_TRUE(state_->Await([this] { return state_->busy == 0; }));
+    while (state_->busy > 0)
+        std::this_thread::yield();
 }
 
 } // namespace kiv::test

@@ -39,8 +39,6 @@ public:
     /// Owns a well-known name from now on, instead of whoever did.
     void Own(const std::string& name);
     std::vector<std::string> Calls() const;
-    /// Waits until that many calls arrived since the beginning; fails after ten seconds.
-    void AwaitCalls(std::size_t count);
     /// Keeps no calls from now on.
     void Forget();
     /// Leaves the bus; no answer is being worked at on return.

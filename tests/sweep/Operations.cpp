@@ -5,7 +5,6 @@
 #include <DASimManager.h>
 #include <DASubscriberStore.h>
 #include <DASystem.h>
-#include <SimulatedLog.h>
 
 #include <cstring>
 #include <cxxabi.h>
@@ -584,18 +583,10 @@ World::World()
     setenv("TZ", "UTC", 1);
     tzset();
     Use("dual");
-    sim::SetLogSink(
-        [this](const sim::LogLine& line)
-        {
-            const auto isOf = [&](const char* text) { return line.text.find(text) != std::string::npos; };
-            pushes += isOf("DeliverPushMessage") && isOf("interface: ") ? 1 : 0;
-            pushes -= isOf("free_user_data") && isOf("] end") ? 1 : 0;
-        });
 }
 
 World::~World()
 {
-    sim::SetLogSink({});
     sim::ResetDevice();
     std::filesystem::remove_all(directory);
 }
@@ -611,12 +602,6 @@ void World::Use(const std::string& profile)
             device.flightMode = device.dataRoaming = true;
             device.bluetoothState = 2;
         });
-}
-
-void World::FinishPushes()
-{
-    while (pushes > 0)
-        g_main_context_iteration(nullptr, TRUE);
 }
 
 } // namespace kiv::test

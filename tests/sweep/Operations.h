@@ -1,6 +1,7 @@
 #ifndef KIV_TESTS_OPERATIONS_H
 #define KIV_TESTS_OPERATIONS_H
 
+#include "support/Deliveries.h"
 #include "support/Peer.h"
 
 #include <SimulatedDevice.h>
@@ -81,13 +82,10 @@ struct World
 
     static void Use(const std::string& profile);
 
-    /// Iterates the default main context until every push that was started has ended.
-    void FinishPushes();
-
     std::string directory; ///< of the subscriber store
     PrivateBus bus;
     Peer board, serviceManager, client;
-    std::atomic<int> pushes{0}; ///< started and not ended
+    Deliveries deliveries;
 };
 
 } // namespace kiv::test

@@ -75,7 +75,7 @@ Story Sweep::Try(const Operation& operation, const std::function<void()>& arm, c
         story.insert(story.end(), lines.begin(), lines.end());
     }
     if (operation.kind == Kind::kPush)
-        TheWorld().FinishPushes();
+        TheWorld().deliveries.Settle();
     EXPECT_THAT(sim::OpenHandles(), testing::IsEmpty());
     EXPECT_THAT(sim::TakeMisuses(), testing::IsEmpty());
     EXPECT_STREQ("", heldLock);

@@ -42,7 +42,7 @@ TEST(Growth, OfEachOperationIsNextToNothing)
                 Session session;
                 ASSERT_EQ(operation.good[0], operation.run(session)) << operation.name;
                 if (isPush && (i % 50 == 0 || i == -1))
-                    world.FinishPushes();
+                    world.deliveries.Settle();
             });
         EXPECT_LT(bytes, kMostBytes) << operation.name;
     };
@@ -53,7 +53,7 @@ TEST(Growth, OfEachOperationIsNextToNothing)
         else
             std::thread(measure, operation).join();
     }
-    world.FinishPushes();
+    world.deliveries.Settle();
 }
 
 } // namespace

@@ -53,7 +53,7 @@ TEST(Threads, DoNotDisturbEachOther)
             while (g_main_context_iteration(nullptr, FALSE))
                 continue;
     }
-    world.FinishPushes();
+    world.deliveries.Settle();
     sim::SetCallHook(nullptr);
     EXPECT_EQ(std::vector<std::string>(), sim::OpenHandles());
     EXPECT_EQ(std::vector<std::string>(), sim::TakeMisuses());

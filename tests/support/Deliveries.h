@@ -1,0 +1,60 @@
+#ifndef KIV_TESTS_DELIVERIES_H
+#define KIV_TESTS_DELIVERIES_H
+
+#include "support/Test.h"
+
+#include <SimulatedLog.h>
+
+namespace kiv::test
+{
+
+/// Iterates a main context until a condition holds; fails after twenty seconds.
+template <class Condition>
+void IterateUntil(Condition isMet, GMainContext* context = nullptr)
+{
+    const gint64 deadline = g_get_monotonic_time() + 20 * G_TIME_SPAN_SECOND;
+    while (!isMet())
+    {
+        ASSERT_LT(g_get_monotonic_time(), deadline);
+        if (!g_main_context_iteration(context, FALSE))
+            g_usleep(1000); // for what comes true outside the loop
+    }
+}
+
+/// Counts the deliveries of push messages by what the library logs.
+class Deliveries
+{
+public:
+    Deliveries()
+    {
+        sim::SetLogSink(
+            [this](const sim::LogLine& line)
+            {
+                const auto has = [&](const char* text) { return line.text.find(text) != std::string::npos; };
+                open_ += has("DeliverPushMessage(") && has("] interface: ");
+                open_ -= has("DeliverPushMessage(") && has("] Unable to create proxy: ");
+                open_ -= has("free_user_data(") && has("] end");
+            });
+    }
+    Deliveries(const Deliveries&) = delete;
+    Deliveries& operator=(const Deliveries&) = delete;
+    ~Deliveries() { sim::SetLogSink(nullptr); }
+
+    /// Whether every one that was started has ended.
+    bool HaveEnded() const { return open_ == 0; }
+
+    /// Iterates a main context until they have, and until what GDBus leaves there is gone, too.
+    void Settle(GMainContext* context = nullptr) const
+    {
+        IterateUntil([this] { return HaveEnded(); }, context);
+        while (g_main_context_iteration(context, FALSE))
+            continue;
+    }
+
+private:
+    std::atomic<int> open_{0};
+};
+
+} // namespace kiv::test
+
+#endif
