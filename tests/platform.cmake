@@ -1,1 +1,1 @@
-kiv_test(platform_test platform/handles_test.cpp platform/changes_test.cpp)
+kiv_test(platform_test platform/platform_test.cpp)

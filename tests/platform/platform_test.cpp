@@ -1,0 +1,135 @@
+#include "support/Test.h"
+
+#include <ITapiSim.h>
+#include <SimulatedDevice.h>
+#include <SimulatedLog.h>
+#include <runtime_info.h>
+#include <telephony.h>
+
+using namespace kiv::sim;
+using testing::StartsWith;
+
+namespace
+{
+
+TEST(Handles, ThatAreOpenAndWhatWasDoneWronglyWithThemAreTold)
+{
+    telephony_handle_list_s list{};
+    ASSERT_EQ(0, telephony_init(&list));
+    const telephony_h second = list.handle[1];
+    TapiHandle* const modem = tel_init("modem1");
+    telephony_sim_state_e state{};
+    EXPECT_THAT(OpenHandles(), testing::SizeIs(2));
+    EXPECT_NE(0, tel_deinit(reinterpret_cast<TapiHandle*>(second)));
+    EXPECT_EQ(0, telephony_deinit(&list));
+    EXPECT_EQ(0, tel_deinit(modem));
+    for (const int refusal : {telephony_sim_get_state(second, &state), tel_deinit(modem), tel_deinit(nullptr)})
+        EXPECT_NE(0, refusal);
+    EXPECT_THAT(OpenHandles(), testing::IsEmpty());
+    EXPECT_THAT(TakeMisuses(),
+        testing::ElementsAre(
+            StartsWith("tel_deinit: needs a TAPI handle, got a telephony handle of slot 1, opened by telephony_init"),
+            StartsWith("telephony_sim_get_state: used after closing: telephony handle of slot 1, opened by telephony_init call 1"),
+            StartsWith("tel_deinit: closed twice: TAPI handle of slot 1, opened by tel_init call 1 from platform_test+0x"),
+            "tel_deinit: needs a TAPI handle, got null"));
+}
+
+constexpr auto kKey = RUNTIME_INFO_KEY_FLIGHT_MODE_ENABLED;
+
+void Await(const char* what, const std::function<bool()>& isSo)
+{
+    const gint64 deadline = g_get_monotonic_time() + gint64{10} * G_USEC_PER_SEC;
+    while (!isSo() && g_get_monotonic_time() < deadline)
+        g_usleep(1000);
+    EXPECT_TRUE(isSo()) << what;
+}
+
+/// A device file, at first as the profile "dual" has it, that the device follows; nothing else may stay beside it.
+struct Changes : testing::Test
+{
+    Changes()
+    {
+        EXPECT_EQ("", SetInDeviceFile(path, {}));
+        EXPECT_EQ("", UseProfile(path));
+    }
+    ~Changes() override
+    {
+        ResetDevice();
+        EXPECT_EQ(2U, std::filesystem::remove_all(directory));
+    }
+
+    const std::string directory = mkdtemp((std::filesystem::temp_directory_path() / "kiv-device-XXXXXX").string().data());
+    const std::string path = directory + "/my device";
+};
+
+TEST_F(Changes, OfAFileAreToldHoweverItIsWrittenAndThoseThatBreakItAreComplainedAboutOnce)
+{
+    static std::atomic<bool> isOn, isOver;
+    const auto follow = [](runtime_info_key_e key, void*)
+    {
+        isOn = GetDevice().flightMode;
+        isOver = !isOn && runtime_info_unset_changed_cb(key) == 0; // on the thread that follows the file
+    };
+    ChangeDevice([](Device& device) { device.slots[0].cardReads = 1; });
+    EXPECT_EQ(0, runtime_info_set_changed_cb(kKey, follow, nullptr));
+    std::atomic<int> complaints{0};
+    SetLogSink([&](const LogLine& line)
+        { complaints += line.text.find("[runtime] flight-mode: \"maybe\" is") != line.text.npos ? 1 : 9; });
+    const std::string good = (std::ostringstream() << std::ifstream(path).rdbuf()).str();
+    const auto write = [&](const std::string& text) { EXPECT_TRUE(g_file_set_contents(path.c_str(), text.c_str(), -1, nullptr)); };
+    for (const char* comment : {"# one\n", "# two\n", "# three\n"})
+        write(comment + good + "[runtime]\nflight-mode=maybe\n");
+    Await("a complaint", [&] { return complaints > 0; });
+    g_usleep(200000); // GLib tells of changes that follow each other ten times a second
+    write(good + "[runtime]\nflight-mode=true\n");
+    Await("a file renamed over", [] { return isOn.load(); });
+    EXPECT_EQ(1U, GetDevice().slots[0].cardReads) << "the card's script does not begin anew";
+    EXPECT_EQ(1, complaints);
+    SetLogSink(nullptr);
+    std::ofstream(path) << good;
+    Await("a file written in place", [] { return isOver.load(); });
+}
+
+TEST_F(Changes, AreNotBeingToldAnyMoreWhenAnUnregistrationReturned)
+{
+    static std::atomic<int> step;
+    const auto slowly = [](runtime_info_key_e, void*)
+    {
+        step = 1;
+        g_usleep(100000);
+        step = 2;
+    };
+    EXPECT_EQ(0, runtime_info_set_changed_cb(kKey, slowly, nullptr));
+    std::thread changer([] { ChangeDevice([](Device& device) { device.flightMode = true; }); });
+    Await("the callback", [] { return step == 1; });
+    EXPECT_EQ(0, runtime_info_unset_changed_cb(kKey));
+    EXPECT_EQ(2, step);
+    changer.join();
+}
+
+TEST_F(Changes, OfTwoWritersAtOnceAreAllKept)
+{
+    const auto write = [this](const std::string& prefix)
+    {
+        for (int i = 0; i < 10; ++i)
+            EXPECT_EQ("", SetInDeviceFile(path, {"packages." + prefix + std::to_string(i) + "=1.0"}));
+    };
+    const std::size_t before = GetDevice().packages.size();
+    std::thread other(write, "x");
+    write("y");
+    other.join();
+    EXPECT_EQ("", UseProfile(path));
+    EXPECT_EQ(before + 20, GetDevice().packages.size());
+}
+
+TEST(Device, DoesNotAnswerWhenItsProfileIsWrong)
+{
+    g_setenv("KIV_PROFILE", "tripel", TRUE);
+    ResetDevice();
+    EXPECT_NE(0, runtime_info_set_changed_cb(
+                     kKey, [](runtime_info_key_e, void*) {}, nullptr));
+    g_unsetenv("KIV_PROFILE");
+    ResetDevice();
+}
+
+} // namespace
