@@ -2,18 +2,8 @@
 
 #include <DAMutex.h>
 
-#include <deque>
-
 namespace
 {
-
-/// Counts one visit more, but not those that others make meanwhile.
-void Visit(int& visits)
-{
-    const int before = visits;
-    std::this_thread::yield();
-    visits = before + 1;
-}
 
 TEST(NamedLocks, EqualTextsAreOneLockInEveryBufferAndKindFromTheirFirstUseOn)
 {
@@ -29,10 +19,12 @@ TEST(NamedLocks, EqualTextsAreOneLockInEveryBufferAndKindFromTheirFirstUseOn)
                 std::this_thread::yield();
             DAMutex mutex(name.c_str());
             mutex.Lock();
-            Visit(visits[i]);
+            const int before = visits[i];
+            std::this_thread::yield();
+            visits[i] = before + 1;
             mutex.Unlock();
             const DAMutexLock lock(name.c_str());
-            Visit(visits[i]);
+            ++visits[i];
         }
     };
     std::vector<std::future<void>> threads(kThreads);
@@ -48,7 +40,7 @@ TEST(NamedLocks, ManyNamesAreAsManyLocksAlsoWhileTheProcessEnds)
     testing::FLAGS_gtest_death_test_style = "threadsafe"; // a new process, whose first lock comes behind atexit
     const auto holdMany = []
     {
-        std::deque<DAMutexLock> held;
+        std::list<DAMutexLock> held;
         for (int i = 0; i < 60; ++i)
             held.emplace_back(i == 0 ? nullptr : ("name " + std::to_string(i)).c_str());
     };
