@@ -10,22 +10,12 @@
 #include <cstdlib>
 #include <sstream>
 
-namespace
-{
-std::size_t fed = 0;
-}
-
 void kiv::fuzz::Require(bool isTrue, const char* what)
 {
     if (isTrue)
         return;
     std::fprintf(stderr, "not true: %s\n", what);
     std::abort();
-}
-
-void kiv::fuzz::Feed(std::size_t records)
-{
-    fed += records;
 }
 
 std::vector<std::string> kiv::fuzz::Split(std::string_view text, char separator, std::size_t least)
@@ -38,17 +28,12 @@ std::vector<std::string> kiv::fuzz::Split(std::string_view text, char separator,
     return pieces;
 }
 
-int kiv::fuzz::Number(const std::string& text)
-{
-    return static_cast<int>(std::strtoll(text.c_str(), nullptr, 10));
-}
-
 extern "C" int LLVMFuzzerInitialize(int*, char***)
 {
     g_log_set_always_fatal(static_cast<GLogLevelFlags>(G_LOG_LEVEL_ERROR | G_LOG_LEVEL_CRITICAL | G_LOG_LEVEL_WARNING));
     std::signal(SIGTRAP, [](int) { std::abort(); }); // GLib's way to end the process; libFuzzer keeps the input for the other
     kiv::sim::SetLogSink([](const auto&) {});        // every line is formatted
-    return std::atexit([] { std::fprintf(stderr, "fed %zu\n", fed); });
+    return std::atexit([] { std::fprintf(stderr, "fed %zu\n", kiv::fuzz::fed); });
 }
 
 extern "C" int LLVMFuzzerTestOneInput(const unsigned char* data, std::size_t size)
