@@ -18,15 +18,10 @@ public:
     LogCapture& operator=(const LogCapture&) = delete;
     ~LogCapture() { sim::StopLog(); }
 
-    /// What was logged since the last Take, a text a line: "E DASimManager.cpp IsValidMcc > mcc is invalid". A line that is not in
-    /// the form of the library's lines is handed out behind "bad line: ", which no expectation matches.
-    std::vector<std::string> Take() { return Take(""); }
-
-    /// The same, error lines alone.
-    std::vector<std::string> TakeErrors() { return Take("E "); }
-
-private:
-    static std::vector<std::string> Take(const std::string& prefix)
+    /// What was logged since the last Take, a text a line: "E DASimManager.cpp IsValidMcc > mcc is invalid", as far as it begins
+    /// like that. A line that is not in the form of the library's lines is handed out behind "bad line: ", which no expectation
+    /// matches.
+    static std::vector<std::string> Take(const std::string& prefix = "")
     {
         std::vector<std::string> texts;
         for (const auto& line : sim::TakeLog())
@@ -38,6 +33,9 @@ private:
         return texts;
     }
 
+    static std::vector<std::string> TakeErrors() { return Take("E "); }
+
+private:
     static std::string Text(const sim::LogLine& line)
     {
         constexpr auto kForm = R"(\A([EI])2 KIV_AGENT ([^:]+): (\w+)\([1-9]\d*\) > \[\*\1(?:rror|nfo)\*\] (.*)\n\z)";

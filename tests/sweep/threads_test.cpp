@@ -8,37 +8,19 @@ namespace
 using namespace kiv::test;
 namespace sim = kiv::sim;
 
-thread_local const Operation* current = nullptr;
-
-/// The one lock on SIM access is held by one thread at a time.
-std::string CheckSimAccess(Call call, int)
-{
-    static std::atomic<int> inside{0};
-    if (current == nullptr || !current->IsLockedAt(call))
-        return "";
-    EXPECT_EQ(0, inside.fetch_add(1)) << sim::NameOf(call);
-    std::this_thread::yield();
-    inside.fetch_sub(1);
-    return "";
-}
-
 void RunAll(const std::vector<const Operation*>& operations, std::size_t start, int rounds)
 {
     for (std::size_t i = 0; i < operations.size() * static_cast<std::size_t>(rounds); ++i)
     {
         const Operation& operation = *operations[(start + i) % operations.size()];
         Session session;
-        current = &operation;
         EXPECT_EQ(operation.good[0], operation.run(session)) << operation.name;
-        current = nullptr;
     }
 }
 
 TEST(Threads, DoNotDisturbEachOther)
 {
     World world;
-    sim::SetCallHook(CheckSimAccess);
-
     std::vector<const Operation*> any, listening; // the latter on the thread that the changes arrive on
     for (const Operation& operation : Operations())
         (operation.kind == Kind::kListener ? listening : any).push_back(&operation);
@@ -54,7 +36,6 @@ TEST(Threads, DoNotDisturbEachOther)
                 continue;
     }
     world.deliveries.Settle();
-    sim::SetCallHook(nullptr);
     EXPECT_EQ(std::vector<std::string>(), sim::OpenHandles());
     EXPECT_EQ(std::vector<std::string>(), sim::TakeMisuses());
 }

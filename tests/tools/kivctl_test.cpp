@@ -278,6 +278,17 @@ TEST_F(KivctlTest, PrintsWhatThePagesShow)
         program.Await(printed);
         EXPECT_EQ(printed, program.Out());
     }
+
+    const Words rows = All("\n(\\| `kivctl [^`]*` \\| (?:object|array) \\| .*) \\|", pages); // of the fields in JSON
+    EXPECT_EQ(13U, rows.size());
+    for (const std::string& row : rows)
+    {
+        const std::string out = Kivctl("--json --profile single " + *All("`kivctl (.*?)`", row).begin()).out;
+        Words names = All("\"(\\w+)\": ?", out);
+        names.erase("notes");
+        EXPECT_EQ(All("`(\\w+)`", row), names) << row;
+        EXPECT_EQ(row.find("| array |") != row.npos, out.front() == '[') << row;
+    }
 }
 
 TEST_F(KivctlTest, HelpManPageCompletionAndPageAgreeOnVerbsOptionsAndExitCodes)
