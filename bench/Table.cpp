@@ -63,7 +63,8 @@ bool Table::WriteJson(const std::string& path) const
 
 bool Table::IsMet() const
 {
-    return std::none_of(rows_.begin(), rows_.end(), [](const Row& row) { return row.outcome == Outcome::Missed; });
+    return !rows_.empty() &&
+           std::none_of(rows_.begin(), rows_.end(), [](const Row& row) { return row.outcome == Outcome::Missed; });
 }
 
 } // namespace kiv::bench

@@ -41,7 +41,7 @@ public:
 
     /// @return whether the file could be written
     bool WriteJson(const std::string& path) const;
-    /// @return whether no goal was missed
+    /// @return whether something was measured, and no goal was missed
     bool IsMet() const;
 
 private:

@@ -1,5 +1,4 @@
 kiv_test(country_test country/country_test.cpp)
-target_compile_definitions(country_test PRIVATE KIV_TEST_DATA="${CMAKE_CURRENT_SOURCE_DIR}/data")
 
 foreach(source IN ITEMS iso-codes libphonenumber mobile-broadband-provider-info)
   kiv_check(country_${source} ${CMAKE_CURRENT_SOURCE_DIR}/country/world.py ${source} ${CMAKE_CURRENT_SOURCE_DIR}/data)

@@ -31,11 +31,20 @@ struct Kill : BusTest
         return code;
     }
 
+    int NotifyOfTwo()
+    {
+        int ids[] = {1, 2};
+        char on[] = "on";
+        char* statuses[] = {on, on};
+        return facade.SendMultiOnOffNotiToServiceManager(imsi, 2, ids, statuses);
+    }
+
     /// Each with its name and what comes back without a bus.
     const std::vector<std::tuple<const char*, std::function<int()>, std::vector<int>>> operations = {
         {"serial", [this] { return AskForSerial(); }, {1, 2}},
         {"service manager", [this] { return NotifyServiceManager(KIV_NOTI_TYPE_POLICY); }, {1, 2, 5}},
         {"walk", [this] { return NotifySubscribers(KIV_NOTI_TYPE_NUMBER_CHANGED); }, {0}},
+        {"several", [this] { return NotifyOfTwo(); }, {0}},
         {"push", [this] { return manager.DeliverPushMessage("7", "data", "message", 1); }, {0}},
     };
 };
@@ -86,7 +95,7 @@ TEST_F(Kill, AtAnyMomentLeavesTheProcessAliveNothingOwnedAndTheNextCallGoesToThe
         std::thread(runAll).join();
         Settle();
         EXPECT_THAT(log.TakeErrors(), IsEmpty());
-        EXPECT_EQ(4U, client.Calls().size());
+        EXPECT_EQ(8U, client.Calls().size());
     }
     PrivateBus::Tolerate(nullptr);
 }
@@ -99,8 +108,7 @@ TEST_F(Kill, IsFoundByEveryCallAsLongAsTheAgentHoldsTheDeadConnection)
     bus.Start();
     Peer client(bus), serviceManager(bus, kServiceManager);
     store.records = {Record(client)};
-    while (!g_dbus_connection_is_closed(agents.get()))
-        std::this_thread::yield();
+    IterateUntil([&] { return g_dbus_connection_is_closed(agents.get()) != FALSE; });
     for (const auto& [name, run, codes] : operations)
     {
         EXPECT_THAT(run(), AnyOfArray(codes)) << name;

@@ -2,7 +2,6 @@
 #include "device/DeviceTest.h"
 
 #include <DAConnectionManager.h>
-#include <net_connection.h>
 
 #include <bitset>
 

@@ -13,11 +13,12 @@ using namespace kiv::test;
 void Try(std::string_view input)
 {
     static std::atomic<unsigned> number{0}; // of the input: the good record has an object of its own, which no other record names
-    static std::atomic<int> delivered{0};
-    static const auto path = [] { return "/example/client/" + std::to_string(number); };
+    static std::atomic<int> delivered{0}, late{0};
+    static const auto path = [](unsigned of) { return "/example/client/" + std::to_string(of); };
     const auto answer = [](GDBusMessage* call)
     {
-        delivered += g_dbus_message_get_path(call) == path() ? 1 : 0;
+        delivered += g_dbus_message_get_path(call) == path(number) ? 1 : 0;
+        late += g_dbus_message_get_path(call) == path(number - 1) ? 1 : 0; // a second call of the input before
         return g_dbus_message_new_method_reply(call);
     };
     static const PrivateBus& bus = *new PrivateBus;
@@ -36,7 +37,7 @@ void Try(std::string_view input)
     ++number;
     delivered = 0;
     const auto place = static_cast<std::ptrdiff_t>(input.size() % (store.records.size() + 1));
-    store.records.insert(store.records.begin() + place, {peer.Name(), path(), "org.example.Client"});
+    store.records.insert(store.records.begin() + place, {peer.Name(), path(number), "org.example.Client"});
 
     DADBusManager& manager = *DADBusManager::GetInstance();
     char imsi[] = "450";
@@ -48,5 +49,5 @@ void Try(std::string_view input)
     while (g_main_context_iteration(nullptr, FALSE) != FALSE)
         continue;
     Require(!g_dbus_connection_is_closed(connection), "the bus does not disconnect");
-    Require(delivered == 1, "the good record is called once");
+    Require(delivered == 1 && late == 0, "the good record is called once");
 }

@@ -1,4 +1,5 @@
-#include "support/Test.h"
+#include "support/Deliveries.h"
+#include "support/Texts.h"
 
 #include <ITapiSim.h>
 #include <SimulatedDevice.h>
@@ -7,6 +8,7 @@
 #include <telephony.h>
 
 using namespace kiv::sim;
+using kiv::test::IterateUntil;
 using testing::StartsWith;
 
 namespace
@@ -14,6 +16,7 @@ namespace
 
 TEST(Handles, ThatAreOpenAndWhatWasDoneWronglyWithThemAreTold)
 {
+    ResetDevice(); // which counts the calls
     telephony_handle_list_s list{};
     ASSERT_EQ(0, telephony_init(&list));
     const telephony_h second = list.handle[1];
@@ -35,14 +38,6 @@ TEST(Handles, ThatAreOpenAndWhatWasDoneWronglyWithThemAreTold)
 }
 
 constexpr auto kKey = RUNTIME_INFO_KEY_FLIGHT_MODE_ENABLED;
-
-void Await(const char* what, const std::function<bool()>& isSo)
-{
-    const gint64 deadline = g_get_monotonic_time() + gint64{10} * G_USEC_PER_SEC;
-    while (!isSo() && g_get_monotonic_time() < deadline)
-        g_usleep(1000);
-    EXPECT_TRUE(isSo()) << what;
-}
 
 /// A device file, at first as the profile "dual" has it, that the device follows; nothing else may stay beside it.
 struct Changes : testing::Test
@@ -75,19 +70,19 @@ TEST_F(Changes, OfAFileAreToldHoweverItIsWrittenAndThoseThatBreakItAreComplained
     std::atomic<int> complaints{0};
     SetLogSink([&](const LogLine& line)
         { complaints += line.text.find("[runtime] flight-mode: \"maybe\" is") != line.text.npos ? 1 : 9; });
-    const std::string good = (std::ostringstream() << std::ifstream(path).rdbuf()).str();
+    const std::string good = kiv::test::Contents(path);
     const auto write = [&](const std::string& text) { EXPECT_TRUE(g_file_set_contents(path.c_str(), text.c_str(), -1, nullptr)); };
     for (const char* comment : {"# one\n", "# two\n", "# three\n"})
         write(comment + good + "[runtime]\nflight-mode=maybe\n");
-    Await("a complaint", [&] { return complaints > 0; });
+    IterateUntil([&] { return complaints > 0; });
     g_usleep(200000); // GLib tells of changes that follow each other ten times a second
     write(good + "[runtime]\nflight-mode=true\n");
-    Await("a file renamed over", [] { return isOn.load(); });
+    IterateUntil([] { return isOn.load(); }); // a file renamed over the other
     EXPECT_EQ(1U, GetDevice().slots[0].cardReads) << "the card's script does not begin anew";
     EXPECT_EQ(1, complaints);
     SetLogSink(nullptr);
     std::ofstream(path) << good;
-    Await("a file written in place", [] { return isOver.load(); });
+    IterateUntil([] { return isOver.load(); }); // one written in place
 }
 
 TEST_F(Changes, AreNotBeingToldAnyMoreWhenAnUnregistrationReturned)
@@ -96,14 +91,18 @@ TEST_F(Changes, AreNotBeingToldAnyMoreWhenAnUnregistrationReturned)
     const auto slowly = [](runtime_info_key_e, void*)
     {
         step = 1;
-        g_usleep(100000);
-        step = 2;
+        while (step == 1)
+            std::this_thread::yield();
+        g_usleep(20'000); // in which the unregistration could return
+        step = 3;
     };
+    step = 0;
     EXPECT_EQ(0, runtime_info_set_changed_cb(kKey, slowly, nullptr));
     std::thread changer([] { ChangeDevice([](Device& device) { device.flightMode = true; }); });
-    Await("the callback", [] { return step == 1; });
+    IterateUntil([] { return step == 1; });
+    step = 2;
     EXPECT_EQ(0, runtime_info_unset_changed_cb(kKey));
-    EXPECT_EQ(2, step);
+    EXPECT_EQ(3, step);
     changer.join();
 }
 
@@ -120,16 +119,6 @@ TEST_F(Changes, OfTwoWritersAtOnceAreAllKept)
     other.join();
     EXPECT_EQ("", UseProfile(path));
     EXPECT_EQ(before + 20, GetDevice().packages.size());
-}
-
-TEST(Device, DoesNotAnswerWhenItsProfileIsWrong)
-{
-    g_setenv("KIV_PROFILE", "tripel", TRUE);
-    ResetDevice();
-    EXPECT_NE(0, runtime_info_set_changed_cb(
-                     kKey, [](runtime_info_key_e, void*) {}, nullptr));
-    g_unsetenv("KIV_PROFILE");
-    ResetDevice();
 }
 
 } // namespace

@@ -109,7 +109,7 @@ TEST_F(Push, WaitsForTheLoopOfTheThreadDefaultContextOfWhoeverStartedIt)
 TEST_F(Push, FailsWhenTheBusDiesAndTheNextOneGoesToTheNewBus)
 {
     Connection agents(g_bus_get_sync(G_BUS_TYPE_SYSTEM, nullptr, nullptr)); // with which GDBus would end the process
-    Peer silent(bus, "", Peer::Silence());
+    Peer silent(bus, "", Peer::InsteadDo([] {}));
     store.records = {Record(silent), Record(silent)};
     Deliver();
     IterateUntil([&] { return silent.Calls().size() == 2; });

@@ -26,10 +26,6 @@ public:
     static Answer Refuse();
     /// Does something and gives no answer.
     static Answer InsteadDo(std::function<void()> action);
-    static Answer Silence()
-    {
-        return InsteadDo([] {});
-    }
     /// Leaves the bus without an answer.
     Answer Leave();
     void Set(Answer answer);

@@ -21,6 +21,12 @@ std::string Out(Operation operation, void (*release)(void*) = std::free)
     return text;
 }
 
+/// What stands in a file.
+inline std::string Contents(const std::string& path)
+{
+    return (std::ostringstream() << std::ifstream(path, std::ios::binary).rdbuf()).str();
+}
+
 using Rows = std::vector<std::vector<std::string>>;
 
 inline Rows Read(const char* file)

@@ -15,7 +15,7 @@ inline std::set<std::string> lockNames;     ///< of the locks made
 inline std::function<bool()> isLockRefused; ///< whether a lock of a new name can not be made
 inline int pauses = 0;                      ///< the seconds that were to be slept
 
-/// How many calls or allocations are to fail in a row: one, two, … all; more in the long form.
+/// How many calls or allocations are to fail in a row. Once an operation ends before so many have, more come to the same.
 std::vector<unsigned> Lengths();
 
 /// Tries operations one by one in one world, each on a device that nobody used before.
@@ -24,7 +24,9 @@ struct Sweep : testing::Test
     Sweep();
     ~Sweep() override;
 
-    void Use(const std::string& profile);
+    /// The profiles, and one device with many slots, of whose walks several calls and allocations fail.
+    static std::vector<std::string> Devices();
+    void Use(const std::string& name);
 
     /// The operation of that name.
     static const Operation& Find(const std::string& name);

@@ -1,4 +1,4 @@
-#include "support/Test.h"
+#include "support/Texts.h"
 
 #include <DASubscribeDataManager.h>
 #include <DASubscriberStore.h>
@@ -13,12 +13,8 @@ namespace
 {
 
 namespace fs = std::filesystem;
+using kiv::test::Contents;
 using Outcome = DASubscriberStore::Outcome;
-
-std::string Read(const fs::path& path)
-{
-    return (std::ostringstream() << std::ifstream(path, std::ios::binary).rdbuf()).str();
-}
 
 struct SubscriberStore : testing::Test
 {
@@ -114,7 +110,7 @@ TEST_F(SubscriberStore, LosesNothingWhenManyProcessesMakeFillAndReadIt)
 TEST_F(SubscriberStore, LeavesAFileThatItCanNotUseAsItIsAndSaysSoInOneErrorLine)
 {
     ASSERT_EQ(Outcome::Done, Add("push", "7", ":1.7"));
-    const std::string good = Read(store.Path());
+    const std::string good = Contents(store.Path());
     const std::tuple<const char*, std::string, const char*> rows[] = {
         {"new/directory/subscribers.db", "spoilt while it is open", "file is not a database"},
         {"later", std::string(good).replace(63, 1, 1, '\2'), "schema version 2 instead of 1; the file is left as it is"},
@@ -128,7 +124,7 @@ TEST_F(SubscriberStore, LeavesAFileThatItCanNotUseAsItIsAndSaysSoInOneErrorLine)
         std::ofstream(store.Path(), std::ios::binary) << content;
         EXPECT_EQ("failed: 6 KIV_UTIL no subscribers of push \"7\": " + store.Path() + ": " + trouble + "\n", Find("push", "7"));
         EXPECT_EQ(Outcome::Failed, Add("push", "7", ":1.8")) << name;
-        EXPECT_EQ(content, Read(store.Path()));
+        EXPECT_EQ(content, Contents(store.Path()));
     }
 }
 
@@ -139,7 +135,10 @@ TEST_F(SubscriberStore, IsTheFileAtItsPathAlsoWhileAProcessHasTheFormerOneOpen)
     Use("smaller.db");
     const pid_t holder = fork();
     if (holder == 0)
+    {
         raise(Add("push", "7", ":1.7") == Outcome::Done ? SIGSTOP : SIGKILL);
+        _exit(0);
+    }
     int status = 0;
     ASSERT_TRUE(waitpid(holder, &status, WUNTRACED) == holder && WIFSTOPPED(status));
 
