@@ -14,8 +14,7 @@ namespace
 
 constexpr char kMarker[] = "org.example.Marker";
 
-/// What the monitor saw. The program's own from the start on: GLib hands the filter to its thread under locks that ThreadSanitizer
-/// does not see, and may still be in it when the monitor is gone.
+/// What the monitor saw. The program's own, since GLib's thread may still be in the filter when the monitor is gone.
 struct
 {
     std::mutex mutex;
@@ -42,14 +41,13 @@ std::string Line(GDBusMessage* message)
 
 } // namespace
 
-BusMonitor::BusMonitor(GDBusConnection* marking, GDBusConnection* watching)
-    : marking_(marking), watching_(G_DBUS_CONNECTION(g_object_ref(watching)))
+BusMonitor::BusMonitor(const PrivateSystemBus& bus) : shared_(bus.Shared()), watching_(bus.Connect())
 {
-    g_dbus_connection_add_filter(watching_, Filter, nullptr, nullptr);
+    g_dbus_connection_add_filter(watching_.get(), Filter, nullptr, nullptr);
     g_autoptr(GError) error = nullptr;
-    g_autoptr(GVariant) reply =
-        g_dbus_connection_call_sync(watching_, "org.freedesktop.DBus", "/org/freedesktop/DBus", "org.freedesktop.DBus.Monitoring",
-            "BecomeMonitor", g_variant_new("(asu)", nullptr, 0U), nullptr, G_DBUS_CALL_FLAGS_NONE, -1, nullptr, &error);
+    g_autoptr(GVariant) reply = g_dbus_connection_call_sync(watching_.get(), "org.freedesktop.DBus", "/org/freedesktop/DBus",
+        "org.freedesktop.DBus.Monitoring", "BecomeMonitor", g_variant_new("(asu)", nullptr, 0U), nullptr, G_DBUS_CALL_FLAGS_NONE,
+        -1, nullptr, &error);
     if (reply == nullptr)
         throw std::runtime_error(error->message);
     AwaitMarker();
@@ -57,8 +55,7 @@ BusMonitor::BusMonitor(GDBusConnection* marking, GDBusConnection* watching)
 
 BusMonitor::~BusMonitor()
 {
-    g_dbus_connection_close_sync(watching_, nullptr, nullptr);
-    g_object_unref(watching_);
+    g_dbus_connection_close_sync(watching_.get(), nullptr, nullptr);
 }
 
 /// Runs on the thread that reads the connection. A monitor answers nothing of what it sees, so GDBus gets none of it but the reply
@@ -83,7 +80,7 @@ GDBusMessage* BusMonitor::Filter(GDBusConnection* connection, GDBusMessage* mess
 /// What was sent before the marker has been seen when the marker is.
 void BusMonitor::AwaitMarker()
 {
-    g_dbus_connection_emit_signal(marking_, nullptr, "/", kMarker, "Marker", nullptr, nullptr);
+    g_dbus_connection_emit_signal(shared_, nullptr, "/", kMarker, "Marker", nullptr, nullptr);
     std::unique_lock<std::mutex> lock(seen.mutex);
     if (!seen.marked.wait_for(lock, std::chrono::seconds(30), [] { return seen.isMarked; }))
         throw std::runtime_error("the monitor sees nothing");

@@ -1,23 +1,20 @@
 #ifndef KIV_BENCH_BUSMONITOR_H
 #define KIV_BENCH_BUSMONITOR_H
 
-#include <gio/gio.h>
+#include "PrivateSystemBus.h"
 
 #include <functional>
-#include <memory>
 #include <string>
 #include <vector>
 
 namespace kiv::bench
 {
 
-/// Sees every message that goes over a bus, as long as it lives. One at a time.
+/// Sees every message that goes over the bus, as long as it lives. One at a time.
 class BusMonitor
 {
 public:
-    /// @param marking   the connection whose messages are in question: a mark that is sent over it tells where they end
-    /// @param watching  one that nobody else uses, kept and closed at the end
-    BusMonitor(GDBusConnection* marking, GDBusConnection* watching);
+    explicit BusMonitor(const PrivateSystemBus& bus);
     BusMonitor(const BusMonitor&) = delete;
     BusMonitor& operator=(const BusMonitor&) = delete;
     ~BusMonitor();
@@ -29,8 +26,8 @@ private:
     static GDBusMessage* Filter(GDBusConnection* connection, GDBusMessage* message, gboolean incoming, gpointer);
     void AwaitMarker();
 
-    GDBusConnection* marking_;
-    GDBusConnection* watching_;
+    GDBusConnection* shared_; ///< whose messages are in question: a mark that is sent over it tells where they end
+    Connection watching_;
 };
 
 } // namespace kiv::bench

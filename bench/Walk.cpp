@@ -16,7 +16,7 @@ void CompareMessages(Table& table, const PrivateSystemBus& bus, const std::strin
 {
     if (!table.Wants(item))
         return;
-    BusMonitor monitor(bus.Shared(), bus.Connect().get());
+    BusMonitor monitor(bus);
     std::vector<std::string> ours = monitor.During(walk.library), theirs = monitor.During(walk.bare);
     if (walk.order == Order::Any)
     {

@@ -38,12 +38,12 @@ public:
 private:
     static std::string Text(const sim::LogLine& line)
     {
-        constexpr auto kForm = R"(\A([EI])2 KIV_AGENT ([^:]+): (\w+)\([1-9]\d*\) > \[\*\1(?:rror|nfo)\*\] (.*)\n\z)";
+        constexpr auto kForm = R"(\A((.)\w+) 2 KIV_AGENT ([^:]+): (\w+)\([1-9]\d*\) > \[\*\1\*\] (.*)\n\z)";
         static GRegex* const form =
             g_regex_new(kForm, GRegexCompileFlags(G_REGEX_RAW | G_REGEX_DOTALL | G_REGEX_OPTIMIZE), GRegexMatchFlags(0), nullptr);
-        const char letter = line.priority == DLOG_ERROR ? 'E' : line.priority == DLOG_INFO ? 'I' : '?';
-        const std::string whole = letter + std::to_string(line.id) + ' ' + line.tag + ' ' + line.text;
-        g_autofree char* text = g_regex_replace(form, whole.c_str(), -1, 0, R"(\1 \2 \3 > \4)", GRegexMatchFlags(0), nullptr);
+        const std::string level = line.priority == DLOG_ERROR ? "Error " : line.priority == DLOG_INFO ? "Info " : "? ";
+        const std::string whole = level + std::to_string(line.id) + ' ' + line.tag + ' ' + line.text;
+        g_autofree char* text = g_regex_replace(form, whole.c_str(), -1, 0, R"(\2 \3 \4 > \5)", GRegexMatchFlags(0), nullptr);
         return whole == text ? "bad line: " + whole : text;
     }
 };
