@@ -2,7 +2,7 @@
 
 #include "BusInterfaces.h"
 
-#include <SimulatedDevice.h>
+#include <DeviceControl.h>
 
 namespace kiv
 {
@@ -15,9 +15,9 @@ BoardDaemon::BoardDaemon(const std::string& serial)
 
 std::string BoardDaemon::DeviceSerial()
 {
-    if (const auto serial = sim::GetDevice().serial)
+    if (const auto serial = platform::GetDevice().serial)
         return *serial;
-    const std::string trouble = sim::DeviceTrouble();
+    const std::string trouble = platform::DeviceTrouble();
     throw std::runtime_error(trouble.empty() ? "the device in use has no serial number; give one with --serial" : trouble);
 }
 

@@ -165,8 +165,8 @@ TEST_F(Notification, GoesToWhoOwnsTheNameWhenItsRecordIsReached)
     Peer before(bus, kName), after(bus);
     store.records.assign(3, Record(before));
     int record = 0;
-    kiv::sim::SetLogSink(
-        [&](const kiv::sim::LogLine& line)
+    kiv::platform::SetLogSink(
+        [&](const kiv::platform::LogLine& line)
         {
             record += line.text.find("] interface: ") != std::string::npos;
             if (record == 2)
@@ -175,7 +175,7 @@ TEST_F(Notification, GoesToWhoOwnsTheNameWhenItsRecordIsReached)
                 after.Close();
         });
     NotifyStatus();
-    kiv::sim::SetLogSink(nullptr);
+    kiv::platform::SetLogSink(nullptr);
     EXPECT_THAT(before.Calls(), ElementsAre(Status("7, 'on'")));
     EXPECT_EQ(before.Calls(), after.Calls());
     EXPECT_THAT(log.TakeErrors(), ElementsAre(StatusError("no call result: ")));

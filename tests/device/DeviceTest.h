@@ -5,37 +5,37 @@
 #include "support/Texts.h"
 
 #include <DASystem.h>
-#include <SimulatedDevice.h>
+#include <DeviceControl.h>
 
 namespace kiv::test
 {
 
-using sim::Call;
-using sim::Device;
-using sim::kEveryCall;
-using sim::kNoSlot;
-using sim::Leavings;
+using platform::Call;
+using platform::Device;
+using platform::kEveryCall;
+using platform::kNoSlot;
+using platform::Leavings;
 
 /// The facade over a device with two SIMs.
 struct DeviceTest : testing::Test
 {
     DeviceTest()
     {
-        sim::ResetDevice();
-        EXPECT_EQ("", sim::UseProfile("dual"));
-        sim::StartJournal();
+        platform::ResetDevice();
+        EXPECT_EQ("", platform::UseProfile("dual"));
+        platform::StartJournal();
     }
-    ~DeviceTest() override { sim::ResetDevice(); }
+    ~DeviceTest() override { platform::ResetDevice(); }
 
     /// Changes one value of the device.
     template <class Value, class Given>
     static void Set(Value Device::*fact, Given value)
     {
-        sim::ChangeDevice([&](Device& device) { device.*fact = value; });
+        platform::ChangeDevice([&](Device& device) { device.*fact = value; });
     }
 
     /// How many calls were made since the last time.
-    static std::size_t TakeCalls() { return sim::TakeJournal().size(); }
+    static std::size_t TakeCalls() { return platform::TakeJournal().size(); }
 
     DASystem& facade = *DASystem::GetInstance();
     LogCapture log;

@@ -45,7 +45,7 @@ TEST_F(ConnectionTest, IsUpWhenOneOfTheSelectedIsAndAllOfThemAreAsked)
 
 TEST_F(ConnectionTest, ListenerHearsOfFiveChangesWhileItIsRegisteredWhateverFails)
 {
-    const Device before = kiv::sim::GetDevice();
+    const Device before = kiv::platform::GetDevice();
     Device after = before;
     after.wifiDeviceState = WIFI_DEVICE_STATE_DEACTIVATED;
     after.wifiConnectionState = WIFI_CONNECTION_STATE_CONNECTED;
@@ -55,7 +55,7 @@ TEST_F(ConnectionTest, ListenerHearsOfFiveChangesWhileItIsRegisteredWhateverFail
     for (const Call call : {Call::wifi_initialize, Call::wifi_set_device_state_changed_cb, Call::runtime_info_set_changed_cb,
              Call::wifi_set_connection_state_changed_cb, Call::wifi_unset_device_state_changed_cb,
              Call::wifi_unset_connection_state_changed_cb, Call::runtime_info_unset_changed_cb})
-        kiv::sim::FailCall(call, -1, kEveryCall, kNoSlot, Leavings::kItsResults);
+        kiv::platform::FailCall(call, -1, kEveryCall, kNoSlot, Leavings::kItsResults);
 
     facade.SetConnectionEventListener(&listener, &first);
     EXPECT_CALL(listener, OnWifiDeviceStateChanged(WIFI_DEVICE_STATE_DEACTIVATED, &first));
@@ -63,7 +63,7 @@ TEST_F(ConnectionTest, ListenerHearsOfFiveChangesWhileItIsRegisteredWhateverFail
     EXPECT_CALL(listener, OnFlightModeChanged(true, &first));
     EXPECT_CALL(listener, OnPacketDataChanged(false, &first));
     EXPECT_CALL(listener, OnWifiConnectedChanged(true, &first));
-    kiv::sim::SetDevice(after);
+    kiv::platform::SetDevice(after);
     EXPECT_EQ(6U + 3U, TakeCalls()) << "the registrations, and one read for each value to tell";
 
     for (int i = 0; i < 2; ++i) // also when there is nothing to unregister
@@ -72,7 +72,7 @@ TEST_F(ConnectionTest, ListenerHearsOfFiveChangesWhileItIsRegisteredWhateverFail
         EXPECT_EQ(6U, TakeCalls());
     }
     C::__pListener = &listener;
-    kiv::sim::SetDevice(before); // would be told, if anything were still registered
+    kiv::platform::SetDevice(before); // would be told, if anything were still registered
 }
 
 TEST_F(ConnectionTest, ListenerAndUserDataAreThoseOfTheLastRegistration)
@@ -101,7 +101,7 @@ TEST_F(ConnectionTest, EntriesTellNothingWithoutAListenerForAnotherKeyOrWhenTheV
     for (const int key : {10, 2, -1})
         change(key);
     for (const Call read : {Call::runtime_info_get_value_bool, Call::runtime_info_get_value_int})
-        kiv::sim::FailCall(read, -1);
+        kiv::platform::FailCall(read, -1);
     for (const int key : {1, 9, 0})
         change(key);
     EXPECT_CALL(listener, OnWifiConnectionStateChanged(WIFI_CONNECTION_STATE_FAILURE, &second, &first));

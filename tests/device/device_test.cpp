@@ -16,7 +16,7 @@ TEST_F(DeviceFacts, ThatAreTextsAreNullWhereThePlatformSucceedsWithoutOne)
 {
     for (const Call call : {Call::system_settings_get_value_string, Call::system_info_get_platform_string,
              Call::package_info_get_version, Call::telephony_modem_get_imei})
-        kiv::sim::FailCall(call, 0);
+        kiv::platform::FailCall(call, 0);
     for (const auto read : {&DASystem::GetDeviceName, &DASystem::GetPlatformName, &DASystem::GetSWVersion, &DASystem::GetModelName,
              &DASystem::GetTizenIdN, &DASystem::GetIMEI})
         EXPECT_EQ("null", Out([&](char** out) { EXPECT_EQ(0, std::invoke(read, facade, out)); }));
@@ -62,17 +62,17 @@ TEST_F(DeviceFacts, CompareFreeStorageStrictlyInMebibytes)
                 log.Take(), ElementsAre("E DASystem.cpp IsSystemMemoryAvailable > Total mem under " + std::to_string(required)));
         }
     }
-    kiv::sim::FailCall(Call::storage_get_internal_memory_size64, 1, kEveryCall, kNoSlot, Leavings::kItsResults);
+    kiv::platform::FailCall(Call::storage_get_internal_memory_size64, 1, kEveryCall, kNoSlot, Leavings::kItsResults);
     EXPECT_TRUE(facade.IsSystemMemoryAvailable(-1.0)) << "what is not negative is a success";
 }
 
 TEST_F(DeviceFacts, HaveTheImeiOfTheFirstModemThatAnswersElseTheOffsetFromUtcFilledUpWithZeros)
 {
     const auto imei = [&] { return Out([&](char** out) { EXPECT_EQ(0, facade.GetIMEI(out)); }); };
-    kiv::sim::FailCall(Call::telephony_modem_get_imei, -1, kEveryCall, 0);
+    kiv::platform::FailCall(Call::telephony_modem_get_imei, -1, kEveryCall, 0);
     EXPECT_EQ("490154203237518", imei());
 
-    kiv::sim::FailCall(Call::telephony_modem_get_imei, -1);
+    kiv::platform::FailCall(Call::telephony_modem_get_imei, -1);
     const std::pair<const char*, const char*> zones[] = {{"EAST-9", "324000000000000"}, {"WEST5", "-18000000000000"},
         {"STD0DST-2,0/0,J365/25", "720000000000000"}, // summer all the year
         {"UTC", "000000000000000"}};
@@ -84,7 +84,7 @@ TEST_F(DeviceFacts, HaveTheImeiOfTheFirstModemThatAnswersElseTheOffsetFromUtcFil
     }
     EXPECT_THAT(log.Take(), IsEmpty());
 
-    kiv::sim::FailCall(Call::telephony_init, 0); // a list of no handles
+    kiv::platform::FailCall(Call::telephony_init, 0); // a list of no handles
     EXPECT_EQ("000000000000000", imei());
     EXPECT_THAT(log.Take(), ElementsAre("E DASimManager.cpp SuccessToInitTelephonyHandle > telephony_init Failed.",
                                 "E DASystem.cpp GetIMEI > telephony_init Failed. Start to get IMEI from current time"));

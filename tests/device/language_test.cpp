@@ -45,7 +45,7 @@ TEST_F(Language, IsThePartOfTheSettingBeforeTheFirstUnderscore)
         Set(&Device::language, setting);
         Expect(plain, iso);
     }
-    kiv::sim::FailCall(Call::system_settings_get_value_string, 0);
+    kiv::platform::FailCall(Call::system_settings_get_value_string, 0);
     Expect("EN", "eng"); // success without a text
 }
 

@@ -1,6 +1,6 @@
 #include "Fuzz.h"
 
-#include <SimulatedLog.h>
+#include <LogControl.h>
 
 #include <glib.h>
 
@@ -32,7 +32,7 @@ extern "C" int LLVMFuzzerInitialize(int*, char***)
 {
     g_log_set_always_fatal(static_cast<GLogLevelFlags>(G_LOG_LEVEL_ERROR | G_LOG_LEVEL_CRITICAL | G_LOG_LEVEL_WARNING));
     std::signal(SIGTRAP, [](int) { std::abort(); }); // GLib's way to end the process; libFuzzer keeps the input for the other
-    kiv::sim::SetLogSink([](const auto&) {});        // every line is formatted
+    kiv::platform::SetLogSink([](const auto&) {});   // every line is formatted
     return std::atexit([] { std::fprintf(stderr, "fed %zu\n", kiv::fuzz::fed); });
 }
 

@@ -3,7 +3,7 @@
 #include "support/Texts.h"
 
 #include <DASystem.h>
-#include <SimulatedDevice.h>
+#include <DeviceControl.h>
 
 using namespace kiv::fuzz;
 using namespace kiv::test;
@@ -12,7 +12,7 @@ void Try(std::string_view input)
 {
     static const Column isoCodes = Find(Read("language.tsv"), 1, 0);
     const std::string setting = std::string(input).c_str(); // the platform's texts end at a null
-    kiv::sim::ChangeDevice([&](auto& device) { device.language = setting; });
+    kiv::platform::ChangeDevice([&](auto& device) { device.language = setting; });
 
     g_autofree char* language = g_ascii_strup(setting.c_str(), static_cast<gssize>(setting.find('_')));
     const auto listed = isoCodes.find(language);

@@ -11,7 +11,7 @@ using namespace kiv::fuzz;
 namespace
 {
 
-void AskDevice(const kiv::sim::Device& device)
+void AskDevice(const kiv::platform::Device& device)
 {
     DASystem& facade = *DASystem::GetInstance();
     std::vector<char*> texts(1);
@@ -24,7 +24,7 @@ void AskDevice(const kiv::sim::Device& device)
         "a SIM has one IMSI at most");
     for (char* const text : texts)
         std::free(text);
-    Require(kiv::sim::OpenHandles().empty() && kiv::sim::TakeMisuses().empty(), "each handle is closed once");
+    Require(kiv::platform::OpenHandles().empty() && kiv::platform::TakeMisuses().empty(), "each handle is closed once");
 }
 
 } // namespace
@@ -35,13 +35,13 @@ try
     Feed(1);
     const std::size_t mark = input.find("\n%%\n");
     const std::string text(input.substr(0, mark));
-    const kiv::sim::Device device = kiv::sim::ReadDevice(text, "input");
-    kiv::sim::SetDevice(device);
+    const kiv::platform::Device device = kiv::platform::ReadDevice(text, "input");
+    kiv::platform::SetDevice(device);
     AskDevice(device);
     if (mark != std::string_view::npos)
-        kiv::sim::ReadDevice(kiv::sim::ChangeText(text, "input", Split(input.substr(mark + 4), '\n')), "input");
+        kiv::platform::ReadDevice(kiv::platform::ChangeText(text, "input", Split(input.substr(mark + 4), '\n')), "input");
 }
-catch (const kiv::sim::DeviceFileError& trouble)
+catch (const kiv::platform::DeviceFileError& trouble)
 {
     Require(std::string_view(trouble.what()).rfind("input: ", 0) == 0, "trouble names the file");
 }

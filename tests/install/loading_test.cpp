@@ -1,8 +1,8 @@
 // An agent that opens the library while it runs, and closes it with changes and deliveries still to come.
 #include "bus/BusTest.h"
 
+#include <DeviceControl.h>
 #include <IDAConnectionStateListener.h>
-#include <SimulatedDevice.h>
 #include <dlfcn.h>
 
 namespace
@@ -49,11 +49,11 @@ TEST(Library, ThatIsClosedWithAListenerAndAPushUnderWayStaysForThem)
             library, "_ZN13DADBusManager18DeliverPushMessageEPKcS1_S1_x")(manager, "7", "data", "message", i);
         ASSERT_EQ(0, dlclose(library));
 
-        kiv::sim::ChangeDevice([](kiv::sim::Device& device) { device.flightMode = !device.flightMode; });
+        kiv::platform::ChangeDevice([](kiv::platform::Device& device) { device.flightMode = !device.flightMode; });
         EXPECT_EQ(i, listener.heard);
         IterateUntil([&] { return client.Calls().size() == i; });
     }
-    kiv::sim::ResetDevice();
+    kiv::platform::ResetDevice();
 }
 
 } // namespace

@@ -1,13 +1,13 @@
 #include "support/Deliveries.h"
 #include "support/Texts.h"
 
+#include <DeviceControl.h>
 #include <ITapiSim.h>
-#include <SimulatedDevice.h>
-#include <SimulatedLog.h>
+#include <LogControl.h>
 #include <runtime_info.h>
 #include <telephony.h>
 
-using namespace kiv::sim;
+using namespace kiv::platform;
 using kiv::test::IterateUntil;
 using testing::StartsWith;
 

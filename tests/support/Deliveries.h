@@ -3,7 +3,7 @@
 
 #include "support/Test.h"
 
-#include <SimulatedLog.h>
+#include <LogControl.h>
 
 namespace kiv::test
 {
@@ -27,8 +27,8 @@ class Deliveries
 public:
     Deliveries()
     {
-        sim::SetLogSink(
-            [this](const sim::LogLine& line)
+        platform::SetLogSink(
+            [this](const platform::LogLine& line)
             {
                 const auto has = [&](const char* text) { return line.text.find(text) != std::string::npos; };
                 open_ += has("DeliverPushMessage(") && has("] interface: ");
@@ -38,7 +38,7 @@ public:
     }
     Deliveries(const Deliveries&) = delete;
     Deliveries& operator=(const Deliveries&) = delete;
-    ~Deliveries() { sim::SetLogSink(nullptr); }
+    ~Deliveries() { platform::SetLogSink(nullptr); }
 
     /// Whether every one that was started has ended.
     bool HaveEnded() const { return open_ == 0; }

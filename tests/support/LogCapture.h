@@ -3,7 +3,7 @@
 
 #include "support/Test.h"
 
-#include <SimulatedLog.h>
+#include <LogControl.h>
 #include <dlog.h>
 
 namespace kiv::test
@@ -13,10 +13,10 @@ namespace kiv::test
 class LogCapture
 {
 public:
-    LogCapture() { sim::StartLog(); }
+    LogCapture() { platform::StartLog(); }
     LogCapture(const LogCapture&) = delete;
     LogCapture& operator=(const LogCapture&) = delete;
-    ~LogCapture() { sim::StopLog(); }
+    ~LogCapture() { platform::StopLog(); }
 
     /// What was logged since the last Take, a text a line: "E DASimManager.cpp IsValidMcc > mcc is invalid", as far as it begins
     /// like that. A line that is not in the form of the library's lines is handed out behind "bad line: ", which no expectation
@@ -24,7 +24,7 @@ public:
     static std::vector<std::string> Take(const std::string& prefix = "")
     {
         std::vector<std::string> texts;
-        for (const auto& line : sim::TakeLog())
+        for (const auto& line : platform::TakeLog())
         {
             std::string text = Text(line);
             if (text.rfind(prefix, 0) == 0 || text.rfind("bad", 0) == 0)
@@ -36,7 +36,7 @@ public:
     static std::vector<std::string> TakeErrors() { return Take("E "); }
 
 private:
-    static std::string Text(const sim::LogLine& line)
+    static std::string Text(const platform::LogLine& line)
     {
         constexpr auto kForm = R"(\A((.)\w+) 2 KIV_AGENT ([^:]+): (\w+)\([1-9]\d*\) > \[\*\1\*\] (.*)\n\z)";
         static GRegex* const form =

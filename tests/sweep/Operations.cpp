@@ -252,7 +252,7 @@ std::string Listen(Session&)
     Listener listener;
     S::GetInstance()->SetConnectionEventListener(&listener, nullptr);
     for (const bool isOn : {false, true})
-        sim::ChangeDevice([&](sim::Device& device) { device.packetData = isOn; });
+        platform::ChangeDevice([&](platform::Device& device) { device.packetData = isOn; });
     C::wifi_device_state_changed(WIFI_DEVICE_STATE_ACTIVATED, nullptr);
     C::wifi_connection_state_changed(WIFI_CONNECTION_STATE_CONNECTED, nullptr, nullptr);
     for (const auto key :
@@ -587,16 +587,16 @@ World::World()
 
 World::~World()
 {
-    sim::ResetDevice();
+    platform::ResetDevice();
     std::filesystem::remove_all(directory);
 }
 
 void World::Use(const std::string& profile)
 {
-    sim::ResetDevice();
-    sim::UseProfile(profile);
-    sim::ChangeDevice(
-        [](sim::Device& device)
+    platform::ResetDevice();
+    platform::UseProfile(profile);
+    platform::ChangeDevice(
+        [](platform::Device& device)
         {
             device.currentTime = 1'700'000'000;
             device.flightMode = device.dataRoaming = true;

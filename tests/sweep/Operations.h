@@ -4,13 +4,13 @@
 #include "support/Deliveries.h"
 #include "support/Peer.h"
 
-#include <SimulatedDevice.h>
+#include <DeviceControl.h>
 #include <telephony.h>
 
 namespace kiv::test
 {
 
-using sim::Call;
+using platform::Call;
 using Calls = std::vector<Call>;
 
 /// What an operation came to: its result with what it wrote, then each line that it logged, as LogCapture tells it.

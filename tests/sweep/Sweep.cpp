@@ -46,13 +46,13 @@ Sweep::Sweep()
 
 Sweep::~Sweep()
 {
-    sim::ResetDevice();
+    platform::ResetDevice();
 }
 
 std::vector<std::string> Sweep::Devices()
 {
     std::vector<std::string> names{kManySlots};
-    for (const sim::Profile& profile : sim::ListProfiles())
+    for (const platform::Profile& profile : platform::ListProfiles())
         names.push_back(profile.name);
     return names;
 }
@@ -60,7 +60,7 @@ std::vector<std::string> Sweep::Devices()
 void Sweep::Use(const std::string& name)
 {
     World::Use(name == kManySlots ? "dual" : name);
-    device = sim::GetDevice();
+    device = platform::GetDevice();
     while (name == kManySlots && device.slots.size() < (IsLong() ? 32 : 20))
     {
         device.slots.push_back(device.slots[device.slots.size() % 2]);
@@ -78,7 +78,7 @@ const Operation& Sweep::Find(const std::string& name)
 
 Story Sweep::Try(const Operation& operation, const std::function<void()>& arm, const std::function<void()>& disarm)
 {
-    sim::SetDevice(device);
+    platform::SetDevice(device);
     pauses = 0;
     Story story;
     {
@@ -92,8 +92,8 @@ Story Sweep::Try(const Operation& operation, const std::function<void()>& arm, c
     }
     if (operation.kind == Kind::kPush)
         TheWorld().deliveries.Settle();
-    EXPECT_THAT(sim::OpenHandles(), testing::IsEmpty());
-    EXPECT_THAT(sim::TakeMisuses(), testing::IsEmpty());
+    EXPECT_THAT(platform::OpenHandles(), testing::IsEmpty());
+    EXPECT_THAT(platform::TakeMisuses(), testing::IsEmpty());
     EXPECT_STREQ("", heldLock);
     return story;
 }
@@ -113,7 +113,7 @@ testing::AssertionResult Sweep::MayBe(const Operation& operation, const Story& s
     auto words = Words(untouched[0] + " before true false"), told = Words(story[0]);
     for (int number = 0; number <= 32; ++number) // a status, or how many texts came out
         words.insert(std::to_string(number));
-    for (const sim::SimSlot& slot : device.slots)
+    for (const platform::SimSlot& slot : device.slots)
     {
         const std::string mcc = slot.mcc.value_or(""), mnc = slot.mnc.value_or("");
         words.insert({mcc, mnc, mcc + mnc + slot.msin.value_or(""), slot.number.value_or(""), slot.imei.value_or("")});

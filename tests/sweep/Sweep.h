@@ -34,13 +34,13 @@ struct Sweep : testing::Test
     /// Runs an operation between two actions; nothing may be open and no lock held in the end.
     Story Try(
         const Operation& operation, const std::function<void()>& arm = [] {},
-        const std::function<void()>& disarm = sim::ClearFaults);
+        const std::function<void()>& disarm = platform::ClearFaults);
 
     /// Whether an operation that goes on after a failure may come to this: to one of its failures, or to an answer made of nothing
     /// but what it says untouched and what the SIMs hold, in lines that are all its own.
     testing::AssertionResult MayBe(const Operation& operation, const Story& story, const Story& untouched) const;
 
-    sim::Device device;
+    platform::Device device;
     LogCapture log;
 };
 

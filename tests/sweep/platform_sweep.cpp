@@ -7,8 +7,8 @@ namespace
 {
 
 using namespace kiv::test;
-using kiv::sim::Leavings;
-namespace sim = kiv::sim;
+using kiv::platform::Leavings;
+namespace platform = kiv::platform;
 
 constexpr int kCode = -77;
 
@@ -61,26 +61,27 @@ struct PlatformSweep : Sweep
         failed.clear();
         const auto onCall = [&](Call call, int)
         {
-            EXPECT_STREQ(operation.IsLockedAt(call) ? kSimAccess : "", heldLock) << operation.name << ": " << sim::NameOf(call);
+            EXPECT_STREQ(operation.IsLockedAt(call) ? kSimAccess : "", heldLock)
+                << operation.name << ": " << platform::NameOf(call);
             made.push_back(call);
-            sim::ClearFaults();
+            platform::ClearFaults();
             constexpr int kPatience = 120; // who waits for a SIM does so without a bound
             if (pauses >= kPatience)
                 return "";
             if (made.size() >= first && made.size() <= last)
             {
                 failed.push_back(call);
-                sim::FailCall(call, kCode, sim::kEveryCall, sim::kNoSlot, Possible(call, leavings));
+                platform::FailCall(call, kCode, platform::kEveryCall, platform::kNoSlot, Possible(call, leavings));
             }
             return "";
         };
         const auto disarm = []
         {
-            sim::SetCallHook(nullptr);
-            sim::ClearFaults();
+            platform::SetCallHook(nullptr);
+            platform::ClearFaults();
         };
         return Try(
-            operation, [&] { sim::SetCallHook(onCall); }, disarm);
+            operation, [&] { platform::SetCallHook(onCall); }, disarm);
     }
 
     Calls made, failed;
@@ -131,7 +132,7 @@ TEST_F(PlatformSweep, GivesFailureResultsAndReleasesAllWhicheverCallFails)
                     ++pairs;
                     if (operation.kind == Kind::kSingle)
                         EXPECT_EQ(Expected(operation, failed, leavings, untouched), story)
-                            << operation.name << " with " << failed.size() << " failing from " << sim::NameOf(failed.at(0));
+                            << operation.name << " with " << failed.size() << " failing from " << platform::NameOf(failed.at(0));
                     else
                         EXPECT_TRUE(MayBe(operation, story, untouched)) << "call " << i / 2 + 1;
                     if (failed.size() < length)

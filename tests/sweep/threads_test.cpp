@@ -6,7 +6,7 @@ namespace
 {
 
 using namespace kiv::test;
-namespace sim = kiv::sim;
+namespace platform = kiv::platform;
 
 void RunAll(const std::vector<const Operation*>& operations, std::size_t start, int rounds)
 {
@@ -36,8 +36,8 @@ TEST(Threads, DoNotDisturbEachOther)
                 continue;
     }
     world.deliveries.Settle();
-    EXPECT_EQ(std::vector<std::string>(), sim::OpenHandles());
-    EXPECT_EQ(std::vector<std::string>(), sim::TakeMisuses());
+    EXPECT_EQ(std::vector<std::string>(), platform::OpenHandles());
+    EXPECT_EQ(std::vector<std::string>(), platform::TakeMisuses());
 }
 
 } // namespace

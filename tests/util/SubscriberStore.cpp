@@ -2,7 +2,7 @@
 
 #include <DASubscribeDataManager.h>
 #include <DASubscriberStore.h>
-#include <SimulatedLog.h>
+#include <LogControl.h>
 
 #include <sys/wait.h>
 #include <unistd.h>
@@ -31,13 +31,13 @@ struct SubscriberStore : testing::Test
     /// The bus names that are appended, a blank behind each, and what is logged meanwhile.
     std::string Find(const char* kind, const char* key)
     {
-        kiv::sim::StartLog();
+        kiv::platform::StartLog();
         std::list<_SubscriberInfo> found(1);
         std::string text = DASubscribeDataManager().GetSubscriber(kind, key, found) ? "" : "failed: ";
         found.pop_front();
         for (const _SubscriberInfo& subscriber : found)
             text += subscriber.busname + ' ';
-        for (const auto& line : kiv::sim::TakeLog())
+        for (const auto& line : kiv::platform::TakeLog())
             text += std::to_string(line.priority) + ' ' + line.tag + ' ' + line.text;
         return text;
     }

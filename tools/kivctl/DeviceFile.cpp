@@ -1,7 +1,7 @@
 #include "Nearest.h"
 #include "Verbs.h"
 
-#include <SimulatedDevice.h>
+#include <DeviceControl.h>
 
 #include <algorithm>
 
@@ -40,7 +40,7 @@ std::string Hint(const std::vector<std::string>& assignments)
 std::vector<std::string> DeviceFileKeys()
 {
     std::vector<std::string> keys;
-    for (const kiv::sim::FieldInfo& field : kiv::sim::ListFields())
+    for (const kiv::platform::FieldInfo& field : kiv::platform::ListFields())
         keys.push_back(field.group + "." + field.key);
     return keys;
 }
@@ -53,7 +53,7 @@ Exit SetInDeviceFile(const std::vector<std::string>& assignments, const Command&
         throw Failure(
             Exit::Usage, "a device that comes from a profile can not be changed; name a file with --profile, such as ./my.profile");
     }
-    const std::string trouble = kiv::sim::SetInDeviceFile(file, assignments);
+    const std::string trouble = kiv::platform::SetInDeviceFile(file, assignments);
     if (!trouble.empty())
         throw Failure(Exit::BadDevice, trouble + Hint(assignments));
     return Exit::Done;
@@ -62,7 +62,7 @@ Exit SetInDeviceFile(const std::vector<std::string>& assignments, const Command&
 Exit ShowDeviceKeys(const Command& command)
 {
     std::vector<Record> rows;
-    for (const kiv::sim::FieldInfo& field : kiv::sim::ListFields())
+    for (const kiv::platform::FieldInfo& field : kiv::platform::ListFields())
     {
         rows.push_back({{"key", field.group + "." + field.key}, {"values", field.values}, {"default", field.fallback},
             {"meaning", field.meaning}});
@@ -74,7 +74,7 @@ Exit ShowDeviceKeys(const Command& command)
 Exit ShowProfiles(const Command& command)
 {
     std::vector<Record> rows;
-    for (const kiv::sim::Profile& profile : kiv::sim::ListProfiles())
+    for (const kiv::platform::Profile& profile : kiv::platform::ListProfiles())
         rows.push_back({{"name", profile.name}, {"description", profile.description}});
     PrintTable(rows, command.form);
     return Exit::Done;

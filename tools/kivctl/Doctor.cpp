@@ -6,8 +6,8 @@
 #include <DADBusManager.h>
 #include <DASubscriberStore.h>
 #include <DASystem.h>
+#include <DeviceControl.h>
 #include <ServiceManager.h>
-#include <SimulatedDevice.h>
 #include <telephony.h>
 
 #include <dlfcn.h>
@@ -81,7 +81,7 @@ Finding LookAtDevice(const Command& command)
         return {trouble, "name another with --profile or KIV_PROFILE; kivctl device keys lists what a file may hold"};
     const std::string device = DeviceAskedFor(command);
     return {(IsProfileName(device) ? "profile " : "file ") + (device.empty() ? "dual" : device) + ", " +
-            kiv::sim::GetDevice().description};
+            kiv::platform::GetDevice().description};
 }
 
 /// The shared library that holds a function, its version in its real name.

@@ -2,7 +2,7 @@
 
 #include "Nearest.h"
 
-#include <SimulatedDevice.h>
+#include <DeviceControl.h>
 
 #include <unistd.h>
 
@@ -64,7 +64,8 @@ std::string DeviceAskedFor(const Command& command)
 
 std::string UseDevice(const Command& command)
 {
-    const std::string trouble = command.profile.empty() ? kiv::sim::DeviceTrouble() : kiv::sim::UseProfile(command.profile);
+    const std::string trouble =
+        command.profile.empty() ? kiv::platform::DeviceTrouble() : kiv::platform::UseProfile(command.profile);
     const std::string device = DeviceAskedFor(command);
     const bool isFile = device.find('/') != device.npos || access(device.c_str(), F_OK) == 0;
     return trouble.empty() || isFile ? trouble : trouble + DidYouMean(device, ProfileNames());
@@ -80,7 +81,7 @@ void RequireDevice(const Command& command)
 std::vector<std::string> ProfileNames()
 {
     std::vector<std::string> names;
-    for (const kiv::sim::Profile& profile : kiv::sim::ListProfiles())
+    for (const kiv::platform::Profile& profile : kiv::platform::ListProfiles())
         names.push_back(profile.name);
     return names;
 }

@@ -2,7 +2,7 @@
 
 #include "Kivctl.h"
 
-#include <SimulatedLog.h>
+#include <LogControl.h>
 #include <dlog.h>
 
 #include <optional>
@@ -36,8 +36,8 @@ std::optional<LibraryLine> Parse(std::string_view text)
 
 LibraryLog::LibraryLog(Listener listener) : listener_(std::move(listener))
 {
-    kiv::sim::SetLogSink(
-        [this](const kiv::sim::LogLine& line)
+    kiv::platform::SetLogSink(
+        [this](const kiv::platform::LogLine& line)
         {
             const bool isError = line.priority >= DLOG_ERROR;
             if (line.tag == "KIV_UTIL" && isError)
@@ -54,7 +54,7 @@ LibraryLog::LibraryLog(Listener listener) : listener_(std::move(listener))
 
 LibraryLog::~LibraryLog()
 {
-    kiv::sim::SetLogSink(nullptr);
+    kiv::platform::SetLogSink(nullptr);
 }
 
 void LibraryLog::RequireStore() const

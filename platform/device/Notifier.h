@@ -1,0 +1,72 @@
+/// @file
+/// Who is told of which change of the device.
+#ifndef KIV_DEVICE_NOTIFIER_H
+#define KIV_DEVICE_NOTIFIER_H
+
+#include "DeviceControl.h"
+
+#include <array>
+#include <condition_variable>
+#include <functional>
+#include <memory>
+#include <mutex>
+#include <thread>
+#include <vector>
+
+namespace kiv::platform
+{
+
+/// What one can register for.
+enum class Topic
+{
+    kWifiDevice,
+    kWifiConnection,
+    kFlightMode,
+    kWifiStatus,
+    kPacketData,
+    kDataRoaming
+};
+constexpr std::size_t kTopicCount = 6;
+
+struct Change
+{
+    Topic topic;
+    int value;
+};
+using Changes = std::vector<Change>;
+
+/// The topics that differ between two devices, with what `after` has.
+Changes Differences(const Device& before, const Device& after);
+
+class Notifier
+{
+public:
+    using Callback = std::function<void(int value)>;
+
+    /// A second registration for a topic takes the place of the first.
+    void Add(Topic topic, Callback callback);
+
+    /// Whether there was a registration.
+    bool Remove(Topic topic);
+    void RemoveAll();
+    bool HasAny();
+
+    /// Calls who is registered at the moment of each call, with no lock held.
+    void Deliver(const Changes& changes);
+
+    /// Waits until no callback of the topic runs on another thread; not within a callback, which could wait for itself.
+    void AwaitEnd(Topic topic);
+
+    /// Whether this thread is within a callback.
+    static bool IsDelivering();
+
+private:
+    std::mutex mutex_;
+    std::condition_variable ended_;
+    std::array<std::shared_ptr<const Callback>, kTopicCount> callbacks_;
+    std::array<int, kTopicCount> running_{};
+};
+
+} // namespace kiv::platform
+
+#endif

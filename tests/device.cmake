@@ -1,1 +1,0 @@
-kiv_test(device_test device/connection_test.cpp device/device_test.cpp device/language_test.cpp)

@@ -1,1 +1,0 @@
-kiv_test(kiv_util_test util/NamedLocks.cpp util/SubscriberStore.cpp)

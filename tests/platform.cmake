@@ -1,1 +1,0 @@
-kiv_test(platform_test platform/platform_test.cpp)
