@@ -51,22 +51,22 @@ void Set(Change change)
 {
     const Locked calls(TheCalls());
     change(*calls);
-    calls->watched = calls->hook || calls->journaling || !calls->faults.empty();
+    calls->watched = calls->hook != nullptr || calls->journaling || !calls->faults.empty();
 }
 
 int SlotOf(const Subject& subject)
 {
     const Locked state(TheState());
-    if (subject.handle)
+    if (subject.handle != nullptr)
         return state->handles.SlotOf(subject.handle);
-    return subject.cpName && state->Ready() ? state->SlotOf(subject.cpName) : kNoSlot;
+    return subject.cpName != nullptr && state->Ready() ? state->SlotOf(subject.cpName) : kNoSlot;
 }
 
 std::string RunHook(Call call, int slot)
 {
     static thread_local bool inHook = false;
     const std::shared_ptr<const CallHook> hook = inHook ? nullptr : Locked(TheCalls())->hook;
-    if (!hook)
+    if (hook == nullptr)
         return {};
 
     struct Inside
@@ -110,7 +110,7 @@ try
     std::string note = RunHook(call, slot);
     const std::optional<Fault> fault = TakeFault(call, slot);
     int result = 0;
-    if (!fault || fault->leavings == Leavings::kItsResults)
+    if (!fault || fault->leavings == Leavings::ItsResults)
         result = Work(work, context);
     if (fault)
         result = fault->code;
@@ -130,7 +130,7 @@ int Register(Call call, std::optional<Topic> topic, bool hasCallback, Notifier::
     const int result = Answer(call, {},
         [&](State& state)
         {
-            const bool isWifi = topic == Topic::kWifiDevice || topic == Topic::kWifiConnection;
+            const bool isWifi = topic == Topic::WifiDevice || topic == Topic::WifiConnection;
             if (isWifi && !state.wifiInitialized)
                 return -EPERM;
             if (!topic || !hasCallback)
@@ -160,7 +160,7 @@ void FailCall(Call call, int code, CallNumbers which, int slot, Leavings leaving
 {
     // What a null result would leave behind, nobody could release.
     if (call == Call::tel_init || call == Call::tel_get_cp_name_list || call == Call::vconf_get_str)
-        leavings = Leavings::kNothing;
+        leavings = Leavings::Nothing;
 
     Set([&](Calls& calls) { calls.faults.push_back({call, code, which, slot, leavings, 0}); });
 }

@@ -43,7 +43,7 @@ int AnswerForSlot(Call call, HandleKind kind, const void* handle, Work work) noe
         [&](State& state)
         {
             const OpenHandle* const open = state.handles.Find(kind, handle, call);
-            if (!open)
+            if (open == nullptr)
                 return -EINVAL;
             const auto slot = static_cast<std::size_t>(open->slot);
             return slot < state.device.slots.size() ? work(state.device.slots[slot]) : -ENODEV;
@@ -53,7 +53,7 @@ int AnswerForSlot(Call call, HandleKind kind, const void* handle, Work work) noe
 template <class Out, class Value>
 int Give(Out* out, Value value)
 {
-    if (!out)
+    if (out == nullptr)
         return -EINVAL;
     *out = static_cast<Out>(value);
     return 0;
@@ -62,12 +62,12 @@ int Give(Out* out, Value value)
 /// Gives a copy of the text, made with malloc(); a text that is not there is an error.
 inline int GiveText(char** out, const Text& text)
 {
-    if (!out)
+    if (out == nullptr)
         return -EINVAL;
     if (!text)
         return -ENODATA;
     char* const copy = strdup(text->c_str());
-    if (!copy)
+    if (copy == nullptr)
         return -ENOMEM;
     *out = copy;
     return 0;

@@ -149,14 +149,14 @@ constexpr CallNumbers Only(unsigned number)
 /// What a call that is made to fail leaves behind.
 enum class Leavings
 {
-    kNothing,   ///< the call does nothing: out-parameters stay untouched
-    kItsResults ///< the call does its work, and then reports the code
+    Nothing,   ///< the call does nothing: out-parameters stay untouched
+    ItsResults ///< the call does its work, and then reports the code
 };
 
 /// Makes calls of one function give `code`. A code of 0 with no leavings is a success that brings nothing: an out-parameter
 /// that stays null, a list of no handles. A function that gives a pointer gives null and leaves nothing, whatever the code.
 /// Faults add up; the first armed that hits decides.
-void FailCall(Call call, int code, CallNumbers which = kEveryCall, int slot = kNoSlot, Leavings leavings = Leavings::kNothing);
+void FailCall(Call call, int code, CallNumbers which = kEveryCall, int slot = kNoSlot, Leavings leavings = Leavings::Nothing);
 
 /// Disarms all of them.
 void ClearFaults();

@@ -22,17 +22,17 @@ const char* NameOf(HandleKind kind)
 std::string Place(const void* address)
 {
     Dl_info info{};
-    if (!dladdr(address, &info) || !info.dli_fname)
+    if (dladdr(address, &info) == 0 || info.dli_fname == nullptr)
         return "an unknown place";
 
     const auto offset = static_cast<const char*>(address) - static_cast<const char*>(info.dli_fbase);
     const std::unique_ptr<char, decltype(&g_free)> module(g_path_get_basename(info.dli_fname), g_free);
     const std::unique_ptr<char, decltype(&g_free)> where(
         g_strdup_printf("%s+%#" G_GINT64_MODIFIER "x", module.get(), static_cast<gint64>(offset)), g_free);
-    if (!info.dli_sname)
+    if (info.dli_sname == nullptr)
         return where.get();
     const std::unique_ptr<char, decltype(&free)> plain(abi::__cxa_demangle(info.dli_sname, nullptr, nullptr, nullptr), free);
-    return std::string(where.get()) + " (near " + (plain ? plain.get() : info.dli_sname) + ')';
+    return std::string(where.get()) + " (near " + (plain != nullptr ? plain.get() : info.dli_sname) + ')';
 }
 
 std::string Describe(HandleKind kind, int slot, const Opening& opening)
@@ -76,7 +76,7 @@ bool Handles::Close(HandleKind kind, const void* handle, Call user)
     open_.erase(found);
     closed_[closedCount_++ % closed_.size()] = {handle, kind, owned->slot, owned->opening};
     for (const telephony_h each : owned->list)
-        Close(HandleKind::kTelephony, each, user);
+        Close(HandleKind::Telephony, each, user);
     return true;
 }
 
@@ -90,7 +90,7 @@ std::vector<std::string> Handles::Describe() const
 {
     std::vector<std::string> all;
     for (const auto& [address, handle] : open_)
-        if (handle->kind != HandleKind::kTelephony) // goes with its list
+        if (handle->kind != HandleKind::Telephony) // goes with its list
             all.push_back(platform::Describe(handle->kind, handle->slot, handle->opening));
     return all;
 }
@@ -112,13 +112,13 @@ void Handles::NoteMisuse(HandleKind kind, const void* handle, Call user, const c
     }
 
     const Closed* last = nullptr; // the address may have been several handles
-    for (std::size_t i = closedCount_; i > 0 && closedCount_ - i < closed_.size() && !last; --i)
+    for (std::size_t i = closedCount_; i > 0 && closedCount_ - i < closed_.size() && last == nullptr; --i)
         if (closed_[(i - 1) % closed_.size()].handle == handle)
             last = &closed_[(i - 1) % closed_.size()];
-    if (last && handle)
+    if (last != nullptr && handle != nullptr)
         misuses_.push_back(start + whenClosed + ": " + platform::Describe(last->kind, last->slot, last->opening));
     else
-        misuses_.push_back(start + "needs a " + wanted + ", got " + (handle ? "what never was a handle" : "null"));
+        misuses_.push_back(start + "needs a " + wanted + ", got " + (handle != nullptr ? "what never was a handle" : "null"));
 }
 
 } // namespace kiv::platform

@@ -19,11 +19,11 @@ namespace kiv::platform
 
 enum class HandleKind
 {
-    kHandleList,
-    kTelephony,
-    kTapi,
-    kPackageInfo,
-    kConnection
+    HandleList,
+    Telephony,
+    Tapi,
+    PackageInfo,
+    Connection
 };
 
 /// Who opened a handle.

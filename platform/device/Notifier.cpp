@@ -62,7 +62,7 @@ void Notifier::Deliver(const Changes& changes)
         const auto topic = static_cast<std::size_t>(change.topic);
         std::unique_lock lock(mutex_);
         const std::shared_ptr<const Callback> callback = callbacks_[topic];
-        if (!callback)
+        if (callback == nullptr)
             continue;
         ++running_[topic];
         lock.unlock();

@@ -19,12 +19,12 @@ namespace kiv::platform
 /// What one can register for.
 enum class Topic
 {
-    kWifiDevice,
-    kWifiConnection,
-    kFlightMode,
-    kWifiStatus,
-    kPacketData,
-    kDataRoaming
+    WifiDevice,
+    WifiConnection,
+    FlightMode,
+    WifiStatus,
+    PacketData,
+    DataRoaming
 };
 constexpr std::size_t kTopicCount = 6;
 

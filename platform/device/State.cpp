@@ -125,7 +125,7 @@ bool State::Ready()
     const char* const wish = g_getenv("KIV_PROFILE");
     try
     {
-        Source source = Open(wish && *wish ? wish : kDefaultProfile);
+        Source source = Open(wish != nullptr && *wish != '\0' ? wish : kDefaultProfile);
         path = std::move(source.path);
         text = std::move(source.text);
         device = std::move(source.device);

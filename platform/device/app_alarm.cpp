@@ -11,7 +11,7 @@ PLATFORM_API int alarm_get_current_time(struct tm* date)
     return Answer(Call::alarm_get_current_time, {},
         [&](State& state)
         {
-            if (!date)
+            if (date == nullptr)
                 return -EINVAL;
             const time_t now = state.device.currentTime ? static_cast<time_t>(*state.device.currentTime) : time(nullptr);
             return localtime_r(&now, date) ? 0 : -EOVERFLOW;

@@ -56,9 +56,10 @@ void Print(const LogLine& line)
 {
     constexpr const char* kLetters = "??VDIWEF";
     const std::unique_ptr<GDateTime, decltype(&g_date_time_unref)> now(g_date_time_new_now_local(), g_date_time_unref);
-    const std::unique_ptr<char, decltype(&g_free)> time(now ? g_date_time_format(now.get(), "%H:%M:%S.%f") : nullptr, g_free);
+    const std::unique_ptr<char, decltype(&g_free)> time(
+        now != nullptr ? g_date_time_format(now.get(), "%H:%M:%S.%f") : nullptr, g_free);
     const char letter = line.priority >= DLOG_VERBOSE && line.priority <= DLOG_FATAL ? kLetters[line.priority] : '?';
-    const std::string whole = std::string(time ? time.get() : "") + ' ' + letter + ' ' + line.tag + ": " + line.text;
+    const std::string whole = std::string(time != nullptr ? time.get() : "") + ' ' + letter + ' ' + line.tag + ": " + line.text;
     fputs(whole.c_str(), stderr);
 }
 
@@ -126,7 +127,7 @@ try
     const std::unique_ptr<char, decltype(&g_free)> text(g_strdup_vprintf(fmt, arguments), g_free);
     va_end(arguments);
 
-    const LogLine line{log_id, prio, tag ? tag : "", text ? text.get() : ""};
+    const LogLine line{log_id, prio, tag != nullptr ? tag : "", text != nullptr ? text.get() : ""};
     Distribute(line);
     return static_cast<int>(line.text.size());
 }

@@ -12,7 +12,7 @@ int GiveState(Call call, connection_h connection, Out* out, int Device::*value)
 {
     return Answer(call, {},
         [&](State& state)
-        { return state.handles.Find(HandleKind::kConnection, connection, call) ? Give(out, state.device.*value) : -EINVAL; });
+        { return state.handles.Find(HandleKind::Connection, connection, call) ? Give(out, state.device.*value) : -EINVAL; });
 }
 
 } // namespace
@@ -23,10 +23,10 @@ PLATFORM_API int connection_create(connection_h* connection)
     return Answer(Call::connection_create, {},
         [&](State& state)
         {
-            if (!connection)
+            if (connection == nullptr)
                 return -EINVAL;
             const Opening opening = state.handles.Open(Call::connection_create, caller);
-            *connection = state.handles.Add<connection_h>({HandleKind::kConnection, kNoSlot, opening, {}, {}});
+            *connection = state.handles.Add<connection_h>({HandleKind::Connection, kNoSlot, opening, {}, {}});
             return 0;
         });
 }
@@ -35,7 +35,7 @@ PLATFORM_API int connection_destroy(connection_h connection)
 {
     return Answer(Call::connection_destroy, {},
         [&](State& state)
-        { return state.handles.Close(HandleKind::kConnection, connection, Call::connection_destroy) ? 0 : -EINVAL; });
+        { return state.handles.Close(HandleKind::Connection, connection, Call::connection_destroy) ? 0 : -EINVAL; });
 }
 
 PLATFORM_API int connection_get_cellular_state(connection_h connection, connection_cellular_state_e* state)

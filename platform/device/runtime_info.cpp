@@ -12,13 +12,13 @@ std::optional<Topic> TopicOf(runtime_info_key_e key)
     switch (key)
     {
     case RUNTIME_INFO_KEY_FLIGHT_MODE_ENABLED:
-        return Topic::kFlightMode;
+        return Topic::FlightMode;
     case RUNTIME_INFO_KEY_WIFI_STATUS:
-        return Topic::kWifiStatus;
+        return Topic::WifiStatus;
     case RUNTIME_INFO_KEY_PACKET_DATA_ENABLED:
-        return Topic::kPacketData;
+        return Topic::PacketData;
     case RUNTIME_INFO_KEY_DATA_ROAMING_ENABLED:
-        return Topic::kDataRoaming;
+        return Topic::DataRoaming;
     default:
         return std::nullopt;
     }

@@ -9,7 +9,7 @@ PLATFORM_API int storage_get_internal_memory_size64(struct statvfs* buf)
     return Answer(Call::storage_get_internal_memory_size64, {},
         [&](State& state)
         {
-            if (!buf)
+            if (buf == nullptr)
                 return -EINVAL;
             *buf = {};
             buf->f_bsize = state.device.blockSize;

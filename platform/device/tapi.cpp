@@ -16,7 +16,7 @@ namespace
 template <class Work>
 int AnswerForModem(Call call, TapiHandle* handle, Work work)
 {
-    return AnswerForSlot(call, HandleKind::kTapi, handle, work);
+    return AnswerForSlot(call, HandleKind::Tapi, handle, work);
 }
 
 // One value for the whole device, which every modem tells.
@@ -24,8 +24,7 @@ template <class Out>
 int GiveRole(Call call, TapiHandle* handle, Out* out, int Device::*role)
 {
     return Answer(call, {handle},
-        [&](State& state)
-        { return state.handles.Find(HandleKind::kTapi, handle, call) ? Give(out, state.device.*role) : -EINVAL; });
+        [&](State& state) { return state.handles.Find(HandleKind::Tapi, handle, call) ? Give(out, state.device.*role) : -EINVAL; });
 }
 
 } // namespace
@@ -53,10 +52,10 @@ PLATFORM_API TapiHandle* tel_init(const char* cp_name)
     Answer(Call::tel_init, {nullptr, cp_name},
         [&](State& state)
         {
-            const int slot = cp_name && state.device.telephony ? state.SlotOf(cp_name) : kNoSlot;
+            const int slot = cp_name != nullptr && state.device.telephony ? state.SlotOf(cp_name) : kNoSlot;
             if (slot == kNoSlot)
                 return -EINVAL;
-            handle = state.handles.Add<TapiHandle*>({HandleKind::kTapi, slot, state.handles.Open(Call::tel_init, caller), {}, {}});
+            handle = state.handles.Add<TapiHandle*>({HandleKind::Tapi, slot, state.handles.Open(Call::tel_init, caller), {}, {}});
             return 0;
         });
     return handle;
@@ -65,7 +64,7 @@ PLATFORM_API TapiHandle* tel_init(const char* cp_name)
 PLATFORM_API int tel_deinit(TapiHandle* handle)
 {
     return Answer(Call::tel_deinit, {handle},
-        [&](State& state) { return state.handles.Close(HandleKind::kTapi, handle, Call::tel_deinit) ? 0 : -EINVAL; });
+        [&](State& state) { return state.handles.Close(HandleKind::Tapi, handle, Call::tel_deinit) ? 0 : -EINVAL; });
 }
 
 PLATFORM_API int tel_get_property_int(TapiHandle* handle, const char* property, int* result)
@@ -80,7 +79,7 @@ PLATFORM_API int tel_get_sim_init_info(TapiHandle* handle, TelSimCardStatus_t* s
     return AnswerForModem(Call::tel_get_sim_init_info, handle,
         [&](SimSlot& sim)
         {
-            if (!card_changed)
+            if (card_changed == nullptr)
                 return -EINVAL;
             if (sim.cardStatus.empty())
                 return -ENODATA;
@@ -96,7 +95,7 @@ PLATFORM_API int tel_get_sim_imsi(TapiHandle* handle, TelSimImsiInfo_t* imsi)
     return AnswerForModem(Call::tel_get_sim_imsi, handle,
         [&](const SimSlot& sim)
         {
-            if (!imsi)
+            if (imsi == nullptr)
                 return -EINVAL;
             if (!sim.mcc || !sim.mnc || !sim.msin)
                 return -ENODATA;

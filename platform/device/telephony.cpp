@@ -41,7 +41,7 @@ int SimStateOf(const SimSlot& sim)
 template <class Work>
 int AnswerForHandle(Call call, telephony_h handle, Work work)
 {
-    return AnswerForSlot(call, HandleKind::kTelephony, handle, work);
+    return AnswerForSlot(call, HandleKind::Telephony, handle, work);
 }
 
 } // namespace
@@ -52,7 +52,7 @@ PLATFORM_API int telephony_init(telephony_handle_list_s* list)
     return Answer(Call::telephony_init, {},
         [&](State& state)
         {
-            if (!list)
+            if (list == nullptr)
                 return -EINVAL;
             if (!state.device.telephony)
                 return -ENOTSUP;
@@ -60,9 +60,9 @@ PLATFORM_API int telephony_init(telephony_handle_list_s* list)
             if (state.device.slots.empty())
                 return 0;
 
-            OpenHandle handles{HandleKind::kHandleList, kNoSlot, state.handles.Open(Call::telephony_init, caller), {}, {}};
+            OpenHandle handles{HandleKind::HandleList, kNoSlot, state.handles.Open(Call::telephony_init, caller), {}, {}};
             for (int slot = 0; slot < static_cast<int>(state.device.slots.size()); ++slot)
-                handles.list.push_back(state.handles.Add<telephony_h>({HandleKind::kTelephony, slot, handles.opening, {}, {}}));
+                handles.list.push_back(state.handles.Add<telephony_h>({HandleKind::Telephony, slot, handles.opening, {}, {}}));
             list->count = static_cast<unsigned>(handles.list.size());
             list->handle = state.handles.Add<telephony_h*>(std::move(handles));
             return 0;
@@ -74,13 +74,13 @@ PLATFORM_API int telephony_deinit(telephony_handle_list_s* list)
     return Answer(Call::telephony_deinit, {},
         [&](State& state)
         {
-            if (!list)
+            if (list == nullptr)
                 return -EINVAL;
             const telephony_handle_list_s closed = *list;
             *list = {};
-            if (closed.count == 0 && !closed.handle) // what telephony_init() gives on a device without slots
+            if (closed.count == 0 && closed.handle == nullptr) // what telephony_init() gives on a device without slots
                 return 0;
-            return state.handles.Close(HandleKind::kHandleList, closed.handle, Call::telephony_deinit) ? 0 : -EINVAL;
+            return state.handles.Close(HandleKind::HandleList, closed.handle, Call::telephony_deinit) ? 0 : -EINVAL;
         });
 }
 

@@ -55,7 +55,7 @@ TEST_F(ConnectionTest, ListenerHearsOfFiveChangesWhileItIsRegisteredWhateverFail
     for (const Call call : {Call::wifi_initialize, Call::wifi_set_device_state_changed_cb, Call::runtime_info_set_changed_cb,
              Call::wifi_set_connection_state_changed_cb, Call::wifi_unset_device_state_changed_cb,
              Call::wifi_unset_connection_state_changed_cb, Call::runtime_info_unset_changed_cb})
-        kiv::platform::FailCall(call, -1, kEveryCall, kNoSlot, Leavings::kItsResults);
+        kiv::platform::FailCall(call, -1, kEveryCall, kNoSlot, Leavings::ItsResults);
 
     facade.SetConnectionEventListener(&listener, &first);
     EXPECT_CALL(listener, OnWifiDeviceStateChanged(WIFI_DEVICE_STATE_DEACTIVATED, &first));

@@ -62,7 +62,7 @@ TEST_F(DeviceFacts, CompareFreeStorageStrictlyInMebibytes)
                 log.Take(), ElementsAre("E DASystem.cpp IsSystemMemoryAvailable > Total mem under " + std::to_string(required)));
         }
     }
-    kiv::platform::FailCall(Call::storage_get_internal_memory_size64, 1, kEveryCall, kNoSlot, Leavings::kItsResults);
+    kiv::platform::FailCall(Call::storage_get_internal_memory_size64, 1, kEveryCall, kNoSlot, Leavings::ItsResults);
     EXPECT_TRUE(facade.IsSystemMemoryAvailable(-1.0)) << "what is not negative is a success";
 }
 

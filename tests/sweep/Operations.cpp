@@ -224,8 +224,8 @@ struct Table
 
     // of those that are added next
     std::string file = {}; ///< where lines of their own come from
-    Kind kind = Kind::kSingle;
-    SimLock lock = SimLock::kAroundReads;
+    Kind kind = Kind::Single;
+    SimLock lock = SimLock::AroundReads;
 };
 
 const Calls kOpen{Call::telephony_init}, kState{Call::telephony_sim_get_state}, kNumber{Call::telephony_sim_get_subscriber_number},
@@ -267,15 +267,15 @@ template <class S>
 void AddConnection(Table& t)
 {
     using C = DAConnectionManager;
-    t.kind = Kind::kSingle;
-    t.lock = SimLock::kAroundReads;
+    t.kind = Kind::Single;
+    t.lock = SimLock::AroundReads;
     t.Add<int()>(&S::GetCellularNetworkState, {}, {"5"});
     t.Fails({Call::connection_create, Call::connection_get_cellular_state}, {"0"});
     t.Add<int()>(&S::GetWifiNetworkState, {}, {"1"}).Fails({Call::connection_create, Call::connection_get_wifi_state}, {"0"});
     t.Add<int()>(&S::GetBTNetworkState, {}, {"2"}).Fails({Call::connection_create, Call::connection_get_bt_state}, {"0"});
-    t.kind = Kind::kWalk;
+    t.kind = Kind::Walk;
     t.Add<bool(bool, bool)>(&S::IsNetworkConnected, {"", 1}, {"true"});
-    t.kind = Kind::kListener;
+    t.kind = Kind::Listener;
     t.AddRun({SymbolOf<void (S::*)(IDAConnectionStateListener*, void*)>(&S::SetConnectionEventListener),
                  SymbolOf(&C::wifi_device_state_changed), SymbolOf(&C::wifi_connection_state_changed),
                  SymbolOf(&C::OnConnectionStateChanged)},
@@ -298,8 +298,8 @@ void AddSim(Table& t)
     const std::string enter = "I > Enter", reading = "I > Before telephony_sim_get_subscriber_number",
                       read = "I > After telephony_sim_get_subscriber_number";
     t.file = "DASimManager.cpp";
-    t.kind = Kind::kSingle;
-    t.lock = SimLock::kWhole;
+    t.kind = Kind::Single;
+    t.lock = SimLock::Whole;
     t.Add<char**()>(&S::GetCpNameList, {}, {"modem0 modem1"}).Fails({kNames}, {"null"});
     t.Add<bool(int, bool*)>(&S::GetRoamingStatus, {"", 1}, {"true false"});
     t.Fails({kOpen[0], Call::telephony_network_get_service_state, Call::telephony_network_get_roaming_status}, {"false true"});
@@ -320,15 +320,15 @@ void AddSim(Table& t)
     t.Add<bool(telephony_data**, char**)>(&S::GetPhoneNumber, {}, {"true +821012345678", enter, reading, read});
     t.Fails(kNumber, {"false before*", enter, reading, "E > telephony_sim_get_subscriber_number errno [-77]"});
     t.WithoutMemory({"false before"});
-    t.kind = Kind::kWalk;
+    t.kind = Kind::Walk;
     t.AddRun({SymbolOf<bool (S::*)(Slots*)>(&S::InitHandleList), SymbolOf<bool (S::*)(Slots*)>(&S::DeinitHandleList)},
         OpenAndClose<S>, {"true 2 true"});
     t.Add<bool()>(&S::IsSimExist, {}, {"true"}).Fails({}, {"false", "E > SIM STATE[0] : TELEPHONY_SIM_STATE_LOCKED"});
-    t.lock = SimLock::kAroundReads;
+    t.lock = SimLock::AroundReads;
     t.Add<bool(int, int, Status*)>(&S::IsAvaliableSimStateOnPolling, {"", 1},
         {"true 3", "I > current SIM Status[3]", "I > slotNum[1], result[1], status[3], time[0]"});
     t.Fails({}, {"false", "E > wait tel_init[1]", "E > TapiHandle is null. fail."});
-    t.kind = Kind::kSingle;
+    t.kind = Kind::Single;
     t.Add<bool(Status)>(&S::IsWaittingSimCheck, {"", 4}, {"true"}).WithoutMemory({"false"});
 }
 
@@ -369,7 +369,7 @@ std::string SendMulti(Session&)
 void AddSlots(Table& t)
 {
     using S = DASystem;
-    t.kind = Kind::kWalk;
+    t.kind = Kind::Walk;
     t.Add<bool()>(&S::IsSimAvailable, {}, {"true"}).Fails({}, {"false", kNotOpened, kNotAvailable});
     t.Add<bool()>(&S::IsDualSimAvailable, {}, {"true"});
     t.Fails({}, {"false", kNotOpened, kNotAvailable, "E > [Single Sim Device] Not support Dual Sim."});
@@ -404,7 +404,7 @@ void AddFacade(Table& t)
     t.file = "DASystem.cpp";
     AddSlots(t);
 
-    t.kind = Kind::kSingle;
+    t.kind = Kind::Single;
     t.Add<bool(Text)>(&S::IsValidMcc, {"450"}, {"true"}).WithoutMemory({"false"});
     t.Add<void(Text, char**)>(&S::GetCountryNameFromCountryCallingCode, {"49"}, {"Germany"});
     t.Fails({}, {"before", "E > mcc is empty. GetCountryNameFromCountryCallingCode finish."}).WithoutMemory({"null"});
@@ -439,7 +439,7 @@ void AddFacade(Table& t)
     t.Add<std::string(std::string, int, int)>(&S::GetValueFromPosition, {"abcdefghijklmnopqrstuvwxyz", 1}, {"b"});
     t.Add<char(char)>(&S::To_Capital, {"", 'k'}, {"K"});
 
-    t.kind = Kind::kBus;
+    t.kind = Kind::Bus;
     Story policy = WalkOf("SendPolicyNotification"), statuses = WalkOf("SendStatusNotification");
     policy.insert(policy.begin() + 1, "I > noti type [5] service_id [5]");
     statuses.insert(statuses.end(), {statuses[1], statuses[5]}); // nobody subscribed to the other service
@@ -469,7 +469,7 @@ std::string OpenAndDelete(Session&)
 void AddSimManager(Table& t)
 {
     using S = DASimManager;
-    t.kind = Kind::kSingle;
+    t.kind = Kind::Single;
     t.file = "DASimManager.cpp";
     t.AddRun({SymbolOf(&S::SuccessToInitTelephonyHandle), SymbolOf(&S::DeleteTelephonyHandle)}, OpenAndDelete, {"true 2"});
     t.Fails(kOpen, {"false 0", "E > telephony_init Failed."});
@@ -478,7 +478,7 @@ void AddSimManager(Table& t)
     AddReader<char>(t, &S::GetMNCFromSim, kImsi, "0 01", "4 null", "E > fail to get MNC");
     AddReader<char>(t, &S::GetIMSIFromSim, kImsi, "0 262019876543210", "4 null", "E > fail to get imsi");
     AddReader<char>(t, &S::GetPhoneNumberFromSim, kNumber, "0 +4915112345678", "-39841791 null", "E > fail to get phoneNumber");
-    t.lock = SimLock::kWhole;
+    t.lock = SimLock::Whole;
     t.Add<bool(telephony_data**, telephony_sim_state_e*)>(&S::GetSimState, {}, {"true 2"}).Fails(kState, {"false"});
 }
 
@@ -494,7 +494,7 @@ std::string AskBoard(Session&)
 void AddBusManager(Table& t)
 {
     using B = DADBusManager;
-    t.kind = Kind::kBus;
+    t.kind = Kind::Bus;
     t.file = "DADBusManager.cpp";
     t.AddRun({SymbolOf(&B::InitDbusConnection), SymbolOf(&B::SendDbusMethodNReceiveDID), SymbolOf(&B::ParseDeviceUniqueID)},
         AskBoard, {"0 KIV0123456789"});
@@ -506,7 +506,7 @@ void AddBusManager(Table& t)
     t.Add<int(char*, int)>(&B::SendAuthNotification, {"450", 1}, WalkOf("SendAuthNotification"));
     t.Add<int(char*, int)>(&B::SendActivatedNotification, {"450", 1}, WalkOf("SendActivatedNotification"));
     t.Add<int(char*, Text, Text, Text, Text)>(&B::SendNumberChangedNotification, {"450"}, WalkOf("SendNumberChangedNotification"));
-    t.kind = Kind::kPush;
+    t.kind = Kind::Push;
     t.Add<int(Text, Text, Text, long long)>(&B::DeliverPushMessage, {"5", 7}, WalkOf("DeliverPushMessage"));
 }
 
@@ -546,7 +546,7 @@ const std::vector<Operation>& Operations()
 
 bool Operation::IsLockedAt(Call call) const
 {
-    return lock == SimLock::kWhole || call == Call::telephony_sim_get_state || call == Call::telephony_sim_get_subscriber_number ||
+    return lock == SimLock::Whole || call == Call::telephony_sim_get_state || call == Call::telephony_sim_get_subscriber_number ||
            call == Call::tel_get_sim_imsi;
 }
 

@@ -36,17 +36,17 @@ struct Failing
 
 enum class Kind
 {
-    kSingle,  ///< fails when one of its calls fails, and only then
-    kWalk,    ///< goes on after a call that fails
-    kBus,     ///< calls somebody on the bus
-    kPush,    ///< the same, and a main loop of the thread's goes on with it
-    kListener ///< of the one thread that changes are delivered on
+    Single,  ///< fails when one of its calls fails, and only then
+    Walk,    ///< goes on after a call that fails
+    Bus,     ///< calls somebody on the bus
+    Push,    ///< the same, and a main loop of the thread's goes on with it
+    Listener ///< of the one thread that changes are delivered on
 };
 
 enum class SimLock
 {
-    kAroundReads, ///< held around the SIM reads, one by one
-    kWhole        ///< held at every call
+    AroundReads, ///< held around the SIM reads, one by one
+    Whole        ///< held at every call
 };
 
 /// One operation with typical arguments; one that opens and the one that closes are called together.
@@ -54,8 +54,8 @@ struct Operation
 {
     std::vector<std::string> symbols; ///< the members that it calls, as the library exports them
     std::string name;                 ///< the first of them
-    Kind kind = Kind::kSingle;
-    SimLock lock = SimLock::kAroundReads;
+    Kind kind = Kind::Single;
+    SimLock lock = SimLock::AroundReads;
     bool needsHandle = false; ///< the first of the session
     std::function<std::string(Session&)> run;
     Story good; ///< on the profile "dual"

@@ -90,7 +90,7 @@ Story Sweep::Try(const Operation& operation, const std::function<void()>& arm, c
         const Story lines = log.Take();
         story.insert(story.end(), lines.begin(), lines.end());
     }
-    if (operation.kind == Kind::kPush)
+    if (operation.kind == Kind::Push)
         TheWorld().deliveries.Settle();
     EXPECT_THAT(platform::OpenHandles(), testing::IsEmpty());
     EXPECT_THAT(platform::TakeMisuses(), testing::IsEmpty());
@@ -118,7 +118,7 @@ testing::AssertionResult Sweep::MayBe(const Operation& operation, const Story& s
         const std::string mcc = slot.mcc.value_or(""), mnc = slot.mnc.value_or("");
         words.insert({mcc, mnc, mcc + mnc + slot.msin.value_or(""), slot.number.value_or(""), slot.imei.value_or("")});
     }
-    const bool isPartial = operation.kind != Kind::kSingle && std::includes(words.begin(), words.end(), told.begin(), told.end());
+    const bool isPartial = operation.kind != Kind::Single && std::includes(words.begin(), words.end(), told.begin(), told.end());
     if (results.count(story[0]) == 0 && !isPartial)
         return testing::AssertionFailure() << operation.name << " gave " << story[0] << ", untouched " << untouched[0];
     for (std::size_t i = 1; i < story.size(); ++i)

@@ -17,10 +17,10 @@ TEST(Growth, OfEachOperationIsNextToNothing)
     const auto measure = [&](const Operation& operation)
     {
         constexpr std::size_t kMostBytes = 64; // a call
-        const bool isPush = operation.kind == Kind::kPush;
+        const bool isPush = operation.kind == Kind::Push;
         int error = 0; // held in the short form, since to connect for each call takes ten times as long
         const Connection connection(IsLong() || isPush ? nullptr : DADBusManager::GetInstance()->InitDbusConnection(&error));
-        const int calls = IsLong() || isPush ? 5000 : operation.kind == Kind::kBus ? 300 : 1000;
+        const int calls = IsLong() || isPush ? 5000 : operation.kind == Kind::Bus ? 300 : 1000;
         std::size_t before = 0;
         for (int i = -calls / 10; i < calls; ++i) // a tenth more first, which make what stays: the connection, GLib's types
         {
@@ -35,7 +35,7 @@ TEST(Growth, OfEachOperationIsNextToNothing)
     };
     for (const Operation& operation : Operations())
     {
-        if (operation.kind == Kind::kPush)
+        if (operation.kind == Kind::Push)
             measure(operation);
         else
             std::thread(measure, operation).join();

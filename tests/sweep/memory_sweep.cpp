@@ -179,7 +179,7 @@ TEST_F(MemorySweep, GivesFailureResultsWhicheverAllocationFails)
         Use(name);
         for (const Operation& operation : Operations())
         {
-            const bool isOnBus = operation.kind == Kind::kBus || operation.kind == Kind::kPush;
+            const bool isOnBus = operation.kind == Kind::Bus || operation.kind == Kind::Push;
             if ((!operation.needsHandle || !device.slots.empty()) && (!isOnBus || name == "dual"))
                 injections += TryAll(operation);
         }

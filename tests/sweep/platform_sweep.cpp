@@ -24,8 +24,8 @@ Leavings Possible(Call call, Leavings wanted)
     const Calls opening{Call::telephony_init, Call::tel_init, Call::package_info_create, Call::connection_create};
     const Calls closing{Call::telephony_deinit, Call::tel_deinit, Call::package_info_destroy, Call::connection_destroy};
     if (Contains(opening, call))
-        return Leavings::kNothing;
-    return Contains(closing, call) ? Leavings::kItsResults : wanted;
+        return Leavings::Nothing;
+    return Contains(closing, call) ? Leavings::ItsResults : wanted;
 }
 
 /// What an operation comes to that ends with the first call that fails.
@@ -43,7 +43,7 @@ Story Expected(const Operation& operation, const Calls& failed, Leavings leaving
                 return story;
             text.pop_back();
             const std::size_t rest = text.find(' ');
-            if (leavings == Leavings::kItsResults)
+            if (leavings == Leavings::ItsResults)
                 text =
                     rest == std::string::npos ? untouched[0] : text.substr(0, rest) + untouched[0].substr(untouched[0].find(' '));
             return story;
@@ -106,7 +106,7 @@ TEST_F(PlatformSweep, HasEveryPublicMemberInItsTable)
 TEST_F(PlatformSweep, AnswersRightOnADeviceWhereAllGoesWell)
 {
     for (const Operation& operation : Operations())
-        EXPECT_EQ(operation.good, TryFailing(operation, 0, 0, Leavings::kNothing)) << operation.name;
+        EXPECT_EQ(operation.good, TryFailing(operation, 0, 0, Leavings::Nothing)) << operation.name;
 }
 
 TEST_F(PlatformSweep, GivesFailureResultsAndReleasesAllWhicheverCallFails)
@@ -121,16 +121,16 @@ TEST_F(PlatformSweep, GivesFailureResultsAndReleasesAllWhicheverCallFails)
         {
             if (operation.needsHandle && device.slots.empty())
                 continue;
-            const Story untouched = TryFailing(operation, 0, 0, Leavings::kNothing);
+            const Story untouched = TryFailing(operation, 0, 0, Leavings::Nothing);
             const std::size_t count = std::min(made.size(), kMostCalls);
             for (std::size_t i = 0; i < count * 2; ++i)
             {
-                const Leavings leavings = i % 2 == 0 ? Leavings::kNothing : Leavings::kItsResults;
+                const Leavings leavings = i % 2 == 0 ? Leavings::Nothing : Leavings::ItsResults;
                 for (const unsigned length : Lengths())
                 {
                     const Story story = TryFailing(operation, i / 2 + 1, i / 2 + length, leavings);
                     ++pairs;
-                    if (operation.kind == Kind::kSingle)
+                    if (operation.kind == Kind::Single)
                         EXPECT_EQ(Expected(operation, failed, leavings, untouched), story)
                             << operation.name << " with " << failed.size() << " failing from " << platform::NameOf(failed.at(0));
                     else

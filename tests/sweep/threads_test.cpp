@@ -23,7 +23,7 @@ TEST(Threads, DoNotDisturbEachOther)
     World world;
     std::vector<const Operation*> any, listening; // the latter on the thread that the changes arrive on
     for (const Operation& operation : Operations())
-        (operation.kind == Kind::kListener ? listening : any).push_back(&operation);
+        (operation.kind == Kind::Listener ? listening : any).push_back(&operation);
     const int rounds = IsLong() ? 200 : 5;
     std::vector<std::future<void>> threads;
     for (std::size_t i = 0; i < 8; ++i)
