@@ -138,7 +138,7 @@ int Register(Call call, std::optional<Topic> topic, bool hasCallback, Notifier::
             state.notifier.Add(*topic, std::move(callback));
             return 0;
         });
-    FollowFile();
+    SettleSource();
     return result;
 }
 
@@ -147,7 +147,7 @@ int Unregister(Call call, std::optional<Topic> topic) noexcept
     const int result = Answer(call, {}, [&](State& state) { return topic && state.notifier.Remove(*topic) ? 0 : -EINVAL; });
     if (topic)
         TheState().notifier.AwaitEnd(*topic);
-    FollowFile();
+    SettleSource();
     return result;
 }
 

@@ -73,44 +73,12 @@ void SetDevice(const Device& device);
 /// calls nothing of the platform or of this control.
 void ChangeDevice(const std::function<void(Device&)>& change);
 
-/// Replaces the device by a profile or a device file, which it follows as it does one that KIV_PROFILE names.
-/// @return what was wrong, naming file, group and key, and what would be right; empty when done. On trouble nothing changes.
-std::string UseProfile(const std::string& nameOrPath);
-
 /// What is wrong with the profile or file that KIV_PROFILE names; empty when nothing is.
 std::string DeviceTrouble();
 
 /// Back to the beginning: the environment's device, no registrations, faults, hooks, journal, misuses. Handles that are still
 /// open are closed.
 void ResetDevice();
-
-struct Profile
-{
-    std::string name;
-    std::string description;
-};
-
-/// The profiles that UseProfile() and KIV_PROFILE know by name.
-std::vector<Profile> ListProfiles();
-
-/// What one key of a device file is.
-struct FieldInfo
-{
-    std::string group; ///< "sim0" stands for that of every slot
-    std::string key;
-    std::string values;   ///< what it may hold
-    std::string fallback; ///< what it is without the key: "none" for a value that is missing, "required" where there is no device
-    std::string meaning;
-};
-
-/// Every key that a device file may hold.
-std::vector<FieldInfo> ListFields();
-
-/// Changes values in a device file, all or none; whoever reads it meanwhile sees the old file or the new one, and two writers
-/// at once lose nothing. A file that is not there is made from the profile in use (from "dual" if a file is in use).
-/// @param assignments  "GROUP.KEY=VALUE"
-/// @return as UseProfile()
-std::string SetInDeviceFile(const std::string& path, const std::vector<std::string>& assignments);
 
 /// @}
 /// @name Calls: every function of the platform but __dlog_print()

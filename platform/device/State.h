@@ -6,8 +6,11 @@
 #include "DeviceControl.h"
 #include "Handles.h"
 #include "Notifier.h"
+#include "Source.h"
 
+#include <memory>
 #include <mutex>
+#include <string>
 
 namespace kiv::platform
 {
@@ -17,16 +20,12 @@ struct State
     std::mutex mutex; ///< guards what stands before the notifier, which guards itself
 
     Device device;
-    std::string path;    ///< the file that the device follows; empty when it follows none
-    std::string text;    ///< of the profile or file that the device was last read from
-    std::string trouble; ///< what is wrong with the environment's profile
+    std::shared_ptr<Source> source; ///< keeps the device current; null when nothing does
+    std::string trouble;            ///< what is wrong with the environment's profile
     Handles handles;
     bool wifiInitialized = false;
 
     Notifier notifier;
-
-    std::mutex reading;     ///< held while the file is read again, so that an older text never replaces a newer one
-    std::string lastReport; ///< what was wrong with the file that was read again; guarded by `reading`
 
     /// Whether there is a device to answer from; the first question reads what the environment names.
     bool Ready();
@@ -45,12 +44,11 @@ private:
 /// Lives as long as the process, for the threads that outlive its main().
 State& TheState();
 
-/// Starts or ends following the device's file, as there are registrations or not. Called with no lock held. Ended, the
-/// follower's thread is gone, except that a callback does not wait for it.
-void FollowFile() noexcept;
+/// Has the source in use start or end its work. Called with no lock held, after registrations came or went.
+void SettleSource() noexcept;
 
-/// Takes over a device file that changed. Blocks while callbacks run.
-void ReadAgain(const std::string& path);
+/// Replaces the device and what keeps it current. Registered callbacks for each value that differs run before it returns.
+void Use(Origin origin);
 
 } // namespace kiv::platform
 

@@ -1,5 +1,7 @@
 #include "DeviceFile.h"
 
+#include "SourceControl.h"
+
 #include <algorithm>
 #include <charconv>
 #include <glib.h>

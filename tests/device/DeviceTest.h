@@ -6,6 +6,7 @@
 
 #include <DASystem.h>
 #include <DeviceControl.h>
+#include <SourceControl.h>
 
 namespace kiv::test
 {

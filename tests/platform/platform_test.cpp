@@ -4,6 +4,7 @@
 #include <DeviceControl.h>
 #include <ITapiSim.h>
 #include <LogControl.h>
+#include <SourceControl.h>
 #include <runtime_info.h>
 #include <telephony.h>
 

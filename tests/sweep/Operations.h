@@ -5,6 +5,7 @@
 #include "support/Peer.h"
 
 #include <DeviceControl.h>
+#include <SourceControl.h>
 #include <telephony.h>
 
 namespace kiv::test

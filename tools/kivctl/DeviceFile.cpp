@@ -1,7 +1,7 @@
 #include "Nearest.h"
 #include "Verbs.h"
 
-#include <DeviceControl.h>
+#include <SourceControl.h>
 
 #include <algorithm>
 

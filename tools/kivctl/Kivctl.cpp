@@ -3,6 +3,7 @@
 #include "Nearest.h"
 
 #include <DeviceControl.h>
+#include <SourceControl.h>
 
 #include <unistd.h>
 
