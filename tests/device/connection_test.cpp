@@ -75,6 +75,21 @@ TEST_F(ConnectionTest, ListenerHearsOfFiveChangesWhileItIsRegisteredWhateverFail
     kiv::platform::SetDevice(before); // would be told, if anything were still registered
 }
 
+TEST_F(ConnectionTest, ListenerReceivesAChangeDuringItsRegistration)
+{
+    kiv::platform::SetCallHook(
+        [](Call call, int)
+        {
+            if (call == Call::wifi_set_connection_state_changed_cb) // the call after the device state's
+                Set(&Device::wifiDeviceState, WIFI_DEVICE_STATE_ACTIVATED);
+            return "";
+        });
+    Set(&Device::wifiDeviceState, WIFI_DEVICE_STATE_DEACTIVATED);
+    EXPECT_CALL(listener, OnWifiDeviceStateChanged(WIFI_DEVICE_STATE_ACTIVATED, &first));
+    facade.SetConnectionEventListener(&listener, &first);
+    kiv::platform::SetCallHook(nullptr);
+}
+
 TEST_F(ConnectionTest, ListenerAndUserDataAreThoseOfTheLastRegistration)
 {
     facade.SetConnectionEventListener(&listener, &first);

@@ -5,8 +5,11 @@
 #include <ITapiSim.h>
 #include <LogControl.h>
 #include <SourceControl.h>
+#include <net_connection.h>
+#include <package_info.h>
 #include <runtime_info.h>
 #include <telephony.h>
+#include <wifi.h>
 
 using namespace kiv::platform;
 using kiv::test::IterateUntil;
@@ -15,7 +18,39 @@ using testing::StartsWith;
 namespace
 {
 
-TEST(Handles, ThatAreOpenAndWhatWasDoneWronglyWithThemAreTold)
+TEST(Handles, AreReportedWhileTheyAreOpen)
+{
+    telephony_handle_list_s list{};
+    package_info_h package = nullptr;
+    connection_h connection = nullptr;
+    ASSERT_EQ(0, telephony_init(&list));
+    TapiHandle* const modem = tel_init("modem0");
+    ASSERT_EQ(0, package_info_create("org.example.mail", &package));
+    ASSERT_EQ(0, connection_create(&connection));
+    EXPECT_THAT(
+        OpenHandles(), testing::UnorderedElementsAre(StartsWith("handle list, opened by telephony_init"),
+                           StartsWith("TAPI handle of slot 0"), StartsWith("package handle"), StartsWith("connection handle")));
+    for (const int result :
+        {telephony_deinit(&list), tel_deinit(modem), package_info_destroy(package), connection_destroy(connection)})
+        EXPECT_EQ(0, result);
+    EXPECT_THAT(OpenHandles(), testing::IsEmpty());
+}
+
+TEST(Wifi, RefusesCallbacksUntilItIsInitialized)
+{
+    const auto onDevice = [](wifi_device_state_e, void*) {};
+    const auto onConnection = [](wifi_connection_state_e, wifi_ap_h, void*) {};
+    ResetDevice();
+    for (const bool isInitialized : {false, true})
+    {
+        EXPECT_EQ(isInitialized, wifi_set_device_state_changed_cb(onDevice, nullptr) == 0);
+        EXPECT_EQ(isInitialized, wifi_set_connection_state_changed_cb(onConnection, nullptr) == 0);
+        EXPECT_EQ(0, wifi_initialize());
+    }
+    ResetDevice();
+}
+
+TEST(Handles, ThatAreMisusedAreReported)
 {
     ResetDevice(); // which counts the calls
     telephony_handle_list_s list{};
@@ -23,13 +58,11 @@ TEST(Handles, ThatAreOpenAndWhatWasDoneWronglyWithThemAreTold)
     const telephony_h second = list.handle[1];
     TapiHandle* const modem = tel_init("modem1");
     telephony_sim_state_e state{};
-    EXPECT_THAT(OpenHandles(), testing::SizeIs(2));
     EXPECT_NE(0, tel_deinit(reinterpret_cast<TapiHandle*>(second)));
     EXPECT_EQ(0, telephony_deinit(&list));
     EXPECT_EQ(0, tel_deinit(modem));
     for (const int refusal : {telephony_sim_get_state(second, &state), tel_deinit(modem), tel_deinit(nullptr)})
         EXPECT_NE(0, refusal);
-    EXPECT_THAT(OpenHandles(), testing::IsEmpty());
     EXPECT_THAT(TakeMisuses(),
         testing::ElementsAre(
             StartsWith("tel_deinit: needs a TAPI handle, got a telephony handle of slot 1, opened by telephony_init"),
