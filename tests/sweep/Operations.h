@@ -1,12 +1,9 @@
 #ifndef KIV_TESTS_OPERATIONS_H
 #define KIV_TESTS_OPERATIONS_H
 
-#include "support/Deliveries.h"
-#include "support/Peer.h"
+#include "sweep/World.h"
 
 #include <DeviceControl.h>
-#include <SourceControl.h>
-#include <telephony.h>
 
 namespace kiv::test
 {
@@ -16,17 +13,6 @@ using Calls = std::vector<Call>;
 
 /// What an operation came to: its result with what it wrote, then each line that it logged, as LogCapture tells it.
 using Story = std::vector<std::string>;
-
-/// The telephony handles that one call of an operation is given, and those that it leaves open. Both are closed at its end.
-struct Session
-{
-    Session();
-    Session(const Session&) = delete;
-    Session& operator=(const Session&) = delete;
-    ~Session();
-
-    telephony_handle_list_s given{}, left{};
-};
 
 /// What an operation comes to when one of these calls fails.
 struct Failing
@@ -68,26 +54,6 @@ struct Operation
 
 /// Every public member of the facade and the managers.
 const std::vector<Operation>& Operations();
-
-/// Whether a test takes its long form, for which the environment variable KIV_TEST_LONG asks.
-bool IsLong();
-
-/// What the operations need: UTC, the profile "dual" with its clock stopped, and a private bus with whom they call on it. The test
-/// fails when GLib has anything to say.
-struct World
-{
-    World();
-    World(const World&) = delete;
-    World& operator=(const World&) = delete;
-    ~World();
-
-    static void Use(const std::string& profile);
-
-    std::string directory; ///< of the subscriber store
-    PrivateBus bus;
-    Peer board, serviceManager, client;
-    Deliveries deliveries;
-};
 
 } // namespace kiv::test
 

@@ -1,5 +1,7 @@
 #include "sweep/Sweep.h"
 
+#include <SourceControl.h>
+
 #include <cstring>
 
 namespace kiv::test
