@@ -36,7 +36,7 @@ struct ConnectionTrouble : BusTest
     ~ConnectionTrouble() override { gio = {}; }
 };
 
-TEST_F(ConnectionTrouble, IsATimeOutWhenTheMessageSaysTimeAndUnreachableElse)
+TEST_F(ConnectionTrouble, IsATimeOutOnlyWhenTheMessageSaysTime)
 {
     const std::tuple<const char*, int, std::vector<std::string>> cases[] = {
         {"Timeout was reached", 3, {"g_bus_get_sync() failed:[24:Timeout was reached]", "[dbus] DBUS_ERROR_CONNECTION_TIME_OUT"}},
@@ -62,7 +62,7 @@ TEST_F(ConnectionTrouble, IsATimeOutWhenTheMessageSaysTimeAndUnreachableElse)
     }
 }
 
-TEST_F(ConnectionTrouble, IsCode5WhenNoProxyComesOverAConnectionThatDoesNotEndTheProcessWhoeverMadeIt)
+TEST_F(ConnectionTrouble, IsCode5WhenNoProxyComesOverTheConnection)
 {
     const Connection agents = bus.Connect();
     g_dbus_connection_set_exit_on_close(agents.get(), TRUE);

@@ -49,7 +49,7 @@ struct Kill : BusTest
     };
 };
 
-TEST_F(Kill, AtAnyMomentLeavesTheProcessAliveNothingOwnedAndTheNextCallGoesToTheNewBus)
+TEST_F(Kill, AtAnyMomentIsOutlivedByTheProcess)
 {
     const unsigned long rounds = Wish("KIV_KILL_ROUNDS", 50), seed = Wish("KIV_KILL_SEED", std::random_device{}());
     std::printf("%lu rounds, seed %lu\n", rounds, seed);

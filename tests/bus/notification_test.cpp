@@ -47,7 +47,7 @@ struct Notification : BusTest
     Peer client{bus, "org.example.Subscriber"}, serviceManager{bus, kServiceManager};
 };
 
-TEST_F(Notification, OfEveryTypeReachesASubscriberAsOneStructureAndButForTheNumberTheServiceManagerWithFlatArguments)
+TEST_F(Notification, OfEveryTypeReachesItsReceivers)
 {
     Subscribe(client);
     std::vector<std::string> toClient, toManager, questions;
@@ -68,7 +68,7 @@ TEST_F(Notification, OfEveryTypeReachesASubscriberAsOneStructureAndButForTheNumb
     EXPECT_THAT(log.TakeErrors(), IsEmpty());
 }
 
-TEST_F(Notification, IsRefusedWhenItsTypeIsUnknownOrATextIsMissingOrCanNotGoOnTheBus)
+TEST_F(Notification, IsRefusedWithAnUnknownTypeOrABadText)
 {
     constexpr auto kUnknown = static_cast<_KIV_NOTI_TYPE_E>(9);
     char bad[] = "caf\xe9";
@@ -117,7 +117,7 @@ TEST_F(Notification, OfAPolicyIsRefusedWithoutOneOfItsFourTexts)
     EXPECT_THAT(serviceManager.Calls(), IsEmpty());
 }
 
-TEST_F(Notification, OfSeveralServicesIsOneStatusCallEachAndAsksForALongIdByItsFirstNineCharacters)
+TEST_F(Notification, OfSeveralServicesIsOneStatusCallEach)
 {
     Subscribe(client);
     int ids[] = {INT_MAX, 12, INT_MIN};
@@ -134,7 +134,7 @@ TEST_F(Notification, OfSeveralServicesIsOneStatusCallEachAndAsksForALongIdByItsF
     EXPECT_EQ(std::vector<std::string>(3, "E DASystem.cpp SendMultiOnOffNotiToServiceManager > Invalid parameter"), log.Take());
 }
 
-TEST_F(Notification, PassesOverSubscribersThatCanNotBeCalledAreGoneRefuseOrLeaveWithoutAnAnswer)
+TEST_F(Notification, PassesOverSubscribersThatGiveNoAnswer)
 {
     Peer last(bus), other(bus, "", Peer::Reply("(@as [], 7)")), refusing(bus, "", Peer::Refuse()), leaving(bus);
     leaving.Set(leaving.Leave());
@@ -193,7 +193,7 @@ TEST_F(Notification, WhoseBusGoesInTheMiddleOfTheWalkReportsEachOfTheRest)
     EXPECT_THAT(client.Calls(), SizeIs(1));
 }
 
-TEST_F(Notification, WhoseBusIsBackBeforeTheCallEndsGoesToTheNewBusForTheRestOfTheWalk)
+TEST_F(Notification, ContinuesOnTheNewBusInTheMiddleOfTheWalk)
 {
     const auto restart = [this]
     {

@@ -46,7 +46,7 @@ Lines Missed(const Lookup& lookup)
     return lookup.miss == nullptr ? Lines() : Lines{manager + lookup.name + " > " + lookup.miss};
 }
 
-TEST(CountryLookups, GiveTheRowOfTheKeyAndNothingForAnyOtherText)
+TEST(CountryLookups, GiveTheRowOfTheVeryKey)
 {
     const std::set<std::string> keys = ManyKeys();
     LogCapture log;
@@ -60,7 +60,7 @@ TEST(CountryLookups, GiveTheRowOfTheKeyAndNothingForAnyOtherText)
     }
 }
 
-TEST(CountryLookups, RefuseANullOrEmptyKeyWhichIsAMissForTheManager)
+TEST(CountryLookups, RefuseANullOrEmptyKeyInTheFacadeAlone)
 {
     LogCapture log;
     for (const char* const key : {static_cast<const char*>(nullptr), ""})

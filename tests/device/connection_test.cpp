@@ -28,7 +28,7 @@ struct ConnectionTest : DeviceTest
     char first = 0, second = 0; ///< user data
 };
 
-TEST_F(ConnectionTest, IsUpWhenOneOfTheSelectedIsAndAllOfThemAreAsked)
+TEST_F(ConnectionTest, IsUpWhenAnySelectedConnectionIs)
 {
     for (unsigned bits = 0; bits < 32; ++bits)
     {
@@ -43,7 +43,7 @@ TEST_F(ConnectionTest, IsUpWhenOneOfTheSelectedIsAndAllOfThemAreAsked)
     }
 }
 
-TEST_F(ConnectionTest, ListenerHearsOfFiveChangesWhileItIsRegisteredWhateverFails)
+TEST_F(ConnectionTest, ListenerReceivesFiveKindsOfChangeWhateverFails)
 {
     const Device before = kiv::platform::GetDevice();
     Device after = before;
@@ -105,7 +105,7 @@ TEST_F(ConnectionTest, ListenerAndUserDataAreThoseOfTheLastRegistration)
     Set(&Device::flightMode, true);
 }
 
-TEST_F(ConnectionTest, EntriesTellNothingWithoutAListenerForAnotherKeyOrWhenTheValueCanNotBeRead)
+TEST_F(ConnectionTest, EntriesNeedAListenerAKnownKeyAndAValue)
 {
     const auto change = [this](int key) { C::OnConnectionStateChanged(static_cast<runtime_info_key_e>(key), &first); };
     C::wifi_device_state_changed(WIFI_DEVICE_STATE_ACTIVATED, &first);

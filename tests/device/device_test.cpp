@@ -66,7 +66,7 @@ TEST_F(DeviceFacts, CompareFreeStorageStrictlyInMebibytes)
     EXPECT_TRUE(facade.IsSystemMemoryAvailable(-1.0)) << "what is not negative is a success";
 }
 
-TEST_F(DeviceFacts, HaveTheImeiOfTheFirstModemThatAnswersElseTheOffsetFromUtcFilledUpWithZeros)
+TEST_F(DeviceFacts, HaveAnImeiWithOrWithoutAnAnsweringModem)
 {
     const auto imei = [&] { return Out([&](char** out) { EXPECT_EQ(0, facade.GetIMEI(out)); }); };
     kiv::platform::FailCall(Call::telephony_modem_get_imei, -1, kEveryCall, 0);

@@ -19,7 +19,7 @@ struct Language : DeviceTest
     }
 };
 
-TEST_F(Language, HasTheIsoCodeThatIsListed)
+TEST_F(Language, HasItsListedIsoCode)
 {
     const Column listed = Find(Read("language.tsv"), 1, 0);
     ASSERT_EQ(160U, listed.size());

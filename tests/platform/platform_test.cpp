@@ -91,7 +91,7 @@ struct Changes : testing::Test
     const std::string path = directory + "/my device";
 };
 
-TEST_F(Changes, OfAFileAreToldHoweverItIsWrittenAndThoseThatBreakItAreComplainedAboutOnce)
+TEST_F(Changes, OfAFileAreFollowedHoweverItIsWritten)
 {
     static std::atomic<bool> isOn, isOver;
     const auto follow = [](runtime_info_key_e key, void*)
@@ -119,7 +119,7 @@ TEST_F(Changes, OfAFileAreToldHoweverItIsWrittenAndThoseThatBreakItAreComplained
     IterateUntil([] { return isOver.load(); }); // one written in place
 }
 
-TEST_F(Changes, AreNotBeingToldAnyMoreWhenAnUnregistrationReturned)
+TEST_F(Changes, AreNotDeliveredAfterAnUnregistrationReturned)
 {
     static std::atomic<int> step;
     const auto slowly = [](runtime_info_key_e, void*)

@@ -30,7 +30,7 @@ struct Push : BusTest
     const std::string error = Line("", "E", "DeliverPushMessage");
 };
 
-TEST_F(Push, ReachesEverySubscriberThatItCanWithTheTextsAndTheTimeThatWereHandedIn)
+TEST_F(Push, CarriesItsTextsAndTimeToEverySubscriber)
 {
     Peer first(bus), last(bus, "org.example.Last");
     Subscribe(first);
@@ -74,7 +74,7 @@ TEST_F(Push, LogsEachStepOfADelivery)
     EXPECT_EQ(expected, Steps());
 }
 
-TEST_F(Push, IsNotStartedWithATextThatCanNotGoOnTheBus)
+TEST_F(Push, IsNotStartedWithATextThatCannotGoOnTheBus)
 {
     for (const auto& [bad, flaw] : {std::pair<const char*, std::string>(nullptr, " is null"), {"\xFF", " is not valid UTF-8"}})
     {
@@ -106,7 +106,7 @@ TEST_F(Push, WaitsForTheLoopOfTheThreadDefaultContextOfWhoeverStartedIt)
     EXPECT_THAT(client.Calls(), ElementsAre(HasSubstr(".auth "), call));
 }
 
-TEST_F(Push, FailsWhenTheBusDiesAndTheNextOneGoesToTheNewBus)
+TEST_F(Push, GoesToTheNewBusAfterOneThatDied)
 {
     Connection agents(g_bus_get_sync(G_BUS_TYPE_SYSTEM, nullptr, nullptr)); // with which GDBus would end the process
     Peer silent(bus, "", Peer::InsteadDo([] {}));

@@ -105,7 +105,7 @@ struct KivctlTest : testing::Test
     PrivateBus bus;
 };
 
-TEST_F(KivctlTest, AnswersAndRefusesWithTheDocumentedExitCode)
+TEST_F(KivctlTest, EndsWithTheDocumentedExitCode)
 {
     const std::tuple<std::string, int, const char*, const char*> cases[] = {
         {"--version", 0, "kivctl " KIV_VERSION "\n", ""},
@@ -164,7 +164,7 @@ TEST_F(KivctlTest, AnswersAndRefusesWithTheDocumentedExitCode)
     EXPECT_EQ(10, Outcome("env KIV_PROFILE=tripel " KIVCTL " network").exit);
 }
 
-TEST_F(KivctlTest, CarriesEveryNotificationToSubscribersAndToTheServiceManagerAndTellsWhichDeliveriesFailed)
+TEST_F(KivctlTest, CarriesEveryNotificationToItsReceivers)
 {
     const Service services(KIVCTL " services --serial S1");
     const Service all(KIVCTL " subscribe --name a.all --key 7 --kind policy --kind status --kind auth --kind activated"
@@ -288,7 +288,7 @@ TEST_F(KivctlTest, PrintsWhatThePagesShow)
     }
 }
 
-TEST_F(KivctlTest, ManPageCompletionAndPageMissNoVerbOptionOrExitCodeOfTheHelp)
+TEST_F(KivctlTest, PagesAndCompletionListAllThatTheHelpLists)
 {
     const std::string man = std::regex_replace(Kivctl("print-man-page").out, std::regex(R"(\\([-:]))"), "$1");
     const std::string general = Kivctl("--help").out, page = Contents(KIV_DOCS "/kivctl.md");
@@ -324,7 +324,7 @@ TEST_F(KivctlTest, ManPageCompletionAndPageMissNoVerbOptionOrExitCodeOfTheHelp)
     }
 }
 
-TEST_F(KivctlTest, ColoursAndReportsProgressOnATerminal)
+TEST_F(KivctlTest, ShowsColoursAndProgressOnATerminal)
 {
     const std::string colour = "\033[1m", progress = "\r\033[Klooking at the bus";
     const std::string onTerminal = " script --quiet --command '" KIVCTL " doctor' /dev/null";
