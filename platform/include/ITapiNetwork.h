@@ -1,5 +1,5 @@
 /// @file
-/// Which SIM the device uses for what. Results and threads as in TapiUtility.h.
+/// Which SIM the device uses for which purpose. Results and threads as in TapiUtility.h.
 #ifndef KIV_PLATFORM_ITAPINETWORK_H
 #define KIV_PLATFORM_ITAPINETWORK_H
 
@@ -24,10 +24,10 @@ typedef enum PLATFORM_OPEN_ENUM
     TAPI_NETWORK_DEFAULT_DATA_SUBS_SIM2 = 1
 } TelNetworkDefaultDataSubs_t;
 
-/// @param subscription  receives a TelNetworkDefaultSubs_t, possibly one that is not named
+/// @param subscription  receives a TelNetworkDefaultSubs_t, possibly a value without a name here
 int tel_get_network_default_subscription(TapiHandle* handle, TelNetworkDefaultSubs_t* subscription);
 
-/// @param subscription  receives a TelNetworkDefaultDataSubs_t, possibly one that is not named
+/// @param subscription  receives a TelNetworkDefaultDataSubs_t, possibly a value without a name here
 int tel_get_network_default_data_subscription(TapiHandle* handle, TelNetworkDefaultDataSubs_t* subscription);
 
 PLATFORM_END_DECLS

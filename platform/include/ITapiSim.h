@@ -25,22 +25,22 @@ typedef enum PLATFORM_OPEN_ENUM
     TAPI_SIM_STATUS_SIM_LOCK_REQUIRED = 12,
     TAPI_SIM_STATUS_CARD_CRASHED = 13,
     TAPI_SIM_STATUS_CARD_POWEROFF = 14,
-    TAPI_SIM_STATUS_UNKNOWN = 255 ///< as it is before the first answer of the card
+    TAPI_SIM_STATUS_UNKNOWN = 255 ///< before the first answer of the card
 } TelSimCardStatus_t;
 
-/// Whose SIM this is, as NUL-terminated digits; all three in a row are the IMSI.
+/// The identity on the SIM, as NUL-terminated digits. The three parts in a row are the IMSI.
 typedef struct
 {
     char szMcc[3 + 1];   ///< mobile country code, 3 digits
     char szMnc[3 + 1];   ///< mobile network code, 2 or 3 digits
-    char szMsin[10 + 1]; ///< subscriber within the network, the rest
+    char szMsin[10 + 1]; ///< subscriber within the network: the remaining digits
 } TelSimImsiInfo_t;
 
-/// @param status        receives a TelSimCardStatus_t, possibly one that is not named
-/// @param card_changed  receives 1 when the card is another than at the last start, else 0
+/// @param status        receives a TelSimCardStatus_t, possibly a value without a name here
+/// @param card_changed  receives 1 when the card has changed since the last start, else 0
 int tel_get_sim_init_info(TapiHandle* handle, TelSimCardStatus_t* status, int* card_changed);
 
-/// @param imsi  receives the record, which is filled on success only
+/// @param imsi  receives the record; filled on success only
 int tel_get_sim_imsi(TapiHandle* handle, TelSimImsiInfo_t* imsi);
 
 PLATFORM_END_DECLS

@@ -27,12 +27,12 @@ typedef enum
     DLOG_FATAL = 7
 } log_priority;
 
-/// Appends one line to a log buffer.
+/// Appends one line to a log buffer. The caller ends the line itself.
 /// @param log_id  a log_id_t
 /// @param prio    a log_priority
-/// @param tag     who writes; borrowed
-/// @param fmt     as printf takes it; the caller ends the line itself
-/// @return the number of bytes written, or a negative value; callers do not look at it
+/// @param tag     name of the writer; borrowed
+/// @param fmt     a format as for printf()
+/// @return the number of bytes written, or a negative value; callers ignore it
 /// Any thread; does not block.
 int __dlog_print(log_id_t log_id, int prio, const char* tag, const char* fmt, ...) __attribute__((format(printf, 4, 5)));
 

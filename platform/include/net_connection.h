@@ -1,5 +1,6 @@
 /// @file
-/// The state of the network connections. Every function gives 0, else an error code and an untouched out-parameter. Any thread.
+/// The state of the network connections. Every function returns 0, else an error code, and then leaves its
+/// out-parameter untouched. Any thread.
 #ifndef KIV_PLATFORM_NET_CONNECTION_H
 #define KIV_PLATFORM_NET_CONNECTION_H
 
@@ -34,18 +35,18 @@ typedef enum PLATFORM_OPEN_ENUM
     CONNECTION_BT_STATE_CONNECTED = 2
 } connection_bt_state_e;
 
-/// @param connection  receives a handle that is released with connection_destroy()
+/// @param connection  receives a handle, which the caller releases with connection_destroy()
 int connection_create(connection_h* connection);
 
 int connection_destroy(connection_h connection);
 
-/// @param state  receives a connection_cellular_state_e, possibly one that is not named
+/// @param state  receives a connection_cellular_state_e, possibly a value without a name here
 int connection_get_cellular_state(connection_h connection, connection_cellular_state_e* state);
 
-/// @param state  receives a connection_wifi_state_e, possibly one that is not named
+/// @param state  receives a connection_wifi_state_e, possibly a value without a name here
 int connection_get_wifi_state(connection_h connection, connection_wifi_state_e* state);
 
-/// @param state  receives a connection_bt_state_e, possibly one that is not named
+/// @param state  receives a connection_bt_state_e, possibly a value without a name here
 int connection_get_bt_state(connection_h connection, connection_bt_state_e* state);
 
 PLATFORM_END_DECLS

@@ -1,5 +1,5 @@
 /// @file
-/// What is known of one package. Every function gives 0, else an error code and an untouched out-parameter. Any thread.
+/// Facts about one package. Every function returns 0, else an error code, and then leaves its out-parameter untouched. Any thread.
 #ifndef KIV_PLATFORM_PACKAGE_INFO_H
 #define KIV_PLATFORM_PACKAGE_INFO_H
 
@@ -9,9 +9,9 @@ PLATFORM_BEGIN_DECLS
 
 typedef struct package_info* package_info_h;
 
-/// Opens what is known of a package; PACKAGE_MANAGER_ERROR_NO_SUCH_PACKAGE when nothing is.
+/// Opens the record of a package. Returns PACKAGE_MANAGER_ERROR_NO_SUCH_PACKAGE for an unknown package.
 /// @param package_id    borrowed
-/// @param package_info  receives a handle that is released with package_info_destroy()
+/// @param package_info  receives a handle, which the caller releases with package_info_destroy()
 int package_info_create(const char* package_id, package_info_h* package_info);
 
 int package_info_destroy(package_info_h package_info);

@@ -1,5 +1,5 @@
 /// @file
-/// What is installed.
+/// Installed packages.
 #ifndef KIV_PLATFORM_PACKAGE_MANAGER_H
 #define KIV_PLATFORM_PACKAGE_MANAGER_H
 
@@ -18,7 +18,7 @@ typedef struct package_size_info* package_size_info_h;
 
 typedef void (*package_manager_size_info_receive_cb)(const char* package_id, const package_size_info_h size_info, void* user_data);
 
-/// Asks for the sizes of a package; the result says whether the package is known.
+/// Requests the sizes of a package. The result says whether the package is known.
 /// @param package_id  borrowed
 /// @param callback    receives the sizes; null when only the result matters
 /// @return PACKAGE_MANAGER_ERROR_NONE, PACKAGE_MANAGER_ERROR_NO_SUCH_PACKAGE, or another error code

@@ -1,10 +1,10 @@
 /// @file
-/// What every header of the platform is framed with.
+/// Macros that every header of the platform uses.
 #ifndef KIV_PLATFORM_DECLS_H
 #define KIV_PLATFORM_DECLS_H
 
-/// PLATFORM_OPEN_ENUM makes an enumeration an open one: services may give values that its header does not name, so in C++ it
-/// stands on int, and any int may be stored in it and read from it.
+/// PLATFORM_OPEN_ENUM makes an enumeration an open one. Services may return values that its header does not name, so its
+/// underlying type in C++ is int: any int may be stored in it and read from it.
 #ifdef __cplusplus
 #define PLATFORM_BEGIN_DECLS                                                                                                       \
     extern "C"                                                                                                                     \

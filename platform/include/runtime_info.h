@@ -1,6 +1,6 @@
 /// @file
-/// What the device is doing now, and being told when that changes. Every function gives 0, else an error code and an untouched
-/// out-parameter; a key that is not of the asked type is an error. Any thread.
+/// The state of the device, and notifications of its changes. Every function returns 0, else an error code, and then leaves its
+/// out-parameter untouched. A key of another type is an error. Any thread.
 #ifndef KIV_PLATFORM_RUNTIME_INFO_H
 #define KIV_PLATFORM_RUNTIME_INFO_H
 
@@ -30,12 +30,12 @@ int runtime_info_get_value_int(runtime_info_key_e key, int* value);
 
 int runtime_info_get_value_bool(runtime_info_key_e key, bool* value);
 
-/// Asks to be told of each change of one value, on a thread of the platform's; a second registration for the key replaces the
-/// first. The new value is there to be read when the callback runs.
+/// Registers a callback for changes of one value. A second registration for the key replaces the first. The callback runs on a
+/// thread of the platform and can read the new value.
 int runtime_info_set_changed_cb(runtime_info_key_e key, runtime_info_changed_cb callback, void* user_data);
 
-/// Ends a registration; without one it is an error. When it returns, the callback is not running and will not run any more;
-/// called from within a callback it does not wait for callbacks that run on other threads.
+/// Ends a registration; an error when there is none. When it returns, the callback is not running and will not run again.
+/// Within a callback it does not wait for callbacks on other threads.
 int runtime_info_unset_changed_cb(runtime_info_key_e key);
 
 PLATFORM_END_DECLS

@@ -1,5 +1,5 @@
 /// @file
-/// Facts of the device and of its platform.
+/// Facts about the device and its platform.
 #ifndef KIV_PLATFORM_SYSTEM_INFO_H
 #define KIV_PLATFORM_SYSTEM_INFO_H
 

@@ -1,6 +1,6 @@
 /// @file
-/// What the user has set. Every function gives 0, else an error code and an untouched out-parameter; a key that is not of the
-/// asked type is an error. Any thread.
+/// The user's settings. Every function returns 0, else an error code, and then leaves its out-parameter untouched. A key of
+/// another type is an error. Any thread.
 #ifndef KIV_PLATFORM_SYSTEM_SETTINGS_H
 #define KIV_PLATFORM_SYSTEM_SETTINGS_H
 

@@ -1,7 +1,7 @@
 /// @file
 /// Telephony, one handle per SIM slot.
-/// Every function gives 0 on success, else an error code and, unless it says otherwise, untouched out-parameters. All block on
-/// the modem; any thread.
+/// Every function returns 0 on success, else an error code, and then leaves its out-parameters untouched unless it says otherwise.
+/// All block on the modem. Any thread.
 #ifndef KIV_PLATFORM_TELEPHONY_H
 #define KIV_PLATFORM_TELEPHONY_H
 
@@ -29,10 +29,10 @@ typedef enum PLATFORM_OPEN_ENUM
 
 typedef enum PLATFORM_OPEN_ENUM
 {
-    TELEPHONY_SIM_STATE_UNAVAILABLE = 0, ///< no card, or none that works
+    TELEPHONY_SIM_STATE_UNAVAILABLE = 0, ///< no card, or no working one
     TELEPHONY_SIM_STATE_LOCKED = 1,      ///< the card waits for a code
     TELEPHONY_SIM_STATE_AVAILABLE = 2,
-    TELEPHONY_SIM_STATE_UNKNOWN = 3 ///< not settled yet
+    TELEPHONY_SIM_STATE_UNKNOWN = 3 ///< not known yet
 } telephony_sim_state_e;
 
 typedef enum PLATFORM_OPEN_ENUM
@@ -43,26 +43,26 @@ typedef enum PLATFORM_OPEN_ENUM
 } telephony_network_service_state_e;
 
 /// Opens one handle per slot.
-/// @param list  receives the handles, to be released with telephony_deinit(); a device without slots gives a count of 0
+/// @param list  receives the handles, which the caller releases with telephony_deinit(); the count is 0 on a device without slots
 int telephony_init(telephony_handle_list_s* list);
 
-/// Closes every handle of a list; the handles of all copies of the list are closed with it.
-/// @param list  as telephony_init() filled it, or a copy; emptied
+/// Closes every handle of a list. Copies of the list share these handles.
+/// @param list  a list of telephony_init(), or a copy; emptied
 int telephony_deinit(telephony_handle_list_s* list);
 
 /// @param imei  receives the number of the slot's modem; free() it
 int telephony_modem_get_imei(telephony_h handle, char** imei);
 
-/// @param state  receives a telephony_sim_state_e, possibly one that is not named
+/// @param state  receives a telephony_sim_state_e, possibly a value without a name here
 int telephony_sim_get_state(telephony_h handle, telephony_sim_state_e* state);
 
 /// @param number  receives the subscriber number, which may be empty or null; free() it
 int telephony_sim_get_subscriber_number(telephony_h handle, char** number);
 
-/// @param state  receives a telephony_network_service_state_e, possibly one that is not named
+/// @param state  receives a telephony_network_service_state_e, possibly a value without a name here
 int telephony_network_get_service_state(telephony_h handle, telephony_network_service_state_e* state);
 
-/// @param roaming  receives whether the slot is registered with a foreign network; of meaning while in service
+/// @param roaming  receives whether the slot is registered with a foreign network; meaningful only in service
 int telephony_network_get_roaming_status(telephony_h handle, bool* roaming);
 
 PLATFORM_END_DECLS

@@ -8,7 +8,7 @@
 PLATFORM_BEGIN_DECLS
 
 /// @param in_key  such as "db/csc/salescode", the sales code of the device; borrowed
-/// @return the text, which the caller frees with free(), or null when there is no such text
+/// @return the text, which the caller releases with free(); null when there is none
 /// Any thread.
 char* vconf_get_str(const char* in_key);
 

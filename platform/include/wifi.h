@@ -1,5 +1,6 @@
 /// @file
-/// Changes of Wi-Fi. Every function gives 0, else an error code. Any thread; callbacks run on a thread of the platform's.
+/// Notifications of Wi-Fi changes. Every function returns 0, else an error code. Any thread. Callbacks run on a thread of the
+/// platform.
 #ifndef KIV_PLATFORM_WIFI_H
 #define KIV_PLATFORM_WIFI_H
 
@@ -7,7 +8,7 @@
 
 PLATFORM_BEGIN_DECLS
 
-/// An access point; valid while the callback that got it runs.
+/// An access point; valid while the callback that received it runs.
 typedef void* wifi_ap_h;
 
 typedef enum PLATFORM_OPEN_ENUM
@@ -32,20 +33,20 @@ typedef void (*wifi_device_state_changed_cb)(wifi_device_state_e state, void* us
 /// @param user_data  that of the registration
 typedef void (*wifi_connection_state_changed_cb)(wifi_connection_state_e state, wifi_ap_h ap, void* user_data);
 
-/// Makes the other functions usable; may be called again.
+/// Prepares the other functions; may be called again.
 int wifi_initialize(void);
 
-/// Asks to be told of each change; a second registration replaces the first.
+/// Registers a callback for each change. A second registration replaces the first.
 int wifi_set_device_state_changed_cb(wifi_device_state_changed_cb callback, void* user_data);
 
-/// Ends the registration; without one it is an error. When it returns, the callback is not running and will not run any more;
-/// called from within a callback it does not wait for callbacks that run on other threads.
+/// Ends the registration; an error when there is none. When it returns, the callback is not running and will not run again.
+/// Within a callback it does not wait for callbacks on other threads.
 int wifi_unset_device_state_changed_cb(void);
 
-/// As wifi_set_device_state_changed_cb().
+/// See wifi_set_device_state_changed_cb().
 int wifi_set_connection_state_changed_cb(wifi_connection_state_changed_cb callback, void* user_data);
 
-/// As wifi_unset_device_state_changed_cb().
+/// See wifi_unset_device_state_changed_cb().
 int wifi_unset_connection_state_changed_cb(void);
 
 PLATFORM_END_DECLS
