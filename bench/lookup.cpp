@@ -1,3 +1,4 @@
+#include "../lib/DASystem/src/CountryTables.h"
 #include "Items.h"
 #include "Ratios.h"
 
@@ -19,12 +20,8 @@ namespace kiv::bench
 namespace
 {
 
-#define KIV_COUNTRY(mcc, countryCode, countryName) mcc,
-#define KIV_COUNTRY_MO KIV_COUNTRY
-constexpr const char* kMccs[] = {
-#include "../lib/DASystem/src/tables/CountryInfo.inc"
-};
-constexpr const char* kLastMcc = kMccs[std::size(kMccs) - 1];
+constexpr const auto& kCountries = listed::kCountryInfo;
+constexpr const char* kLastMcc = kCountries[std::size(kCountries) - 1].mcc;
 
 void LibraryLookup(const char* mcc)
 {
@@ -52,8 +49,8 @@ Side EveryKey(void (*lookup)(const char*))
 {
     return {[lookup]
         {
-            for (const char* mcc : kMccs)
-                lookup(mcc);
+            for (const auto& country : kCountries)
+                lookup(country.mcc);
         }};
 }
 
@@ -86,10 +83,10 @@ constexpr const char* kByCallingCode = "facade lookup by calling code, all keys,
 std::vector<std::string> CallingCodes()
 {
     std::vector<std::string> codes;
-    for (const char* mcc : kMccs)
+    for (const auto& country : kCountries)
     {
         char* code = nullptr;
-        DASystem::GetInstance()->GetCountryCallingCodeFromMcc(mcc, &code);
+        DASystem::GetInstance()->GetCountryCallingCodeFromMcc(country.mcc, &code);
         if (code != nullptr)
             codes.emplace_back(code);
         std::free(code);
@@ -111,7 +108,7 @@ void CompareRegions(Table& table)
         for (std::size_t i = 0; i < codes.size(); ++i)
         {
             char* region = nullptr;
-            facade->GetCountryCodeFromMcc(kMccs[i], &region);
+            facade->GetCountryCodeFromMcc(kCountries[i].mcc, &region);
             benchmark::DoNotOptimize(region);
             std::free(region);
         }
@@ -158,7 +155,7 @@ void MeasureLookups(Table& table)
 {
     Compare(
         table, {"facade lookup, worst key, against naive", {0.12}, CpuNs, 1000, WorstKey(LibraryLookup), WorstKey(NaiveLookup)});
-    Compare(table, {"facade lookup, all keys, against naive", {0.15}, CpuNs, std::size(kMccs), EveryKey(LibraryLookup),
+    Compare(table, {"facade lookup, all keys, against naive", {0.15}, CpuNs, std::size(kCountries), EveryKey(LibraryLookup),
                        EveryKey(NaiveLookup)});
     CompareRegions(table);
     Compare(table, {"GetInstance(), one thread, against naive", {0.25}, CpuNs, kInstances, {Instances<DASimManager>()},

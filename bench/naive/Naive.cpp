@@ -1,6 +1,6 @@
 #include "Naive.h"
 
-#include "Country.h"
+#include "CountryTables.h"
 
 #include <cstdio>
 #include <cstring>
@@ -15,12 +15,6 @@ namespace naive
 
 namespace
 {
-
-#define KIV_COUNTRY(mcc, countryCode, countryName) {mcc, countryCode, countryName},
-#define KIV_COUNTRY_MO KIV_COUNTRY
-const kiv::CountryInfo table[] = {
-#include "tables/CountryInfo.inc"
-};
 
 std::mutex& Named(const char* name)
 {
@@ -46,7 +40,7 @@ Manager* Manager::GetInstance()
 
 void Manager::GetCountryNameFromMcc(const char* mcc, char** countryName)
 {
-    for (const kiv::CountryInfo& row : table)
+    for (const auto& row : kiv::listed::kCountryInfo)
     {
         if (g_strcmp0(row.mcc, mcc) == 0)
         {

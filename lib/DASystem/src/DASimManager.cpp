@@ -1,8 +1,7 @@
 #include "DASimManager.h"
 
-#include "Country.h"
+#include "CountryTables.h"
 #include "Handles.h"
-#include "Lookup.h"
 #include "Singleton.h"
 
 #include <DAMutex.h>
@@ -15,9 +14,12 @@
 #include <unistd.h>
 #include <utility>
 
-using kiv::CountryInfo;
+using kiv::Alpha3CountryCodeTable;
+using kiv::CountryCallingCodeTable;
+using kiv::CountryInfoTable;
 using kiv::CString;
 using kiv::Place;
+using kiv::ServiceCountryCodeTable;
 
 DASimManager* DASimManager::__pInstance = nullptr;
 
@@ -26,72 +28,13 @@ DASimManager* DASimManager::__pInstance = nullptr;
 namespace
 {
 
-struct ServiceCountryCode
+/// A copy of the cell beside the first one with this key; null, and the error line, when there is none.
+template <class Keys, class Cells>
+char* Lookup(const Keys& keys, const char* key, const Cells& cells, const Place& here, const char* failure)
 {
-    const char* mcc;
-    const char* serviceCountryCode; ///< as "en_GB"
-};
-
-struct CountryCallingCode
-{
-    const char* mcc;
-    const char* countryCallingCode; ///< digits, ITU-T E.164
-};
-
-struct Alpha3CountryCode
-{
-    const char* mcc;
-    const char* alpha3CountryCode; ///< ISO 3166-1 alpha-3, upper case
-};
-
-#define KIV_COUNTRY(mcc, countryCode, countryName) {mcc, countryCode, countryName},
-#define KIV_COUNTRY_MO KIV_COUNTRY
-constexpr CountryInfo CountryInfoTable[] = {
-#include "tables/CountryInfo.inc"
-};
-static_assert(std::size(CountryInfoTable) == 236);
-#undef KIV_COUNTRY_MO
-#undef KIV_COUNTRY
-
-#define KIV_COUNTRY(mcc, countryCode, countryName)
-#define KIV_COUNTRY_MO(mcc, countryCode, countryName) {mcc, countryCode, countryName},
-constexpr CountryInfo MoSupportMccTable[] = {
-#include "tables/CountryInfo.inc"
-};
-static_assert(std::size(MoSupportMccTable) == 48);
-#undef KIV_COUNTRY_MO
-#undef KIV_COUNTRY
-
-constexpr ServiceCountryCode ServiceCountryCodeTable[] = {
-#include "tables/ServiceCountryCode.inc"
-};
-static_assert(std::size(ServiceCountryCodeTable) == 134);
-
-#define KIV_COUNTRY_CODE(mcc, alpha3CountryCode, countryCallingCode) {mcc, countryCallingCode},
-#define KIV_ALPHA3_ONLY(mcc, alpha3CountryCode)
-constexpr CountryCallingCode CountryCallingCodeTable[] = {
-#include "tables/CountryCodes.inc"
-};
-static_assert(std::size(CountryCallingCodeTable) == 236);
-#undef KIV_ALPHA3_ONLY
-#undef KIV_COUNTRY_CODE
-
-#define KIV_COUNTRY_CODE(mcc, alpha3CountryCode, countryCallingCode) {mcc, alpha3CountryCode},
-#define KIV_ALPHA3_ONLY(mcc, alpha3CountryCode) {mcc, alpha3CountryCode},
-constexpr Alpha3CountryCode Alpha3CountryCodeTable[] = {
-#include "tables/CountryCodes.inc"
-};
-static_assert(std::size(Alpha3CountryCodeTable) == 237);
-#undef KIV_ALPHA3_ONLY
-#undef KIV_COUNTRY_CODE
-
-/// A copy of one cell of the first row with this key; null, and the error line, when there is no such row.
-template <const auto& Table, auto Key, class Cell>
-char* Lookup(const char* key, Cell cell, const Place& here, const char* failure)
-{
-    const auto* const row = kiv::FirstRow<Table, Key>(key);
-    if (row != nullptr)
-        return strdup(row->*cell);
+    const std::size_t row = keys.FirstRow(key);
+    if (row != kiv::kNoRow)
+        return strdup(cells[row]);
     KIV_ERROR_AT(here, "%s", failure);
     return nullptr;
 }
@@ -108,7 +51,7 @@ DASimManager::~DASimManager() = default;
 
 bool DASimManager::IsValidMcc(char* mcc)
 {
-    if (kiv::FirstRow<CountryInfoTable, &CountryInfo::mcc>(mcc) != nullptr)
+    if (CountryInfoTable::mcc.FirstRow(mcc) != kiv::kNoRow)
         return true;
     KIV_ERROR("mcc is invalid");
     return false;
@@ -116,52 +59,52 @@ bool DASimManager::IsValidMcc(char* mcc)
 
 bool DASimManager::IsMoSupportMcc(const char* mcc)
 {
-    return kiv::FirstRow<MoSupportMccTable, &CountryInfo::mcc>(mcc) != nullptr;
+    return kiv::MoSupportMccTable::mcc.FirstRow(mcc) != kiv::kNoRow;
 }
 
 void DASimManager::GetCountryCodeFromMcc(const char* mcc, char** countryCode)
 {
-    *countryCode = Lookup<CountryInfoTable, &CountryInfo::mcc>(mcc, &CountryInfo::countryCode, KIV_HERE, "fail to get countrycode");
+    *countryCode = Lookup(CountryInfoTable::mcc, mcc, CountryInfoTable::countryCode, KIV_HERE, "fail to get countrycode");
 }
 
 void DASimManager::GetCountryNameFromMcc(const char* mcc, char** countryName)
 {
-    *countryName = Lookup<CountryInfoTable, &CountryInfo::mcc>(mcc, &CountryInfo::countryName, KIV_HERE, "fail to get countryName");
+    *countryName = Lookup(CountryInfoTable::mcc, mcc, CountryInfoTable::countryName, KIV_HERE, "fail to get countryName");
 }
 
 void DASimManager::GetMccFromCountryCode(const char* countryCode, char** mcc)
 {
-    *mcc = Lookup<CountryInfoTable, &CountryInfo::countryCode>(countryCode, &CountryInfo::mcc, KIV_HERE, "fail to get mcc");
+    *mcc = Lookup(CountryInfoTable::countryCode, countryCode, CountryInfoTable::mcc, KIV_HERE, "fail to get mcc");
 }
 
 void DASimManager::GetMccFromServiceCountryCode(const char* serviceCountryCode, char** mcc)
 {
-    *mcc = Lookup<ServiceCountryCodeTable, &ServiceCountryCode::serviceCountryCode>(
-        serviceCountryCode, &ServiceCountryCode::mcc, KIV_HERE, "fail to get mcc");
+    *mcc = Lookup(
+        ServiceCountryCodeTable::serviceCountryCode, serviceCountryCode, ServiceCountryCodeTable::mcc, KIV_HERE, "fail to get mcc");
 }
 
 void DASimManager::GetMccFromCountryCallingCode(const char* countryCallingCode, char** mcc)
 {
-    *mcc = Lookup<CountryCallingCodeTable, &CountryCallingCode::countryCallingCode>(
-        countryCallingCode, &CountryCallingCode::mcc, KIV_HERE, "fail to get mcc");
+    *mcc = Lookup(
+        CountryCallingCodeTable::countryCallingCode, countryCallingCode, CountryCallingCodeTable::mcc, KIV_HERE, "fail to get mcc");
 }
 
 void DASimManager::GetServiceCountryCodeFromMcc(const char* mcc, char** serviceCountryCode)
 {
-    *serviceCountryCode = Lookup<ServiceCountryCodeTable, &ServiceCountryCode::mcc>(
-        mcc, &ServiceCountryCode::serviceCountryCode, KIV_HERE, "fail to get serviceCountryCode");
+    *serviceCountryCode = Lookup(
+        ServiceCountryCodeTable::mcc, mcc, ServiceCountryCodeTable::serviceCountryCode, KIV_HERE, "fail to get serviceCountryCode");
 }
 
 void DASimManager::GetCountryCallingCodeFromMcc(const char* mcc, char** countryCallingCode)
 {
-    *countryCallingCode = Lookup<CountryCallingCodeTable, &CountryCallingCode::mcc>(
-        mcc, &CountryCallingCode::countryCallingCode, KIV_HERE, "fail to get countryCallingCode");
+    *countryCallingCode = Lookup(
+        CountryCallingCodeTable::mcc, mcc, CountryCallingCodeTable::countryCallingCode, KIV_HERE, "fail to get countryCallingCode");
 }
 
 void DASimManager::GetAlpha3CountryCodeFromMcc(const char* mcc, char** alpha3CountryCode)
 {
-    *alpha3CountryCode = Lookup<Alpha3CountryCodeTable, &Alpha3CountryCode::mcc>(
-        mcc, &Alpha3CountryCode::alpha3CountryCode, KIV_HERE, "fail to get alpha3CountryCode");
+    *alpha3CountryCode = Lookup(
+        Alpha3CountryCodeTable::mcc, mcc, Alpha3CountryCodeTable::alpha3CountryCode, KIV_HERE, "fail to get alpha3CountryCode");
 }
 
 // Locks and handles ------------------------------------------------------------------------------------------------------------

@@ -1,11 +1,10 @@
 #include "DASystem.h"
 
-#include "Country.h"
+#include "CountryTables.h"
 #include "DAConnectionManager.h"
 #include "DADBusManager.h"
 #include "DASimManager.h"
 #include "Handles.h"
-#include "Lookup.h"
 #include "Policy.h"
 #include "Singleton.h"
 
@@ -25,37 +24,11 @@
 #include <utility>
 
 using kiv::Ask;
-using kiv::CountryInfo;
 using kiv::CString;
 using kiv::kFailure;
 using kiv::Place;
 
 DASystem* DASystem::__pInstance = nullptr;
-
-namespace
-{
-
-struct ISO639LangCode
-{
-    const char* iso639LangCode; ///< ISO 639-2
-    const char* deviceLangCode; ///< ISO 639-1, upper case
-};
-
-#define KIV_COUNTRY(mcc, countryCode, countryName) {mcc, countryCode, countryName},
-#define KIV_COUNTRY_MO KIV_COUNTRY
-constexpr CountryInfo SystemCountryInfoTable[] = {
-#include "tables/CountryInfo.inc"
-};
-static_assert(std::size(SystemCountryInfoTable) == 236);
-#undef KIV_COUNTRY_MO
-#undef KIV_COUNTRY
-
-constexpr ISO639LangCode ISO639LangCodeTable[] = {
-#include "tables/ISO639LangCode.inc"
-};
-static_assert(std::size(ISO639LangCodeTable) == 160);
-
-} // namespace
 
 DASystem* DASystem::GetInstance()
 {
@@ -445,8 +418,8 @@ void DASystem::GetCountryNameAlpha2FromCountryCallingCode(const char* countryCal
     if (!mcc)
         return;
     // An MCC that two countries share is answered by the last of them.
-    const auto* const row = kiv::LastRow<SystemCountryInfoTable, &CountryInfo::mcc>(mcc.get());
-    *countryCode = row == nullptr ? nullptr : const_cast<char*>(row->countryCode);
+    const std::size_t row = kiv::CountryInfoTable::mcc.LastRow(mcc.get());
+    *countryCode = row == kiv::kNoRow ? nullptr : const_cast<char*>(kiv::CountryInfoTable::countryCode[row]);
 }
 
 // Notifications ----------------------------------------------------------------------------------------------------------------
@@ -734,8 +707,8 @@ int DASystem::GetDeviceLanguageCode(char** languageCode, bool isISO639)
 
 void DASystem::GetISO639LangCodeFromDeviceLang(std::string deviceLang, char** iso639LangCode)
 {
-    const auto* const row = kiv::FirstRow<ISO639LangCodeTable, &ISO639LangCode::deviceLangCode>(deviceLang.c_str());
-    *iso639LangCode = row == nullptr ? nullptr : const_cast<char*>(row->iso639LangCode);
+    const std::size_t row = kiv::ISO639LangCodeTable::deviceLangCode.FirstRow(deviceLang.c_str());
+    *iso639LangCode = row == kiv::kNoRow ? nullptr : const_cast<char*>(kiv::ISO639LangCodeTable::iso639LangCode[row]);
 }
 
 int DASystem::GetTagStartPosition(std::string source, std::string tag)

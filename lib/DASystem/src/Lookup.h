@@ -1,5 +1,8 @@
 /// @file
-/// One linear pass over a constant table.
+/// The columns of constant tables, and one linear pass over a column.
+///
+/// A table is written as rows of pointers to texts, which exist only while it is compiled. The library holds columns that contain
+/// the texts themselves: they need no relocation, so no process has to write to their pages.
 #ifndef KIV_LOOKUP_H
 #define KIV_LOOKUP_H
 
@@ -7,10 +10,13 @@
 #include <cstddef>
 #include <cstdint>
 #include <iterator>
+#include <string_view>
 #include <type_traits>
 
 namespace kiv
 {
+
+static_assert(__BYTE_ORDER__ == __ORDER_LITTLE_ENDIAN__, "the bytes of a packed text are the text");
 
 /// A text packed into an integer, first byte lowest: equal integers mean equal texts. 0 for a text that is null, empty or longer
 /// than the integer.
@@ -28,93 +34,126 @@ constexpr Word Pack(const char* text)
     return 0;
 }
 
-/// A key column of a table, packed when it is compiled, in row order: what a pass over the table reads.
-template <const auto& Table, auto Key>
-struct KeyColumn
-{
-    static constexpr std::size_t kRows = std::size(Table);
+/// What a pass returns when no cell holds the key.
+constexpr std::size_t kNoRow = SIZE_MAX;
 
-    /// Whether every key of the column can be told in such an integer.
+/// A pass looks at blocks of so many cells at once, which the compiler turns into vector instructions, and then finds the row in
+/// its block.
+constexpr std::size_t kBlock = 8;
+
+/// Whether one of the cells in the block from a row on is the wanted one.
+template <class Word>
+bool BlockHolds(const Word* block, Word wanted)
+{
+    Word found = 0;
+    for (std::size_t i = 0; i < kBlock; ++i)
+        found |= block[i] == wanted ? static_cast<Word>(-1) : 0;
+    return found != 0;
+}
+
+/// A column of texts of 1 to 7 bytes, each in place in a cell as wide as an integer, so that a pass compares it at once.
+template <const auto& Rows, auto Cell>
+class KeyColumn
+{
+    static constexpr std::size_t kRows = std::size(Rows);
+
+    /// Whether every text fits into such an integer, and its end too.
     template <class Word>
     static constexpr bool Fits()
     {
-        for (const auto& row : Table)
+        for (const auto& row : Rows)
         {
-            if (Pack<Word>(row.*Key) == 0)
+            const std::size_t length = std::string_view(row.*Cell).size();
+            if (length == 0 || length >= sizeof(Word))
                 return false;
         }
         return true;
     }
 
     using Word = std::conditional_t<Fits<std::uint32_t>(), std::uint32_t, std::uint64_t>;
-    static_assert(Fits<Word>(), "a key is empty, or longer than the widest integer");
+    static_assert(Fits<Word>(), "a text is empty, or too long for the widest integer");
 
-    static constexpr std::array<Word, kRows> Packed()
+    static constexpr std::array<Word, std::size(Rows)> Packed()
     {
-        std::array<Word, kRows> column{};
-        for (std::size_t i = 0; i < kRows; ++i)
-            column[i] = Pack<Word>(Table[i].*Key);
+        std::array<Word, std::size(Rows)> column{};
+        for (std::size_t row = 0; row < column.size(); ++row)
+            column[row] = Pack<Word>(Rows[row].*Cell);
         return column;
     }
 
-    static constexpr std::array<Word, kRows> kKeys = Packed();
+    alignas(16) std::array<Word, std::size(Rows)> cells_ = Packed();
+
+public:
+    /// The text of a row, which lives as long as the process.
+    const char* operator[](std::size_t row) const { return reinterpret_cast<const char*>(&cells_[row]); }
+
+    /// The first row that holds this text to the letter; kNoRow when there is none, as for null.
+    std::size_t FirstRow(const char* key) const
+    {
+        const Word wanted = Pack<Word>(key);
+
+        std::size_t row = 0;
+        while (row + kBlock <= kRows && !BlockHolds(&cells_[row], wanted))
+            row += kBlock;
+        for (; row < kRows; ++row)
+        {
+            if (cells_[row] == wanted)
+                return row;
+        }
+        return kNoRow;
+    }
+
+    /// The last row that holds this text; the same otherwise.
+    std::size_t LastRow(const char* key) const
+    {
+        const Word wanted = Pack<Word>(key);
+
+        std::size_t end = kRows;
+        while (end >= kBlock && !BlockHolds(&cells_[end - kBlock], wanted))
+            end -= kBlock;
+        for (; end > 0; --end)
+        {
+            if (cells_[end - 1] == wanted)
+                return end - 1;
+        }
+        return kNoRow;
+    }
 };
 
-/// A pass looks at blocks of so many keys at once, which the compiler turns into vector instructions, and then finds the row in its
-/// block.
-constexpr std::size_t kBlock = 16;
-
-/// Whether one of the keys in the block from a row on is the wanted one.
-template <class Column>
-bool BlockHolds(std::size_t row, typename Column::Word wanted)
+/// A column of texts of any length, one behind the other. It has no keys.
+template <const auto& Rows, auto Cell>
+class TextColumn
 {
-    unsigned found = 0;
-    for (std::size_t i = 0; i < kBlock; ++i)
-        found |= static_cast<unsigned>(Column::kKeys[row + i] == wanted);
-    return found != 0;
-}
-
-/// The first row whose key equals this one to the letter; null when there is none, as for a null key.
-template <const auto& Table, auto Key>
-auto FirstRow(const char* key) -> decltype(&Table[0])
-{
-    using Column = KeyColumn<Table, Key>;
-    const auto wanted = Pack<typename Column::Word>(key);
-
-    std::size_t row = 0;
-    if constexpr (Column::kRows >= kBlock)
+    static constexpr std::size_t Size()
     {
-        while (row + kBlock <= Column::kRows && !BlockHolds<Column>(row, wanted))
-            row += kBlock;
+        std::size_t size = 0;
+        for (const auto& row : Rows)
+            size += std::string_view(row.*Cell).size() + 1;
+        return size;
     }
-    for (; row < Column::kRows; ++row)
-    {
-        if (Column::kKeys[row] == wanted)
-            return &Table[row];
-    }
-    return nullptr;
-}
 
-/// The last row whose key equals this one; the same otherwise.
-template <const auto& Table, auto Key>
-auto LastRow(const char* key) -> decltype(&Table[0])
-{
-    using Column = KeyColumn<Table, Key>;
-    const auto wanted = Pack<typename Column::Word>(key);
+    using Start = std::uint16_t;
+    static_assert(Size() <= UINT16_MAX, "the texts are longer than a start can count");
 
-    std::size_t end = Column::kRows;
-    if constexpr (Column::kRows >= kBlock)
+    std::array<char, Size()> texts_{};
+    std::array<Start, std::size(Rows)> starts_{};
+
+public:
+    constexpr TextColumn()
     {
-        while (end >= kBlock && !BlockHolds<Column>(end - kBlock, wanted))
-            end -= kBlock;
+        std::size_t end = 0;
+        for (std::size_t row = 0; row < std::size(Rows); ++row)
+        {
+            starts_[row] = static_cast<Start>(end);
+            for (const char ch : std::string_view(Rows[row].*Cell))
+                texts_[end++] = ch;
+            ++end; // past the text's end, which is there already
+        }
     }
-    for (; end > 0; --end)
-    {
-        if (Column::kKeys[end - 1] == wanted)
-            return &Table[end - 1];
-    }
-    return nullptr;
-}
+
+    /// The text of a row, which lives as long as the process.
+    const char* operator[](std::size_t row) const { return &texts_[starts_[row]]; }
+};
 
 } // namespace kiv
 
