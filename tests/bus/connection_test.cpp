@@ -6,8 +6,10 @@ namespace
 
 struct
 {
-    const char* refusal = nullptr;         // the message of the error; null: no error is set
+    int code = 0;                          // of the error
+    const char* refusal = nullptr;         // its message; null: no error is set
     GDBusConnection* connection = nullptr; // the shared one; null: there is none
+    bool closesAtOnce = false;             // before anybody gets it
 } gio;
 
 } // namespace
@@ -15,7 +17,9 @@ struct
 extern "C" GDBusConnection* g_bus_get_sync(GBusType, GCancellable*, GError** error)
 {
     if (gio.refusal != nullptr)
-        g_set_error_literal(error, G_IO_ERROR, 24, gio.refusal);
+        g_set_error_literal(error, G_IO_ERROR, gio.code, gio.refusal);
+    if (gio.closesAtOnce)
+        g_signal_emit_by_name(gio.connection, "closed", TRUE, nullptr);
     return gio.connection == nullptr ? nullptr : G_DBUS_CONNECTION(g_object_ref(gio.connection));
 }
 
@@ -29,23 +33,32 @@ namespace
 {
 
 using namespace kiv::test;
-using testing::ElementsAre;
 
 struct ConnectionTrouble : BusTest
 {
     ~ConnectionTrouble() override { gio = {}; }
+
+    int NotifyPolicyWithoutTexts()
+    {
+        return manager.SendNotiToServiceManager(KIV_NOTI_TYPE_POLICY, imsi, 7, nullptr, nullptr, nullptr, nullptr);
+    }
 };
 
 TEST_F(ConnectionTrouble, IsATimeOutOnlyWhenTheMessageSaysTime)
 {
-    const std::tuple<const char*, int, std::vector<std::string>> cases[] = {
-        {"Timeout was reached", 3, {"g_bus_get_sync() failed:[24:Timeout was reached]", "[dbus] DBUS_ERROR_CONNECTION_TIME_OUT"}},
-        {"the time is over", 1, {"g_bus_get_sync() failed:[24:the time is over]", "[dbus] DBUS_ERROR_CONNECTION_FAIL"}},
-        {nullptr, 1, {"[dbus] CORE_DBUS_ERROR_CONNECTION_FAIL"}},
+    const std::tuple<int, const char*, int, std::vector<std::string>> cases[] = {
+        {24, "Timeout was reached", 3,
+            {"g_bus_get_sync() failed:[24:Timeout was reached]", "[dbus] DBUS_ERROR_CONNECTION_TIME_OUT"}},
+        {24, "the time is over", 1, {"g_bus_get_sync() failed:[24:the time is over]", "[dbus] DBUS_ERROR_CONNECTION_FAIL"}},
+        {0, nullptr, 1, {"[dbus] CORE_DBUS_ERROR_CONNECTION_FAIL"}},
+        {0, "no way", 1, {"g_bus_get_sync() failed:[0:no way]", "[dbus] DBUS_ERROR_CONNECTION_FAIL"}}, // without a bus
     };
-    for (const auto& [message, code, reasons] : cases)
+    for (const auto& [errorCode, message, code, reasons] : cases)
     {
+        gio.code = errorCode;
         gio.refusal = message;
+        if (errorCode == 0 && message != nullptr)
+            bus.Stop();
         std::vector<std::string> lines = {Line("GDBusConnection is NULL", "E", "InitDbusConnection")};
         for (const std::string& reason : reasons)
             lines.push_back(Line(reason, "E", "InitDbusConnection"));
@@ -59,26 +72,64 @@ TEST_F(ConnectionTrouble, IsATimeOutOnlyWhenTheMessageSaysTime)
         lines.back() = Line("dbus connection error occured");
         EXPECT_EQ(code, NotifyServiceManager(KIV_NOTI_TYPE_NUMBER_CHANGED)) << "before its type matters";
         EXPECT_EQ(lines, log.TakeErrors());
+        EXPECT_EQ(code, NotifyPolicyWithoutTexts()) << "before its texts matter";
+        EXPECT_EQ(lines, log.TakeErrors());
     }
 }
 
-TEST_F(ConnectionTrouble, IsCode5WhenNoProxyComesOverTheConnection)
+TEST_F(ConnectionTrouble, IsPassedByWhenTheSharedOneIsDeadOrFails)
+{
+    const Connection dead = bus.Connect();
+    g_dbus_connection_close_sync(dead.get(), nullptr, nullptr);
+    gio.refusal = "The connection is closed"; // as GDBus repeats it for a connection whose making failed
+    gio.code = G_IO_ERROR_CLOSED;
+    for (GDBusConnection* const shared : {static_cast<GDBusConnection*>(nullptr), dead.get()})
+    {
+        gio.connection = shared;
+        int error = 77;
+        const Connection taken(manager.InitDbusConnection(&error));
+        ASSERT_NE(nullptr, taken);
+        EXPECT_FALSE(g_dbus_connection_is_closed(taken.get()));
+        EXPECT_NE(nullptr, g_dbus_connection_get_unique_name(taken.get()));
+        EXPECT_EQ(77, error) << "which is left alone";
+        EXPECT_THAT(log.TakeErrors(), testing::IsEmpty());
+        gio.refusal = nullptr;
+    }
+}
+
+TEST_F(ConnectionTrouble, DoesNotEndTheProcessWhoeverMadeTheConnection)
 {
     const Connection agents = bus.Connect();
-    g_dbus_connection_set_exit_on_close(agents.get(), TRUE);
     gio.connection = agents.get();
-    int error = 77;
-    EXPECT_EQ(agents, Connection(manager.InitDbusConnection(&error)));
-    EXPECT_EQ(77, error) << "which is left alone";
-    EXPECT_FALSE(g_dbus_connection_get_exit_on_close(agents.get()));
-
-    for (const char* const reason : {"no reason given", "The connection is closed"})
+    for (const bool closesAtOnce : {true, false})
     {
-        EXPECT_EQ(5, NotifyServiceManager(KIV_NOTI_TYPE_NUMBER_CHANGED)) << "before its type matters";
-        EXPECT_THAT(log.TakeErrors(), ElementsAre(Line(std::string("Unable to create proxy: ") + reason)));
-        g_dbus_connection_close_sync(agents.get(), nullptr, nullptr);
-        IterateUntil([&] { return g_dbus_connection_is_closed(agents.get()) != FALSE; });
+        g_dbus_connection_set_exit_on_close(agents.get(), TRUE);
+        gio.closesAtOnce = closesAtOnce;
+        int error = 77;
+        EXPECT_EQ(agents, Connection(manager.InitDbusConnection(&error)));
+        EXPECT_EQ(77, error) << "which is left alone";
+        EXPECT_FALSE(g_dbus_connection_get_exit_on_close(agents.get()));
     }
+}
+
+TEST_F(ConnectionTrouble, OfAnotherConnectionStaysItsOwnersAffair)
+{
+    const Connection agents = bus.Connect(), other = bus.Connect();
+    gio.connection = agents.get();
+    int error = 0;
+    g_object_unref(manager.InitDbusConnection(&error));
+    g_dbus_connection_set_exit_on_close(other.get(), TRUE);
+    g_signal_emit_by_name(other.get(), "closed", FALSE, nullptr);
+    EXPECT_TRUE(g_dbus_connection_get_exit_on_close(other.get()));
+}
+
+TEST_F(ConnectionTrouble, IsCode5WhenNoProxyComes)
+{
+    const Connection agents = bus.Connect();
+    gio.connection = agents.get();
+    for (const int code : {NotifyServiceManager(KIV_NOTI_TYPE_NUMBER_CHANGED), NotifyPolicyWithoutTexts()})
+        EXPECT_EQ(5, code) << "before its type or its texts matter";
+    EXPECT_EQ(std::vector<std::string>(2, Line("Unable to create proxy: no reason given")), log.TakeErrors());
 }
 
 } // namespace

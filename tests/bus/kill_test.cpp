@@ -10,9 +10,10 @@ namespace
 using namespace kiv::test;
 using testing::AnyOf;
 using testing::AnyOfArray;
-using testing::Contains;
-using testing::HasSubstr;
 using testing::IsEmpty;
+
+/// What GDBus prints when the bus dies while a proxy is being made.
+constexpr char kWhileProxiesAreMade[] = "Error while sending AddMatch() message: The connection is closed";
 
 unsigned long Wish(const char* variable, unsigned long otherwise)
 {
@@ -39,6 +40,12 @@ struct Kill : BusTest
         return facade.SendMultiOnOffNotiToServiceManager(imsi, 2, ids, statuses);
     }
 
+    void RunAll()
+    {
+        for (const auto& [name, run, codes] : operations)
+            EXPECT_EQ(0, run()) << name;
+    }
+
     /// Each with its name and what comes back without a bus.
     const std::vector<std::tuple<const char*, std::function<int()>, std::vector<int>>> operations = {
         {"serial", [this] { return AskForSerial(); }, {1, 2}},
@@ -53,8 +60,7 @@ TEST_F(Kill, AtAnyMomentIsOutlivedByTheProcess)
 {
     const unsigned long rounds = Wish("KIV_KILL_ROUNDS", 50), seed = Wish("KIV_KILL_SEED", std::random_device{}());
     std::printf("%lu rounds, seed %lu\n", rounds, seed);
-    // "Error while sending AddMatch()", and the like, is what GDBus prints when the bus dies while a proxy is being made.
-    PrivateBus::Tolerate(" message: The connection is closed");
+    PrivateBus::Tolerate(kWhileProxiesAreMade);
     std::mt19937 random(static_cast<std::mt19937::result_type>(seed));
     for (unsigned long round = 0; round < rounds && !HasFailure(); ++round)
     {
@@ -81,18 +87,9 @@ TEST_F(Kill, AtAnyMomentIsOutlivedByTheProcess)
         bus.Start();
         Peer client(bus), daemon(bus, kBoardDaemon, Peer::Reply("('KIV2',)")), serviceManager(bus, kServiceManager);
         store.records = {Record(client)};
-        // What a push asked for may be told of in the loop a moment after its deliveries ended, and until then GDBus goes on
-        // failing.
-        if (name == std::string("push"))
-            IterateUntil([this] { return NotifyServiceManager(KIV_NOTI_TYPE_ACTIVATED) == 0; });
         log.Take();
-        const auto runAll = [this]
-        {
-            for (const auto& operation : operations)
-                EXPECT_EQ(0, std::get<1>(operation)()) << std::get<0>(operation);
-        };
-        runAll();
-        std::thread(runAll).join();
+        RunAll();
+        std::thread([this] { RunAll(); }).join();
         Settle();
         EXPECT_THAT(log.TakeErrors(), IsEmpty());
         EXPECT_EQ(8U, client.Calls().size());
@@ -100,22 +97,63 @@ TEST_F(Kill, AtAnyMomentIsOutlivedByTheProcess)
     PrivateBus::Tolerate(nullptr);
 }
 
-TEST_F(Kill, IsFoundByEveryCallAsLongAsTheAgentHoldsTheDeadConnection)
+TEST_F(Kill, IsOverOnceTheBusIsBackThoughTheAgentHoldsTheDeadConnection)
 {
-    const Connection agents(g_bus_get_sync(G_BUS_TYPE_SYSTEM, nullptr, nullptr));
-    EXPECT_EQ(2, NotifyServiceManager(KIV_NOTI_TYPE_ACTIVATED)) << "there is no service manager";
-    bus.Stop();
-    bus.Start();
-    Peer client(bus), serviceManager(bus, kServiceManager);
-    store.records = {Record(client)};
-    IterateUntil([&] { return g_dbus_connection_is_closed(agents.get()) != FALSE; });
-    for (const auto& [name, run, codes] : operations)
+    g_autoptr(GMainContext) gone = g_main_context_new(); // nobody iterates it before the end
+    for (GMainContext* const maker : {static_cast<GMainContext*>(nullptr), gone})
     {
-        EXPECT_THAT(run(), AnyOfArray(codes)) << name;
-        EXPECT_THAT(log.TakeErrors(), Contains(HasSubstr("The connection is closed"))) << name;
+        SCOPED_TRACE(maker == nullptr ? "made in the main loop's context" : "made in a context that is gone");
+        if (maker != nullptr)
+            g_main_context_push_thread_default(maker);
+        Connection agents(g_bus_get_sync(G_BUS_TYPE_SYSTEM, nullptr, nullptr));
+        EXPECT_EQ(2, NotifyServiceManager(KIV_NOTI_TYPE_ACTIVATED)) << "there is no service manager";
+        if (maker != nullptr)
+            g_main_context_pop_thread_default(maker);
+        bus.Stop();
+        bus.Start();
+        Peer client(bus), daemon(bus, kBoardDaemon, Peer::Reply("('KIV',)")), serviceManager(bus, kServiceManager);
+        store.records = {Record(client)};
+        while (!g_dbus_connection_is_closed(agents.get()))
+            g_usleep(1000);
+        log.Take();
+        RunAll(); // before the loop was told of the end
+        Settle();
+        RunAll(); // after it
+        std::thread([this] { RunAll(); }).join();
+        Settle();
+        EXPECT_THAT(log.TakeErrors(), IsEmpty());
+        EXPECT_EQ(12U, client.Calls().size());
+        agents.reset();
+        while (g_main_context_iteration(maker, FALSE))
+            continue;
     }
-    EXPECT_THAT(client.Calls(), IsEmpty());
-    EXPECT_THAT(serviceManager.Calls(), IsEmpty());
+}
+
+TEST_F(Kill, WhileAPushConnectsLeavesTheProcessAlive)
+{
+    const unsigned long rounds = Wish("KIV_TEST_LONG", 0) != 0 ? 10'000 : 60;
+    PrivateBus::Tolerate(kWhileProxiesAreMade);
+    store.records.assign(2, {"org.example.Nobody", "/", "a.b"});
+    for (unsigned long round = 0; round < rounds && !HasFailure(); ++round)
+    {
+        Connection agents(round % 2 == 0 ? nullptr : g_bus_get_sync(G_BUS_TYPE_SYSTEM, nullptr, nullptr));
+        const auto kill = [&]
+        {
+            g_usleep(round * 2500 / rounds);
+            bus.Stop();
+        };
+        const auto killer = std::async(std::launch::async, kill);
+        EXPECT_EQ(0, manager.DeliverPushMessage("7", "data", "message", 1));
+        IterateUntil(
+            [&] { return deliveries.HaveEnded() && killer.wait_for(std::chrono::seconds(0)) == std::future_status::ready; });
+        agents.reset();
+        bus.Start();
+        Peer client(bus, "org.example.Nobody");
+        EXPECT_EQ(0, manager.DeliverPushMessage("7", "data", "message", 1));
+        Settle();
+        EXPECT_EQ(2U, client.Calls().size());
+    }
+    PrivateBus::Tolerate(nullptr);
 }
 
 } // namespace

@@ -12,8 +12,11 @@
 ///
 /// Texts that go on the bus must be valid UTF-8; one that is not, or that is null, is refused with an error line and code 4
 /// before anything is sent (a push gives 0 for it). Texts are borrowed for the call. Any thread; no lock is held while an operation
-/// waits, making the connection apart. A "closed" handler of the agent's on a connection that the library made runs inside a later
-/// call of the library.
+/// waits.
+///
+/// To connect takes 25 seconds at most, but has no time limit on a bus that accepts connections and says nothing at all. A call
+/// finds the bus whether or not the process's shared connection is dead. In a child made by fork, each call that goes on the bus
+/// fails at once if the parent used the bus.
 class KIV_SYSTEM_API DADBusManager
 {
 public:
@@ -24,10 +27,10 @@ public:
     DADBusManager();          ///< holds nothing; GetInstance() gives the one to ask
     virtual ~DADBusManager(); ///< releases nothing
 
-    /// Takes the process's shared system-bus connection.
+    /// Takes the process's shared system-bus connection; one for the caller alone when that is dead or cannot be had.
     /// @param error  receives 1 or 3 on failure, else left as it is
     /// @return a new reference, released with g_object_unref(), or null. It does not end the process when the bus goes away.
-    /// Blocks while connecting; once for each connection that died and that somebody still holds, 20 milliseconds or so more.
+    /// Blocks while connecting.
     GDBusConnection* InitDbusConnection(int* error);
 
     /// Asks the device daemon for the board serial number.

@@ -5,6 +5,7 @@
 #include "DADBusManager.h"
 #include "DASimManager.h"
 #include "Handles.h"
+#include "Notifications.h"
 #include "Policy.h"
 #include "Singleton.h"
 
@@ -430,41 +431,32 @@ int DASystem::SendNotiToServiceManager(_KIV_NOTI_TYPE_E type, const char* imsi, 
     KIV_INFO("noti type [%d] service_id [%d]", type, service_id);
     g_autofree char* copy = g_strdup(imsi);
 
+    const kiv::NotificationType* const row = kiv::FindType(type);
+    if (row == nullptr)
+    {
+        KIV_ERROR("noti type error [%d]", type);
+        return kFailure;
+    }
     constexpr int kNoManager = -1;
     int sent = kNoManager;
-    switch (type)
+    switch (row->body)
     {
-    case KIV_NOTI_TYPE_AUTH_SUCCESS:
-        sent = Ask(kNoManager, &DADBusManager::SendAuthNotification, copy, 1);
+    case kiv::Body::Flag:
+        sent = Ask(kNoManager, row->sendFlag, copy, row->flag);
         break;
-    case KIV_NOTI_TYPE_AUTH_FAIL:
-        sent = Ask(kNoManager, &DADBusManager::SendAuthNotification, copy, 0);
+    case kiv::Body::Status:
+        sent = Ask(kNoManager, &DADBusManager::SendStatusNotification, copy, service_id, row->status);
         break;
-    case KIV_NOTI_TYPE_STATUS_ON:
-        sent = Ask(kNoManager, &DADBusManager::SendStatusNotification, copy, service_id, "on");
-        break;
-    case KIV_NOTI_TYPE_STATUS_OFF:
-        sent = Ask(kNoManager, &DADBusManager::SendStatusNotification, copy, service_id, "off");
-        break;
-    case KIV_NOTI_TYPE_POLICY:
+    case kiv::Body::Policy:
         if (!kiv::HavePolicyTexts(KIV_HERE, ServiceStatus, PolicyFeature, PolicyVersion, PolicyDocURL))
             return kFailure;
         sent = Ask(kNoManager, &DADBusManager::SendPolicyNotification, copy, service_id, ServiceStatus, PolicyFeature,
             PolicyVersion, PolicyDocURL);
         break;
-    case KIV_NOTI_TYPE_ACTIVATED:
-        sent = Ask(kNoManager, &DADBusManager::SendActivatedNotification, copy, 1);
-        break;
-    case KIV_NOTI_TYPE_DEACTIVATED:
-        sent = Ask(kNoManager, &DADBusManager::SendActivatedNotification, copy, 0);
-        break;
-    case KIV_NOTI_TYPE_NUMBER_CHANGED:
+    case kiv::Body::Number:
         sent = Ask(kNoManager, &DADBusManager::SendNumberChangedNotification, copy, ServiceStatus, PolicyFeature, PolicyVersion,
             PolicyDocURL);
         break;
-    default:
-        KIV_ERROR("noti type error [%d]", type);
-        return kFailure;
     }
     return sent == kNoManager ? kFailure : 0; // what became of the calls is not told
 }

@@ -1,0 +1,76 @@
+/// @file
+/// The notifications: one row per event and one per type. Both ways of sending them, to subscribers and to the service manager, go
+/// by these rows.
+#ifndef KIV_NOTIFICATIONS_H
+#define KIV_NOTIFICATIONS_H
+
+#include <DADBusManager.h>
+
+namespace kiv
+{
+
+/// One kind of event: what the store is asked for, and what is called.
+struct Notification
+{
+    char kind[16];
+    char key[4]; ///< empty: the service id
+    char method[16];
+};
+
+// clang-format off
+//                                            kind              key      method
+inline constexpr Notification kPolicy        {"policy",         "",      "policy"};
+inline constexpr Notification kStatus        {"status",         "",      "status"};
+inline constexpr Notification kAuth          {"auth",           "all",   "auth"};
+inline constexpr Notification kActivated     {"activated",      "all",   "activate"};
+inline constexpr Notification kNumberChanged {"number_changed", "all",   "number_change"};
+// clang-format on
+
+/// What goes with the IMSI.
+enum class Body
+{
+    Flag,   ///< a number
+    Status, ///< the service id and a text
+    Policy, ///< the service id and the four texts of a policy
+    Number  ///< four texts; to subscribers alone
+};
+
+/// What a type says.
+struct NotificationType
+{
+    _KIV_NOTI_TYPE_E type;
+    const Notification& event;
+    Body body;
+    int flag;                                   ///< of Body::Flag
+    int (DADBusManager::*sendFlag)(char*, int); ///< the member that sends it to subscribers
+    char status[4];                             ///< of Body::Status
+};
+
+// clang-format off
+inline constexpr NotificationType kNotificationTypes[] = {
+    // type                        event           body        flag  sendFlag                                  status
+    {KIV_NOTI_TYPE_AUTH_SUCCESS,   kAuth,          Body::Flag,   1, &DADBusManager::SendAuthNotification,      ""},
+    {KIV_NOTI_TYPE_AUTH_FAIL,      kAuth,          Body::Flag,   0, &DADBusManager::SendAuthNotification,      ""},
+    {KIV_NOTI_TYPE_STATUS_ON,      kStatus,        Body::Status, 0, nullptr,                                   "on"},
+    {KIV_NOTI_TYPE_STATUS_OFF,     kStatus,        Body::Status, 0, nullptr,                                   "off"},
+    {KIV_NOTI_TYPE_POLICY,         kPolicy,        Body::Policy, 0, nullptr,                                   ""},
+    {KIV_NOTI_TYPE_ACTIVATED,      kActivated,     Body::Flag,   1, &DADBusManager::SendActivatedNotification, ""},
+    {KIV_NOTI_TYPE_DEACTIVATED,    kActivated,     Body::Flag,   0, &DADBusManager::SendActivatedNotification, ""},
+    {KIV_NOTI_TYPE_NUMBER_CHANGED, kNumberChanged, Body::Number, 0, nullptr,                                   ""},
+};
+// clang-format on
+
+/// The row of a type; null when there is none.
+inline const NotificationType* FindType(_KIV_NOTI_TYPE_E type)
+{
+    for (const NotificationType& row : kNotificationTypes)
+    {
+        if (row.type == type)
+            return &row;
+    }
+    return nullptr;
+}
+
+} // namespace kiv
+
+#endif

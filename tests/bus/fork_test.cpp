@@ -1,0 +1,96 @@
+// What a process made by fork may do on the bus.
+#include "bus/BusTest.h"
+
+#include <sys/wait.h>
+#include <unistd.h>
+
+namespace
+{
+
+using namespace kiv::test;
+
+/// Has a child run something, and ends it when that takes long, though less than GDBus waits for an answer.
+pid_t Start(const std::function<bool()>& run)
+{
+    const pid_t child = fork();
+    if (child == 0)
+    {
+        alarm(20);
+        _exit(run() ? 0 : 1);
+    }
+    return child;
+}
+
+bool Succeeds(pid_t child)
+{
+    int status = 1;
+    waitpid(child, &status, 0);
+    return status == 0;
+}
+
+/// The library's calls, and how many fail.
+std::size_t CallAll(const std::string& subscriber)
+{
+    Subscribers store;
+    store.records = {{subscriber, "/example/client", "org.example.Client"}};
+    Deliveries deliveries;
+    LogCapture log;
+    char imsi[] = "450";
+    const char* id = nullptr;
+    DADBusManager& manager = *DADBusManager::GetInstance();
+    std::size_t failures = 0;
+    failures += manager.GetDeviceUniqueID(id) != 0;
+    g_free(const_cast<char*>(id));
+    failures += manager.SendNotiToServiceManager(KIV_NOTI_TYPE_ACTIVATED, imsi, 0, "", "", "", "") != 0;
+    log.Take();
+    manager.SendActivatedNotification(imsi, 1);
+    manager.DeliverPushMessage("7", "data", "message", 1);
+    deliveries.Settle();
+    for (const std::string& line : log.TakeErrors())
+        failures += line.find("Unable to create proxy: The bus was used before the process was forked") != std::string::npos;
+    return failures;
+}
+
+/// A child made before GLib has any thread, which uses the bus once it is told where that is, and whom to call.
+struct EarlyChild
+{
+    EarlyChild()
+    {
+        EXPECT_EQ(0, pipe(ends));
+        const auto run = [this]
+        {
+            char address[200] = {}, subscriber[200] = {};
+            EXPECT_EQ(200, read(ends[0], address, 200));
+            EXPECT_EQ(200, read(ends[0], subscriber, 200));
+            g_setenv("DBUS_SYSTEM_BUS_ADDRESS", address, TRUE);
+            return CallAll(subscriber) == 0;
+        };
+        child = Start(run);
+    }
+
+    void Tell(std::string text) const
+    {
+        text.resize(200);
+        EXPECT_EQ(200, write(ends[1], text.data(), 200));
+    }
+
+    int ends[2] = {};
+    pid_t child;
+} const early;
+
+TEST(Fork, LeavesTheBusToWhoeverUsesItAfterwards)
+{
+    const PrivateBus bus;
+    const Peer client(bus), daemon(bus, kBoardDaemon, Peer::Reply("('KIV1',)")), serviceManager(bus, kServiceManager);
+    early.Tell(g_getenv("DBUS_SYSTEM_BUS_ADDRESS"));
+    early.Tell(client.Name());
+    EXPECT_TRUE(Succeeds(early.child));
+    EXPECT_EQ(2U, client.Calls().size());
+
+    EXPECT_EQ(0U, CallAll(client.Name()));
+    EXPECT_TRUE(Succeeds(Start([&] { return CallAll(client.Name()) == 4; }))) << "fails at once where the parent used the bus";
+    EXPECT_EQ(4U, client.Calls().size());
+    EXPECT_EQ(0U, CallAll(client.Name())) << "the parent goes on";
+}
+
+} // namespace
