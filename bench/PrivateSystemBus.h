@@ -34,22 +34,15 @@ public:
     PrivateSystemBus& operator=(const PrivateSystemBus&) = delete;
     ~PrivateSystemBus();
 
-    /// The program's shared connection, held from beginning to end: without that the bare loops would connect anew for each
-    /// proxy, and the library for each notification.
-    GDBusConnection* Shared() const { return shared_.get(); }
-
     /// The processor time, in nanoseconds, that program, bus and service have used so far.
     double WorkNs() const;
-
-    /// Another connection.
-    Connection Connect() const { return bus_.Connect(); }
 
 private:
     OneProcessor processor_;
     TemporaryFolder folder_;
     BusDaemon bus_;
     Process service_;
-    Connection shared_;
+    Connection shared_; ///< held, or the bare loops would connect anew for each proxy, and the library for each notification
 };
 
 constexpr char kServe[] = "--serve";

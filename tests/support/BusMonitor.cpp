@@ -1,12 +1,10 @@
-#include "BusMonitor.h"
+#include "support/BusMonitor.h"
 
 #include <chrono>
 #include <condition_variable>
-#include <mutex>
 #include <stdexcept>
-#include <utility>
 
-namespace kiv::bench
+namespace kiv::test
 {
 
 namespace
@@ -41,7 +39,7 @@ std::string Line(GDBusMessage* message)
 
 } // namespace
 
-BusMonitor::BusMonitor(const PrivateSystemBus& bus) : shared_(bus.Shared()), watching_(bus.Connect())
+BusMonitor::BusMonitor(const PrivateBus& bus, GDBusConnection* shared) : shared_(shared), watching_(bus.Connect())
 {
     g_dbus_connection_add_filter(watching_.get(), Filter, nullptr, nullptr);
     g_autoptr(GError) error = nullptr;
@@ -100,4 +98,4 @@ std::vector<std::string> BusMonitor::During(const std::function<void()>& operati
     return std::exchange(seen.lines, {});
 }
 
-} // namespace kiv::bench
+} // namespace kiv::test

@@ -1,20 +1,17 @@
-#ifndef KIV_BENCH_BUSMONITOR_H
-#define KIV_BENCH_BUSMONITOR_H
+#ifndef KIV_TESTS_BUSMONITOR_H
+#define KIV_TESTS_BUSMONITOR_H
 
-#include "PrivateSystemBus.h"
+#include "support/PrivateBus.h"
 
-#include <functional>
-#include <string>
-#include <vector>
-
-namespace kiv::bench
+namespace kiv::test
 {
 
 /// Sees every message that goes over the bus, as long as it lives. One at a time.
 class BusMonitor
 {
 public:
-    explicit BusMonitor(const PrivateSystemBus& bus);
+    /// @param shared  the connection whose messages are in question; borrowed
+    BusMonitor(const PrivateBus& bus, GDBusConnection* shared);
     BusMonitor(const BusMonitor&) = delete;
     BusMonitor& operator=(const BusMonitor&) = delete;
     ~BusMonitor();
@@ -26,10 +23,10 @@ private:
     static GDBusMessage* Filter(GDBusConnection* connection, GDBusMessage* message, gboolean incoming, gpointer);
     void AwaitMarker();
 
-    GDBusConnection* shared_; ///< whose messages are in question: a mark that is sent over it tells where they end
+    GDBusConnection* shared_; ///< a mark that is sent over it shows where they end
     Connection watching_;
 };
 
-} // namespace kiv::bench
+} // namespace kiv::test
 
 #endif

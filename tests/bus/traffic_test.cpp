@@ -1,0 +1,49 @@
+// The messages of a notification and of a push are those of the loop that one would write first, and no other.
+#include "bus/BusTest.h"
+#include "support/BusMonitor.h"
+
+#include <BareBus.h>
+
+namespace
+{
+
+using namespace kiv::test;
+using namespace kiv::bench;
+
+struct Traffic : BusTest
+{
+    Traffic()
+    {
+        for (const std::string& path : paths)
+            store.records.push_back({kServiceName, path, kServiceName});
+    }
+
+    const std::vector<std::string> paths = SubscriberPaths(3);
+    const Connection shared{g_bus_get_sync(G_BUS_TYPE_SYSTEM, nullptr, nullptr)}; // held, or each side would connect
+    Peer service{bus, kServiceName};
+    BusMonitor monitor{bus, shared.get()};
+};
+
+TEST_F(Traffic, OfANotificationIsThatOfTheBareLoop)
+{
+    std::string who = kImsi;
+    const auto bare = monitor.During([this] { NotifyBare(paths, 7); });
+    const auto ours = monitor.During([&] { manager.SendStatusNotification(who.data(), 7, "on"); });
+    EXPECT_GT(ours.size(), paths.size());
+    EXPECT_EQ(bare, ours);
+}
+
+TEST_F(Traffic, OfAPushIsThatOfTheBareLoopInAnyOrder)
+{
+    const auto bare = monitor.During([this] { PushBare(paths, "7"); });
+    const auto push = [this]
+    {
+        manager.DeliverPushMessage("7", "data", "message", kPushTime);
+        Settle();
+    };
+    const auto ours = monitor.During(push);
+    EXPECT_GT(ours.size(), paths.size());
+    EXPECT_THAT(ours, testing::UnorderedElementsAreArray(bare));
+}
+
+} // namespace
