@@ -21,6 +21,9 @@ TEST_F(DeviceFacts, ThatAreTextsAreNullWhereThePlatformSucceedsWithoutOne)
              &DASystem::GetTizenIdN, &DASystem::GetIMEI})
         EXPECT_EQ("null", Out([&](char** out) { EXPECT_EQ(0, std::invoke(read, facade, out)); }));
     EXPECT_EQ("null", Out([&](char** out) { EXPECT_EQ(0, facade.GetPackageVersion("org.example.mail", out)); }));
+    kiv::platform::FailCall(Call::package_info_create, 0); // no handle, which must not be used
+    EXPECT_EQ("null", Out([&](char** out) { EXPECT_EQ(0, facade.GetPackageVersion("org.example.mail", out)); }));
+    EXPECT_THAT(kiv::platform::TakeMisuses(), IsEmpty());
     EXPECT_THAT(log.Take(), IsEmpty());
 }
 

@@ -139,9 +139,9 @@ void AddConnection(Rows& rows)
     const Group walk{rows, "DAConnectionManager.cpp", Kind::Walk, SimLock::AroundReads};
     const Group listener{rows, "DAConnectionManager.cpp", Kind::Listener, SimLock::AroundReads};
     single.Add<int()>(&S::GetCellularNetworkState, {}, {"5"})
-        .Fails({Call::connection_create, Call::connection_get_cellular_state}, {"0"});
-    single.Add<int()>(&S::GetWifiNetworkState, {}, {"1"}).Fails({Call::connection_create, Call::connection_get_wifi_state}, {"0"});
-    single.Add<int()>(&S::GetBTNetworkState, {}, {"2"}).Fails({Call::connection_create, Call::connection_get_bt_state}, {"0"});
+        .Fails({Call::connection_create, Call::connection_get_cellular_state}, {"-1"});
+    single.Add<int()>(&S::GetWifiNetworkState, {}, {"1"}).Fails({Call::connection_create, Call::connection_get_wifi_state}, {"-1"});
+    single.Add<int()>(&S::GetBTNetworkState, {}, {"2"}).Fails({Call::connection_create, Call::connection_get_bt_state}, {"-1"});
     walk.Add<bool(bool, bool)>(&S::IsNetworkConnected, {"", 1}, {"true"});
     listener.AddRun({SymbolOf<void (S::*)(IDAConnectionStateListener*, void*)>(&S::SetConnectionEventListener),
                         SymbolOf(&C::wifi_device_state_changed), SymbolOf(&C::wifi_connection_state_changed),

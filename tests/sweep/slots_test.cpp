@@ -51,6 +51,11 @@ TEST_F(Slots, WithANegativeNumberAreNotThere)
     EXPECT_THAT(platform::TakeMisuses(), testing::IsEmpty());
 }
 
+TEST_F(Slots, DoNotTellRoamingToANullPointer)
+{
+    EXPECT_FALSE(facade.GetRoamingStatus(0, nullptr));
+}
+
 TEST_F(Slots, AreJudgedByWhatTheModemSays)
 {
     using Of = std::vector<platform::SimSlot>;

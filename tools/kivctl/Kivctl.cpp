@@ -3,6 +3,7 @@
 #include "Nearest.h"
 
 #include <DeviceControl.h>
+#include <ResultCode.h>
 #include <SourceControl.h>
 
 #include <unistd.h>
@@ -22,11 +23,12 @@ struct CodeMeaning
 };
 
 constexpr CodeMeaning kCodeMeanings[] = {
-    {1, Exit::NoBus, "the system bus can not be reached", "DBUS_SYSTEM_BUS_ADDRESS has to name one that runs"},
-    {2, Exit::No, "no reply from the service", "it has to run on this bus (kivctl services)"},
-    {3, Exit::BusTimedOut, "reaching the system bus timed out", "DBUS_SYSTEM_BUS_ADDRESS has to name a bus that answers"},
-    {4, Exit::Refused, "the library refuses an argument", "its log says which"},
-    {5, Exit::NoService, "the service can not be addressed", "its log says why"},
+    {KIV_RESULT_NO_BUS, Exit::NoBus, "the system bus can not be reached", "DBUS_SYSTEM_BUS_ADDRESS has to name one that runs"},
+    {KIV_RESULT_NO_REPLY, Exit::No, "no reply from the service", "it has to run on this bus (kivctl services)"},
+    {KIV_RESULT_BUS_TIMED_OUT, Exit::BusTimedOut, "reaching the system bus timed out",
+        "DBUS_SYSTEM_BUS_ADDRESS has to name a bus that answers"},
+    {KIV_RESULT_INVALID_ARGUMENT, Exit::Refused, "the library refuses an argument", "its log says which"},
+    {KIV_RESULT_NO_PROXY, Exit::NoService, "the service can not be addressed", "its log says why"},
 };
 
 CodeMeaning Find(int code)
@@ -43,7 +45,7 @@ CodeMeaning Find(int code)
 
 void RequireSuccess(int code, const std::vector<std::string>& log)
 {
-    if (code == 0)
+    if (code == KIV_RESULT_SUCCESS)
         return;
     const CodeMeaning meaning = Find(code);
     std::string text = std::string(meaning.meaning) + "; " + meaning.remedy;

@@ -3,6 +3,19 @@
 #include <DASystem.h>
 #include <net_connection.h>
 
+namespace
+{
+
+template <std::size_t N>
+Field StateField(const char* name, const Word (&words)[N], int state)
+{
+    if (state == KIV_CONNECTION_STATE_UNKNOWN)
+        return {name, std::string("unknown"), "the device does not answer"};
+    return {name, WordFor(words, state)};
+}
+
+} // namespace
+
 Exit ShowNetwork(const NetworkOptions& options, const Command& command)
 {
     static constexpr Word kCellular[] = {{CONNECTION_CELLULAR_STATE_OUT_OF_SERVICE, "out of service"},
@@ -16,9 +29,9 @@ Exit ShowNetwork(const NetworkOptions& options, const Command& command)
 
     DASystem* const system = DASystem::GetInstance();
     const bool isConnected = system->IsNetworkConnected(options.countsWifi, options.countsBluetooth);
-    Print({{"cellular", WordFor(kCellular, system->GetCellularNetworkState())},
-              {"wifi", WordFor(kWifi, system->GetWifiNetworkState())},
-              {"bluetooth", WordFor(kBluetooth, system->GetBTNetworkState())}, {"connected", isConnected}},
+    Print({StateField("cellular", kCellular, system->GetCellularNetworkState()),
+              StateField("wifi", kWifi, system->GetWifiNetworkState()),
+              StateField("bluetooth", kBluetooth, system->GetBTNetworkState()), {"connected", isConnected}},
         command.form);
     return isConnected ? Exit::Done : Exit::No;
 }

@@ -4,6 +4,7 @@
 
 #include <DADBusManager.h>
 #include <DASystem.h>
+#include <ResultCode.h>
 
 #include <algorithm>
 #include <array>
@@ -118,12 +119,12 @@ Exit TellSubscribers(const NotifyOptions& options, const std::string& imsi, cons
     // The facade's result tells nothing of the bus, so its connection is asked for first, and kept for the walk.
     int code = 0;
     g_autoptr(GDBusConnection) connection = DADBusManager::GetInstance()->InitDbusConnection(&code);
-    RequireSuccess(connection ? 0 : code, log.Errors());
+    RequireSuccess(connection ? KIV_RESULT_SUCCESS : code, log.Errors());
 
     code = SendToSubscribers(options, imsi, texts);
     progress.Show("");
     log.RequireStore();
-    RequireSuccess(code == 0 && !walk.Refusals().empty() ? 4 : code, walk.Refusals());
+    RequireSuccess(code == KIV_RESULT_SUCCESS && !walk.Refusals().empty() ? KIV_RESULT_INVALID_ARGUMENT : code, walk.Refusals());
 
     std::int64_t delivered = 0;
     for (const Delivery& delivery : walk.Deliveries())

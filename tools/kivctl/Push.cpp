@@ -3,6 +3,7 @@
 #include "Verbs.h"
 
 #include <DADBusManager.h>
+#include <ResultCode.h>
 
 namespace
 {
@@ -53,7 +54,7 @@ void RequireBus(const LibraryLog& log)
 {
     int code = 0;
     g_autoptr(GDBusConnection) connection = DADBusManager::GetInstance()->InitDbusConnection(&code);
-    RequireSuccess(connection ? 0 : code, log.Errors());
+    RequireSuccess(connection ? KIV_RESULT_SUCCESS : code, log.Errors());
 }
 
 void AwaitEnd(const Deliveries& deliveries)
@@ -77,7 +78,7 @@ Exit Push(const PushOptions& options, const Command& command)
     DADBusManager::GetInstance()->DeliverPushMessage(
         options.service.c_str(), options.data.c_str(), options.message.c_str(), options.time);
     log.RequireStore();
-    RequireSuccess(deliveries.Refusals().empty() ? 0 : 4, deliveries.Refusals());
+    RequireSuccess(deliveries.Refusals().empty() ? KIV_RESULT_SUCCESS : KIV_RESULT_INVALID_ARGUMENT, deliveries.Refusals());
     AwaitEnd(deliveries);
 
     const size_t failed = deliveries.Troubles().size();

@@ -2,6 +2,7 @@
 #define DACONNECTIONMANAGER_H
 
 #include "IDAConnectionStateListener.h"
+#include "ResultCode.h"
 
 #include <runtime_info.h>
 
@@ -23,13 +24,16 @@ public:
     /// changes, or while none is being delivered: the listener is exchanged without a lock.
     void SetConnectionEventListener(IDAConnectionStateListener* listener, void* userData);
 
-    /// @return a connection_cellular_state_e; 0 when the platform does not tell. Blocks on the platform. Any thread.
+    /// @return a connection_cellular_state_e; KIV_CONNECTION_STATE_UNKNOWN, which is -1, when it cannot be read. Blocks on the
+    /// platform. Any thread.
     int GetCellularNetworkState();
 
-    /// @return a connection_wifi_state_e; 0 when the platform does not tell. Blocks on the platform. Any thread.
+    /// @return a connection_wifi_state_e; KIV_CONNECTION_STATE_UNKNOWN, which is -1, when it cannot be read. Blocks on the
+    /// platform. Any thread.
     int GetWifiNetworkState();
 
-    /// @return a connection_bt_state_e; 0 when the platform does not tell. Blocks on the platform. Any thread.
+    /// @return a connection_bt_state_e; KIV_CONNECTION_STATE_UNKNOWN, which is -1, when it cannot be read. Blocks on the platform.
+    /// Any thread.
     int GetBTNetworkState();
 
     /// Asks for the cellular connection, and for the others that are selected, each with a query of its own.

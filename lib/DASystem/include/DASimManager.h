@@ -118,7 +118,7 @@ public:
     /// Reads whether the device is roaming on a slot that is in service.
     /// @param slot     0-based
     /// @param roaming  written on success only
-    /// @return whether it was read; false also out of service. Holds the lock.
+    /// @return whether it was read; false also out of service, and for a null pointer. Holds the lock.
     bool GetRoamingStatus(int slot, bool* roaming);
 
     /// @name Subscriptions and SMS readiness

@@ -3,6 +3,7 @@
 
 #include "DATypes.h"
 #include "IDAConnectionStateListener.h"
+#include "ResultCode.h"
 
 #include <ITapiCall.h>
 #include <ITapiNetText.h>
@@ -38,13 +39,13 @@ public:
     /// Registers the listener of connection changes; null unregisters.
     void SetConnectionEventListener(IDAConnectionStateListener* listener, void* userData);
 
-    /// @return a connection_cellular_state_e
+    /// @return a connection_cellular_state_e; KIV_CONNECTION_STATE_UNKNOWN, which is -1, when it cannot be read
     int GetCellularNetworkState();
 
-    /// @return a connection_wifi_state_e
+    /// @return a connection_wifi_state_e; KIV_CONNECTION_STATE_UNKNOWN when it cannot be read
     int GetWifiNetworkState();
 
-    /// @return a connection_bt_state_e
+    /// @return a connection_bt_state_e; KIV_CONNECTION_STATE_UNKNOWN when it cannot be read
     int GetBTNetworkState();
 
     /// @return whether the cellular connection or another selected one is up
@@ -55,7 +56,7 @@ public:
     /// As DASimManager tells of the members of the same names.
     /// @{
 
-    /// Reads whether the device is roaming on a slot that is in service.
+    /// Reads whether the device is roaming on a slot that is in service. @return whether it was read; false for a null pointer
     bool GetRoamingStatus(int slot, bool* roaming);
 
     /// Opens the telephony handles of all slots, closed with DeinitHandleList().
@@ -245,11 +246,12 @@ public:
     /// The device's model name; null when the platform gives none.
     int GetModelName(char** model);
 
-    /// The version of an installed package; untouched on failure.
+    /// The version of an installed package; untouched on failure, null when the platform succeeds without one.
     int GetPackageVersion(const char* packageId, char** version);
 
     /// The IMEI of the first modem that answers; when none does, a text of 15 characters at least that is made of the local
-    /// time's offset from UTC in seconds, followed by zeros; null when there is no memory for it.
+    /// time's offset from UTC in seconds, followed by zeros; null when there is no memory for it. That text does not identify the
+    /// device: all devices in a time zone have the same one, and it starts with a minus sign west of Greenwich.
     /// @return 0
     int GetIMEI(char** imei);
 

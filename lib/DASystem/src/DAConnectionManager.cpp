@@ -12,17 +12,17 @@ IDAConnectionStateListener* DAConnectionManager::__pListener = nullptr;
 namespace
 {
 
-/// Asks for one state over a connection handle of its own; 0, which is no connection's connected value, when it can not be read.
+/// Asks for one state over a connection handle of its own; KIV_CONNECTION_STATE_UNKNOWN when it cannot be read.
 template <class State>
 int ReadState(int (*read)(connection_h, State*))
 {
     connection_h created = nullptr;
     if (connection_create(&created) != 0 || created == nullptr)
-        return 0;
+        return KIV_CONNECTION_STATE_UNKNOWN;
     const kiv::Owned<void, connection_destroy> connection(created);
 
     State state{};
-    return read(connection.get(), &state) == 0 ? static_cast<int>(state) : 0;
+    return read(connection.get(), &state) == 0 ? static_cast<int>(state) : KIV_CONNECTION_STATE_UNKNOWN;
 }
 
 } // namespace

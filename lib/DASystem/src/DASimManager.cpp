@@ -2,6 +2,7 @@
 
 #include "CountryTables.h"
 #include "Handles.h"
+#include "ResultCode.h"
 #include "Singleton.h"
 
 #include <DAMutex.h>
@@ -441,7 +442,7 @@ int ReadImsiText(DASimManager& manager, const telephony_handle_list_s& list, int
     if (*out != nullptr)
         return 0;
     KIV_ERROR_AT(here, "%s", failure);
-    return kiv::kFailure;
+    return KIV_RESULT_INVALID_ARGUMENT;
 }
 
 } // namespace
@@ -538,7 +539,7 @@ bool DASimManager::GetSimInfo(const char* cpName, std::string* mcc, std::string*
 bool DASimManager::GetRoamingStatus(int slot, bool* roaming)
 {
     const SimAccess access;
-    if (!access)
+    if (!access || roaming == nullptr)
         return false;
 
     const HandleList list;

@@ -26,7 +26,6 @@
 
 using kiv::Ask;
 using kiv::CString;
-using kiv::kFailure;
 using kiv::Place;
 
 DASystem* DASystem::__pInstance = nullptr;
@@ -48,17 +47,17 @@ void DASystem::SetConnectionEventListener(IDAConnectionStateListener* listener, 
 
 int DASystem::GetCellularNetworkState()
 {
-    return Ask(0, &DAConnectionManager::GetCellularNetworkState);
+    return Ask(KIV_CONNECTION_STATE_UNKNOWN, &DAConnectionManager::GetCellularNetworkState);
 }
 
 int DASystem::GetWifiNetworkState()
 {
-    return Ask(0, &DAConnectionManager::GetWifiNetworkState);
+    return Ask(KIV_CONNECTION_STATE_UNKNOWN, &DAConnectionManager::GetWifiNetworkState);
 }
 
 int DASystem::GetBTNetworkState()
 {
-    return Ask(0, &DAConnectionManager::GetBTNetworkState);
+    return Ask(KIV_CONNECTION_STATE_UNKNOWN, &DAConnectionManager::GetBTNetworkState);
 }
 
 bool DASystem::IsNetworkConnected(bool checkWifi, bool checkBT)
@@ -144,7 +143,8 @@ bool DASystem::IsSimExist()
 int DASystem::GetDeviceUniqueID(const char** id)
 {
     const char* uniqueId = nullptr;
-    const int code = Ask<DADBusManager, int, const char*&>(kFailure, &DADBusManager::GetDeviceUniqueID, uniqueId);
+    const int code =
+        Ask<DADBusManager, int, const char*&>(KIV_RESULT_INVALID_ARGUMENT, &DADBusManager::GetDeviceUniqueID, uniqueId);
     *id = uniqueId;
     return code;
 }
@@ -182,7 +182,7 @@ public:
     int Read(int (DASimManager::*reader)(telephony_handle_list_s, int, Char**), int slot, CString& text) const
     {
         Char* value = nullptr;
-        const int code = Ask(kFailure, reader, list_, slot, &value);
+        const int code = Ask<DASimManager, int>(KIV_RESULT_INVALID_ARGUMENT, reader, list_, slot, &value);
         text.reset(const_cast<char*>(value)); // const in the reader of the MCC alone, and the caller's to release there too
         return code;
     }
@@ -197,7 +197,7 @@ template <class Reader>
 int FirstAnswer(Reader reader, char** out)
 {
     const Slots slots;
-    int code = kFailure;
+    int code = KIV_RESULT_INVALID_ARGUMENT;
     for (int slot = 0; slot < slots.Count(); ++slot)
     {
         CString text;
@@ -206,7 +206,7 @@ int FirstAnswer(Reader reader, char** out)
             continue;
         char* const copy = strdup(text.get());
         if (copy == nullptr)
-            return kFailure;
+            return KIV_RESULT_INVALID_ARGUMENT;
         *out = copy;
         return 0;
     }
@@ -435,7 +435,7 @@ int DASystem::SendNotiToServiceManager(_KIV_NOTI_TYPE_E type, const char* imsi, 
     if (row == nullptr)
     {
         KIV_ERROR("noti type error [%d]", type);
-        return kFailure;
+        return KIV_RESULT_INVALID_ARGUMENT;
     }
     constexpr int kNoManager = -1;
     int sent = kNoManager;
@@ -449,7 +449,7 @@ int DASystem::SendNotiToServiceManager(_KIV_NOTI_TYPE_E type, const char* imsi, 
         break;
     case kiv::Body::Policy:
         if (!kiv::HavePolicyTexts(KIV_HERE, ServiceStatus, PolicyFeature, PolicyVersion, PolicyDocURL))
-            return kFailure;
+            return KIV_RESULT_INVALID_ARGUMENT;
         sent = Ask(kNoManager, &DADBusManager::SendPolicyNotification, copy, service_id, ServiceStatus, PolicyFeature,
             PolicyVersion, PolicyDocURL);
         break;
@@ -458,7 +458,7 @@ int DASystem::SendNotiToServiceManager(_KIV_NOTI_TYPE_E type, const char* imsi, 
             PolicyDocURL);
         break;
     }
-    return sent == kNoManager ? kFailure : 0; // what became of the calls is not told
+    return sent == kNoManager ? KIV_RESULT_INVALID_ARGUMENT : KIV_RESULT_SUCCESS; // what became of the calls is not told
 }
 
 int DASystem::SendMultiOnOffNotiToServiceManager(const char* imsi, int count, int* service_ids, char** statuses)
@@ -602,6 +602,8 @@ int DASystem::GetPackageVersion(const char* packageId, char** version)
         KIV_ERROR("package_info_create failed [%d]", code);
         return code;
     }
+    if (created == nullptr)
+        return CopyOut(nullptr, version);
     kiv::Owned<std::remove_pointer_t<package_info_h>, package_info_destroy> info(created);
     char* value = nullptr;
     code = package_info_get_version(info.get(), &value);

@@ -12,11 +12,8 @@
 namespace kiv
 {
 
-/// What an operation gives that has no code of its own for what went wrong.
-constexpr int kFailure = 4;
-
 /// The creation frame of the four classes: makes the instance on first use, under the lock named "FILE::FUNCTION" after the place.
-/// @param failure  the error line when there is no memory
+/// @param failure  the error line when there is no memory for the instance or for its lock's name
 /// @return the instance; null without memory, and the next call tries again
 template <class Class>
 Class* Singleton(Class*& instance, const Place& here, const char* failure)
@@ -24,18 +21,17 @@ Class* Singleton(Class*& instance, const Place& here, const char* failure)
     char name[128];
     stpcpy(stpcpy(stpcpy(name, here.file), "::"), here.function); // "%s::%s" of constants, which the compiler writes out
 
-    return NoThrow<Class*>(nullptr,
+    Class* const made = NoThrow<Class*>(nullptr,
         [&]
         {
             const DAMutexLock lock(name);
             if (instance == nullptr)
-            {
                 instance = new (std::nothrow) Class;
-                if (instance == nullptr)
-                    KIV_ERROR_AT(here, "%s", failure);
-            }
             return instance;
         });
+    if (made == nullptr)
+        KIV_ERROR_AT(here, "%s", failure);
+    return made;
 }
 
 /// Calls a member of a manager with these arguments: what every forward of the facade does.
