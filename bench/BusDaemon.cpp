@@ -4,6 +4,7 @@
 #include <stdexcept>
 #include <sys/prctl.h>
 #include <unistd.h>
+#include <utility>
 
 namespace kiv::bench
 {
@@ -29,7 +30,9 @@ void Kill(GSubprocess* program)
     g_subprocess_wait(program, nullptr, nullptr);
 }
 
-BusDaemon::BusDaemon() : address_("unix:abstract=kiv-bus-" + std::to_string(getpid()) + '-' + std::to_string(g_random_int()))
+BusDaemon::BusDaemon(std::string configuration)
+    : address_("unix:abstract=kiv-bus-" + std::to_string(getpid()) + '-' + std::to_string(g_random_int())),
+      configuration_("--config-file=" + (configuration.empty() ? KIV_PRIVATE_BUS_CONF : std::move(configuration)))
 {
     g_setenv("DBUS_SYSTEM_BUS_ADDRESS", address_.c_str(), TRUE);
     Start();
@@ -44,7 +47,7 @@ void BusDaemon::Start()
 {
     const std::lock_guard lock(mutex_);
     const std::string address = "--address=" + address_;
-    daemon_ = StartProgram({"dbus-daemon", "--config-file=" KIV_PRIVATE_BUS_CONF, "--nofork", "--print-address", address.c_str()});
+    daemon_ = StartProgram({"dbus-daemon", configuration_.c_str(), "--nofork", "--print-address", address.c_str()});
 }
 
 void BusDaemon::Stop()

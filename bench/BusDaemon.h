@@ -32,7 +32,8 @@ class BusDaemon
 public:
     /// Starts the daemon and makes it the system bus of the process. To be made before the first bus call. Throws
     /// std::runtime_error.
-    BusDaemon();
+    /// @param configuration  its file; that for private buses without it
+    explicit BusDaemon(std::string configuration = {});
     BusDaemon(const BusDaemon&) = delete;
     BusDaemon& operator=(const BusDaemon&) = delete;
     ~BusDaemon();
@@ -51,6 +52,7 @@ public:
 
 private:
     std::string address_;
+    std::string configuration_;
     std::mutex mutex_; ///< of what follows
     Process daemon_;
 };

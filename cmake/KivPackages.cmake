@@ -2,6 +2,7 @@
 set(package_of_system libkiv-system${PROJECT_VERSION_MAJOR})
 set(package_of_platform libkiv-platform${PROJECT_VERSION_MAJOR})
 set(package_of_dev libkiv-system-dev)
+set(package_of_client libkiv-client-dev)
 set(package_of_kivctl kivctl)
 
 # What each package has beside its component: copyright and changelog.
@@ -13,7 +14,7 @@ add_custom_command(OUTPUT debian/changelog.Debian.gz
   COMMAND gzip --best --no-name --stdout debian/changelog >debian/changelog.Debian.gz
   WORKING_DIRECTORY ${PROJECT_BINARY_DIR} DEPENDS ${PROJECT_BINARY_DIR}/debian/changelog)
 add_custom_target(debian_changelog ALL DEPENDS debian/changelog.Debian.gz)
-foreach(component IN ITEMS system platform dev kivctl)
+foreach(component IN ITEMS system platform dev client kivctl)
   install(FILES ${PROJECT_BINARY_DIR}/debian/copyright ${PROJECT_BINARY_DIR}/debian/changelog.Debian.gz
     DESTINATION ${CMAKE_INSTALL_DATADIR}/doc/${package_of_${component}} COMPONENT ${component} EXCLUDE_FROM_ALL)
   string(TOUPPER ${component} upper)
@@ -41,13 +42,16 @@ set(CPACK_DEBIAN_PACKAGE_SHLIBDEPS_PRIVATE_DIRS
   ${PROJECT_BINARY_DIR}/lib/DASystem ${PROJECT_BINARY_DIR}/lib/kiv_util ${PROJECT_BINARY_DIR}/platform)
 set(CPACK_DEBIAN_PACKAGE_GENERATE_SHLIBS ON)
 set(CPACK_COMPONENT_SYSTEM_DEPENDS platform)
-set(CPACK_COMPONENT_DEV_DEPENDS system platform)
+set(CPACK_COMPONENT_DEV_DEPENDS system platform client)
 set(CPACK_COMPONENT_KIVCTL_DEPENDS system platform)
 set(CPACK_DEBIAN_DEV_PACKAGE_DEPENDS libglib2.0-dev)
 set(CPACK_DEBIAN_DEV_PACKAGE_SHLIBDEPS OFF)
+set(CPACK_DEBIAN_CLIENT_PACKAGE_SHLIBDEPS OFF)
+set(CPACK_DEBIAN_CLIENT_PACKAGE_ARCHITECTURE all)
 set(CPACK_DEBIAN_SYSTEM_PACKAGE_SECTION libs)
 set(CPACK_DEBIAN_PLATFORM_PACKAGE_SECTION libs)
 set(CPACK_DEBIAN_DEV_PACKAGE_SECTION libdevel)
+set(CPACK_DEBIAN_CLIENT_PACKAGE_SECTION libdevel)
 set(CPACK_DEBIAN_KIVCTL_PACKAGE_SECTION devel)
 # A trigger tells ldconfig of the libraries. CPack leaves out its scripts for that when others are named; none are there, as it
 # warns.
@@ -65,6 +69,10 @@ with its callers, and set up by a profile or a file.")
 set(CPACK_COMPONENT_DEV_DESCRIPTION "system-access layer of kiv-agent: development files
 Headers, files for pkg-config and CMake, the interfaces on the bus, and an
 example of the agent's bus policy.")
+set(CPACK_COMPONENT_CLIENT_DESCRIPTION "client services of kiv-agent: interfaces and examples
+The interfaces on the bus by which a client service subscribes to the agent's
+events and receives them, and examples of what it installs for the bus: a
+policy, and a file that has the bus start it.")
 set(CPACK_COMPONENT_KIVCTL_DESCRIPTION "agent in miniature and remote control of the simulated device
 Asks the system-access layer from the command line, plays a client service,
 and comes with the bus services of a device.")

@@ -26,6 +26,7 @@ struct BusCall
     };
 
     const GDBusMethodInfo& method; ///< from the party's interface description
+    const char* sender;            ///< unique name of the caller, which the bus vouches for
     GVariant* arguments;           ///< tuple of the call's arguments; borrowed
 
     /// The arguments with the names that the interface description gives them. The one argument of a method that takes a

@@ -48,20 +48,19 @@ BusParty::BusParty(const char* xml, Handler handler)
 BusParty::~BusParty()
 {
     g_dbus_connection_unregister_object(connection_.get(), registration_);
+    g_dbus_connection_flush_sync(connection_.get(), nullptr, nullptr); // closing drops the replies that are not written yet
     g_dbus_connection_close_sync(connection_.get(), nullptr, nullptr);
 }
 
 void BusParty::OwnName(const std::string& name)
 {
     g_autoptr(GError) error = nullptr;
-    g_autoptr(GVariant) reply = g_dbus_connection_call_sync(connection_.get(), "org.freedesktop.DBus", "/org/freedesktop/DBus",
-        "org.freedesktop.DBus", "RequestName", g_variant_new("(su)", name.c_str(), kDoNotQueue), G_VARIANT_TYPE("(u)"),
-        G_DBUS_CALL_FLAGS_NONE, -1, nullptr, &error);
-    if (!reply)
+    const VariantPtr reply = CallBus("RequestName", g_variant_new("(su)", name.c_str(), kDoNotQueue), "(u)", &error);
+    if (reply == nullptr)
         throw BusError(BusError::Reason::NameRefused, "the bus does not give the name \"" + name + "\": " + error->message);
 
     guint answer = 0;
-    g_variant_get(reply, "(u)", &answer);
+    g_variant_get(reply.get(), "(u)", &answer);
     if (answer != kPrimaryOwner)
     {
         throw BusError(BusError::Reason::NameRefused,
@@ -70,11 +69,31 @@ void BusParty::OwnName(const std::string& name)
     name_ = name;
 }
 
-void BusParty::Called(GDBusConnection*, const char*, const char*, const char*, const char*, GVariant* arguments,
+void BusParty::ReleaseName()
+{
+    CallBus("ReleaseName", g_variant_new("(s)", name_.c_str()), "(u)");
+    name_ = g_dbus_connection_get_unique_name(connection_.get());
+}
+
+VariantPtr BusParty::CallBus(const char* method, GVariant* arguments, const char* replyType, GError** error) const
+{
+    return VariantPtr(g_dbus_connection_call_sync(connection_.get(), "org.freedesktop.DBus", "/org/freedesktop/DBus",
+        "org.freedesktop.DBus", method, arguments, G_VARIANT_TYPE(replyType), G_DBUS_CALL_FLAGS_NONE, -1, nullptr, error));
+}
+
+void BusParty::Called(GDBusConnection*, const char* sender, const char*, const char*, const char*, GVariant* arguments,
     GDBusMethodInvocation* invocation, gpointer self)
 {
-    const BusCall call{*g_dbus_method_invocation_get_method_info(invocation), arguments};
-    g_dbus_method_invocation_return_value(invocation, static_cast<BusParty*>(self)->handler_(call));
+    try
+    {
+        const BusCall call{*g_dbus_method_invocation_get_method_info(invocation), sender, arguments};
+        g_dbus_method_invocation_return_value(invocation, static_cast<BusParty*>(self)->handler_(call));
+    }
+    catch (const CallError& error)
+    {
+        const g_autofree char* text = g_utf8_make_valid(error.what(), -1); // a file's name in it may be anything
+        g_dbus_method_invocation_return_error_literal(invocation, G_DBUS_ERROR, error.code, text);
+    }
 }
 
 } // namespace kiv

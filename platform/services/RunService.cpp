@@ -36,7 +36,7 @@ try
     const std::unique_ptr<BusParty> service = start();
     std::printf("ready: %s %s\n", service->Name().c_str(), service->ObjectPath());
     std::fflush(stdout);
-    if (signals.IterateWhile([&service] { return service->IsConnected(); }))
+    if (signals.IterateWhile([&service] { return service->IsConnected() && service->GoOn(); }) || service->IsConnected())
         return 0;
     return Fail("the bus went away");
 }

@@ -35,6 +35,8 @@ public:
     /// Owns a well-known name from now on, instead of whoever did.
     void Own(const std::string& name);
     std::vector<std::string> Calls() const;
+    /// Its connection, for calls of its own.
+    GDBusConnection* Bus() const { return connection_.get(); }
     /// Keeps no calls from now on.
     void Forget();
     /// Leaves the bus; no answer is being worked at on return.

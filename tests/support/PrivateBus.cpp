@@ -22,7 +22,7 @@ GLogWriterOutput Complain(GLogLevelFlags level, const GLogField* fields, gsize c
 
 } // namespace
 
-PrivateBus::PrivateBus()
+PrivateBus::PrivateBus(std::string configuration) : BusDaemon(std::move(configuration))
 {
     [[maybe_unused]] static const bool once = (g_log_set_writer_func(Complain, nullptr, nullptr), true);
 }

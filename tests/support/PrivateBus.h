@@ -15,7 +15,8 @@ using Message = std::unique_ptr<GDBusMessage, Unref>;
 /// The system bus of this process, from whose making on GLib has nothing to say: a warning of its fails the test.
 struct PrivateBus : bench::BusDaemon
 {
-    PrivateBus();
+    /// @param configuration  as BusDaemon takes it
+    explicit PrivateBus(std::string configuration = {});
 
     /// Lets GLib say this after all.
     static void Tolerate(const char* message);

@@ -1,0 +1,67 @@
+#ifndef KIV_TESTS_CLIENT_H
+#define KIV_TESTS_CLIENT_H
+
+#include "support/Peer.h"
+
+#include <glib/gstdio.h>
+#include <unistd.h>
+
+namespace kiv::test
+{
+
+constexpr char kPath[] = "/org/example/Client";
+constexpr char kInterface[] = "org.example.Client";
+
+/// A folder for a subscriber store, the one in use as long as it lives; in memory where there is a place for that.
+struct StoreFolder
+{
+    StoreFolder() { g_setenv("KIV_SUBSCRIBERS", (path / "subscribers.db").c_str(), TRUE); }
+    StoreFolder(const StoreFolder&) = delete;
+    StoreFolder& operator=(const StoreFolder&) = delete;
+    ~StoreFolder() { std::filesystem::remove_all(path); }
+
+    const std::filesystem::path path =
+        g_mkdtemp(((g_access("/dev/shm", W_OK) == 0 ? std::filesystem::path("/dev/shm") : std::filesystem::temp_directory_path()) /
+                   "kiv-services-XXXXXX")
+                      .string()
+                      .data());
+};
+
+/// A client service that subscribes over the bus, with a connection of its own.
+class Client : public Peer
+{
+public:
+    explicit Client(const PrivateBus& bus) : Peer(bus) {}
+
+    std::string UniqueName() const { return g_dbus_connection_get_unique_name(Bus()); }
+
+    /// Calls the subscription service.
+    /// @return the reply's body as text, or the error's name without what all have in common; its text is kept
+    std::string Call(const char* method, GVariant* arguments = nullptr)
+    {
+        GError* error = nullptr;
+        g_autoptr(GVariant) reply = g_dbus_connection_call_sync(Bus(), "org.kiv.Subscriptions", "/org/kiv/Subscriptions",
+            "org.kiv.Subscriptions1", method, arguments, nullptr, G_DBUS_CALL_FLAGS_NONE, 60'000, nullptr, &error);
+        if (reply != nullptr)
+        {
+            const g_autofree char* text = g_variant_print(reply, FALSE);
+            return text;
+        }
+        const g_autofree char* name = g_dbus_error_get_remote_error(error);
+        reason = error->message;
+        g_error_free(error);
+        return name == nullptr ? reason : std::string(g_strrstr(name, ".") + 1);
+    }
+
+    std::string Change(const char* method, const std::string& name, const char* kind = "auth", const char* key = "all",
+        const char* path = kPath, const char* interface = kInterface)
+    {
+        return Call(method, g_variant_new("(sssos)", kind, key, name.c_str(), path, interface));
+    }
+
+    std::string reason; ///< of the last error
+};
+
+} // namespace kiv::test
+
+#endif

@@ -1,0 +1,372 @@
+#include "services/Client.h"
+#include "support/Deliveries.h"
+
+#include <DASubscriberStore.h>
+#include <SubscriptionService.h>
+
+#include <sqlite3.h>
+#include <unistd.h>
+
+namespace kiv::test
+{
+namespace
+{
+
+using testing::HasSubstr;
+using testing::IsEmpty;
+
+/// The service in a thread of its own, as its program runs it.
+class Running
+{
+public:
+    explicit Running(std::set<guint32> administrators)
+        : context_(g_main_context_new()), thread_([this, administrators] { Serve(administrators); })
+    {
+        ready_.get_future().wait();
+    }
+    ~Running()
+    {
+        isStopped_ = true;
+        g_main_context_wakeup(context_);
+        thread_.join();
+        g_main_context_unref(context_);
+    }
+
+private:
+    void Serve(const std::set<guint32>& administrators)
+    {
+        g_main_context_push_thread_default(context_);
+        {
+            SubscriptionService service(60, administrators);
+            ready_.set_value();
+            while (!isStopped_ && service.GoOn())
+                g_main_context_iteration(context_, TRUE);
+        }
+        g_main_context_pop_thread_default(context_);
+    }
+
+    GMainContext* context_;
+    std::atomic<bool> isStopped_{false};
+    std::promise<void> ready_;
+    std::thread thread_;
+};
+
+/// Keeps changes of the store waiting.
+class StoreLock
+{
+public:
+    StoreLock()
+    {
+        sqlite3_open(DASubscriberStore::Path().c_str(), &db_);
+        EXPECT_EQ(SQLITE_OK, sqlite3_exec(db_, "BEGIN IMMEDIATE", nullptr, nullptr, nullptr));
+    }
+    ~StoreLock() { sqlite3_close(db_); }
+
+private:
+    sqlite3* db_ = nullptr;
+};
+
+/// Counts the calls of one method on the bus. One at a time.
+class CallCount
+{
+public:
+    CallCount(const PrivateBus& bus, const std::string& member) : connection_(bus.Connect())
+    {
+        count = 0;
+        g_dbus_connection_add_filter(connection_.get(), Count, nullptr, nullptr);
+        const std::string rule = "type='method_call',member='" + member + "'";
+        const char* const rules[] = {rule.c_str(), nullptr};
+        g_autoptr(GVariant) reply = g_dbus_connection_call_sync(connection_.get(), "org.freedesktop.DBus", "/org/freedesktop/DBus",
+            "org.freedesktop.DBus.Monitoring", "BecomeMonitor", g_variant_new("(^asu)", rules, 0U), nullptr, G_DBUS_CALL_FLAGS_NONE,
+            -1, nullptr, nullptr);
+        EXPECT_NE(nullptr, reply);
+    }
+    ~CallCount() { g_dbus_connection_close_sync(connection_.get(), nullptr, nullptr); }
+
+    void AwaitOne() const
+    {
+        IterateUntil([] { return count > 0; });
+    }
+
+private:
+    static GDBusMessage* Count(GDBusConnection*, GDBusMessage* message, gboolean isIncoming, gpointer)
+    {
+        if (isIncoming == FALSE || g_dbus_message_get_message_type(message) != G_DBUS_MESSAGE_TYPE_METHOD_CALL)
+            return message;
+        ++count;
+        g_object_unref(message);
+        return nullptr;
+    }
+
+    static inline std::atomic<int> count{0};
+    Connection connection_;
+};
+
+struct Subscriptions : testing::Test
+{
+    Subscriptions() { Start(); }
+
+    void Start(const std::set<guint32>& administrators = {})
+    {
+        service.reset();
+        service = std::make_unique<Running>(administrators);
+    }
+
+    /// The bus names of the store's records, in their order.
+    static std::vector<std::string> Stored()
+    {
+        std::vector<DASubscription> records;
+        std::string reason;
+        EXPECT_EQ(DASubscriberStore::Outcome::Done, DASubscriberStore().List(records, reason)) << reason;
+        std::vector<std::string> names;
+        for (const DASubscription& record : records)
+            names.push_back(record.subscriber.busname);
+        return names;
+    }
+
+    static void AddToStore(const std::string& name, const std::string& key = "all")
+    {
+        std::string reason;
+        EXPECT_EQ(DASubscriberStore::Outcome::Done, DASubscriberStore().Add({"auth", key, {name, kPath, kInterface}}, reason));
+    }
+
+    static void AwaitStored(const std::vector<std::string>& names)
+    {
+        IterateUntil([&] { return Stored() == names; });
+    }
+
+    const StoreFolder folder;
+    PrivateBus bus;
+    std::unique_ptr<Running> service;
+};
+
+constexpr char kMail[] = "org.example.Mail";
+constexpr char kOther[] = "org.example.Other";
+
+TEST_F(Subscriptions, AreMadeListedAndRemovedUnderTheNamesOfTheCaller)
+{
+    Client client(bus);
+    client.Own(kMail);
+    const std::string unique = client.UniqueName();
+    for (const std::string& name : {std::string(), unique, std::string(kMail)})
+    {
+        const std::string recorded = name.empty() ? unique : name;
+        EXPECT_EQ("(true,)", client.Change("Subscribe", name)) << client.reason;
+        EXPECT_EQ("(false,)", client.Change("Subscribe", recorded));
+        EXPECT_EQ("([('auth', 'all', '" + recorded + "', '/org/example/Client', 'org.example.Client')],)", client.Call("List"));
+        EXPECT_EQ("(true,)", client.Change("Unsubscribe", name));
+        EXPECT_EQ("(false,)", client.Change("Unsubscribe", recorded));
+        EXPECT_EQ("([],)", client.Call("List"));
+    }
+}
+
+TEST_F(Subscriptions, OfOthersAreOutOfReach)
+{
+    Client client(bus), other(bus);
+    client.Own(kMail);
+    other.Own(kOther);
+    for (Client* subscriber : {&other, &client})
+        EXPECT_EQ("(true,)", subscriber->Change("Subscribe", ""));
+    EXPECT_EQ("(true,)", other.Change("Subscribe", kOther));
+    AddToStore("org.example.Nobody");
+    const auto before = Stored();
+    Client gone(bus);
+    gone.Close();
+    for (const char* method : {"Subscribe", "Unsubscribe"})
+    {
+        for (const std::string& name : {other.UniqueName(), gone.UniqueName(), std::string(kOther),
+                 std::string("org.example.Nobody"), std::string("org.freedesktop.DBus"), std::string("org.kiv.Subscriptions"),
+                 std::string(":0.0"), std::string("noname"), std::string("\n")})
+        {
+            EXPECT_EQ("AccessDenied", client.Change(method, name)) << method << name;
+            EXPECT_THAT(client.reason, HasSubstr("\"" + name + "\" is not a name of the caller " + client.UniqueName()));
+        }
+    }
+    EXPECT_EQ(before, Stored());
+    EXPECT_EQ(
+        "([('auth', 'all', '" + client.UniqueName() + "', '/org/example/Client', 'org.example.Client')],)", client.Call("List"));
+}
+
+TEST_F(Subscriptions, ThatCannotBeOnesAreRefusedWithTheReason)
+{
+    Client client(bus);
+    const struct
+    {
+        const char *kind, *key, *path, *interface, *reason;
+    } rows[] = {
+        {"none", "all", kPath, kInterface, "kind \"none\""},
+        {"auth", "", kPath, kInterface, "key \"\""},
+        {"auth", "all", "/org/freedesktop/DBus/Local", kInterface, "object path \"/org/freedesktop/DBus/Local\""},
+        {"auth", "all", kPath, "org.freedesktop.DBus.Local", "interface \"org.freedesktop.DBus.Local\""},
+        {"auth", "all", kPath, "undotted", "interface \"undotted\""},
+    };
+    for (const auto& row : rows)
+    {
+        EXPECT_EQ("InvalidArgs", client.Change("Subscribe", "", row.kind, row.key, row.path, row.interface)) << row.reason;
+        EXPECT_THAT(client.reason, HasSubstr(row.reason));
+        EXPECT_EQ("(false,)", client.Change("Unsubscribe", "", row.kind, row.key, row.path, row.interface)) << row.reason;
+    }
+    EXPECT_THAT(Stored(), IsEmpty());
+}
+
+TEST_F(Subscriptions, StayAsTheyAreWhenTheNameChangesHandsMeanwhile)
+{
+    for (const char* method : {"Subscribe", "Unsubscribe"})
+    {
+        Client client(bus), successor(bus);
+        client.Own(kMail);
+        const auto before = Stored();
+        std::future<std::string> answer;
+        {
+            const CallCount checks(bus, "GetNameOwner");
+            const StoreLock lock;
+            answer = std::async(std::launch::async, [&] { return client.Change(method, kMail); });
+            checks.AwaitOne();
+            successor.Own(kMail);
+        }
+        EXPECT_EQ("AccessDenied", answer.get());
+        EXPECT_EQ(before, Stored()) << method;
+        successor.Change("Subscribe", kMail); // for the second round
+    }
+}
+
+TEST_F(Subscriptions, OfEverybodyAreListedAndRemovedByAnAdministrator)
+{
+    Start({getuid()});
+    Client administrator(bus), other(bus);
+    other.Own(kOther);
+    EXPECT_EQ("(true,)", other.Change("Subscribe", kOther));
+    EXPECT_EQ("AccessDenied", administrator.Change("Subscribe", kOther));
+    EXPECT_THAT(administrator.Call("List"), HasSubstr(kOther));
+    EXPECT_EQ("(true,)", administrator.Change("Unsubscribe", kOther));
+    EXPECT_THAT(Stored(), IsEmpty());
+}
+
+TEST_F(Subscriptions, UnderAUniqueNameEndWhenItLeavesTheBus)
+{
+    Client stays(bus);
+    EXPECT_EQ("(true,)", stays.Change("Subscribe", ""));
+    const auto subscribe = [&](Client& leaves)
+    {
+        leaves.Own(kMail);
+        EXPECT_EQ("(true,)", leaves.Change("Subscribe", ""));
+        leaves.Change("Subscribe", kMail);
+    };
+    {
+        Client leaves(bus);
+        subscribe(leaves);
+        leaves.Close();
+        AwaitStored({stays.UniqueName(), kMail});
+    }
+    Client leaves(bus);
+    subscribe(leaves);
+    service.reset();
+    leaves.Close();
+    Start();
+    AwaitStored({stays.UniqueName(), kMail});
+}
+
+TEST_F(Subscriptions, UnderAUniqueNameAreNotThoseOfTheSameNameOnTheNextBus)
+{
+    PrivateBus::Tolerate("");
+    Client client(bus);
+    client.Own(kMail);
+    client.Change("Subscribe", "");
+    client.Change("Subscribe", kMail);
+    service.reset();
+    bus.Stop();
+    bus.Start();
+    std::list<Client> others;
+    while (others.empty() || others.back().UniqueName() != client.UniqueName())
+        others.emplace_back(bus);
+    Start();
+    AwaitStored({kMail});
+}
+
+TEST_F(Subscriptions, AreAtMostAThousandOfAUserUnderAllNames)
+{
+    {
+        Client client(bus);
+        client.Own(kMail);
+        EXPECT_EQ("(true,)", client.Change("Subscribe", kMail));
+        for (int key = 1; key < SubscriptionService::kMostRecords; ++key)
+            AddToStore(kMail, std::to_string(key));
+        client.Close();
+    }
+    Start();
+    Client client(bus);
+    EXPECT_EQ("LimitsExceeded", client.Change("Subscribe", ""));
+    EXPECT_THAT(client.reason, HasSubstr("1000 subscriptions"));
+    client.Own(kMail);
+    EXPECT_EQ("LimitsExceeded", client.Change("Subscribe", kMail, "activated"));
+    EXPECT_EQ("(false,)", client.Change("Subscribe", kMail)) << "it is there";
+    EXPECT_EQ("(true,)", client.Change("Unsubscribe", kMail));
+    EXPECT_EQ("(true,)", client.Change("Subscribe", ""));
+}
+
+TEST_F(Subscriptions, FailWithTheStoresReason)
+{
+    std::ofstream(DASubscriberStore::Path()) << "this is no store";
+    Client client(bus);
+    const std::string list = client.Call("List");
+    for (const std::string& answer : {client.Change("Subscribe", ""), client.Change("Unsubscribe", ""), list})
+        EXPECT_EQ("Failed", answer);
+    EXPECT_THAT(client.reason, HasSubstr(DASubscriberStore::Path()));
+    std::filesystem::remove(DASubscriberStore::Path());
+    EXPECT_EQ("(true,)", client.Change("Subscribe", ""));
+}
+
+TEST_F(Subscriptions, TakeArgumentsOfTheirTypesAlone)
+{
+    Client client(bus);
+    for (const char* method : {"Subscribe", "Unsubscribe", "List"})
+    {
+        for (const char* body : {"(true,)", "(byte 1,)", "(int16 1,)", "(uint16 1,)", "(1,)", "(uint32 1,)", "(int64 1,)",
+                 "(uint64 1,)", "(1.5,)", "('a',)", "(objectpath '/',)", "(signature 's',)", "(<1>,)", "(['a'],)", "({'a': 'b'},)",
+                 "(('a', 'b'),)", "('auth', 'all', '', '/a', 'a.b')", "('auth', 'all', '', objectpath '/a', 'a.b', 'more')",
+                 "(b'bytes',)", "(handle 0,)", "((('auth', 'all', '', objectpath '/a', 'a.b'),),)"})
+        {
+            g_autoptr(GVariant) arguments = g_variant_parse(nullptr, body, nullptr, nullptr, nullptr);
+            EXPECT_EQ("InvalidArgs", client.Call(method, arguments)) << method << body;
+        }
+    }
+    EXPECT_EQ("UnknownMethod", client.Call("Other"));
+    EXPECT_THAT(Stored(), IsEmpty());
+}
+
+TEST_F(Subscriptions, OfACallerThatFloodsAreRefusedBeyondALimit)
+{
+    constexpr unsigned kMore = 20;
+    Client client(bus), other(bus);
+    other.Change("Subscribe", "");
+    EXPECT_EQ("LimitsExceeded", client.Change("Subscribe", "", "push", std::string(CallLimit::kMostBytes, 'k').c_str()));
+    struct
+    {
+        unsigned done = 0, refused = 0;
+    } answers;
+    using Answers = decltype(answers);
+    const GAsyncReadyCallback count = [](GObject* connection, GAsyncResult* result, gpointer counts)
+    {
+        g_autoptr(GVariant) reply = g_dbus_connection_call_finish(G_DBUS_CONNECTION(connection), result, nullptr);
+        auto& [done, refused] = *static_cast<Answers*>(counts);
+        ++(reply != nullptr ? done : refused);
+    };
+    {
+        const StoreLock lock;
+        for (unsigned i = 0; i < CallLimit::kMostWaiting + kMore; ++i)
+        {
+            g_dbus_connection_call(client.Bus(), "org.kiv.Subscriptions", "/org/kiv/Subscriptions", "org.kiv.Subscriptions1",
+                "Subscribe", g_variant_new("(sssos)", "push", std::to_string(i).c_str(), "", kPath, kInterface), nullptr,
+                G_DBUS_CALL_FLAGS_NONE, -1, nullptr, count, &answers);
+        }
+        IterateUntil([&] { return answers.refused == kMore; });
+        EXPECT_EQ(0U, answers.done);
+    }
+    IterateUntil([&] { return answers.done == CallLimit::kMostWaiting; });
+    EXPECT_EQ(kMore, answers.refused);
+    EXPECT_EQ("(true,)", client.Change("Subscribe", "")) << "its places are free again";
+    EXPECT_EQ("(true,)", other.Change("Unsubscribe", ""));
+}
+
+} // namespace
+} // namespace kiv::test
