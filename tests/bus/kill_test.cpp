@@ -12,8 +12,8 @@ using testing::AnyOf;
 using testing::AnyOfArray;
 using testing::IsEmpty;
 
-/// What GDBus prints when the bus dies while a proxy is being made.
-constexpr char kWhileProxiesAreMade[] = "Error while sending AddMatch() message: The connection is closed";
+/// What GDBus prints, after "Error while sending AddMatch()" or "GetNameOwner()", when the bus dies while a proxy is being made.
+constexpr char kWhileProxiesAreMade[] = " message: The connection is closed";
 
 unsigned long Wish(const char* variable, unsigned long otherwise)
 {
