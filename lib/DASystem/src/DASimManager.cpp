@@ -1,17 +1,15 @@
 #include "DASimManager.h"
 
+#include "CardStatus.h"
 #include "CountryTables.h"
 #include "Handles.h"
 #include "ResultCode.h"
+#include "SimAccess.h"
 #include "Singleton.h"
 
-#include <DAMutex.h>
-
-#include <cerrno>
 #include <cstdio>
 #include <cstring>
 #include <glib.h>
-#include <optional>
 #include <unistd.h>
 #include <utility>
 
@@ -21,6 +19,8 @@ using kiv::CountryInfoTable;
 using kiv::CString;
 using kiv::Place;
 using kiv::ServiceCountryCodeTable;
+using kiv::SimAccess;
+using kiv::Tapi;
 
 DASimManager* DASimManager::__pInstance = nullptr;
 
@@ -110,115 +110,6 @@ void DASimManager::GetAlpha3CountryCodeFromMcc(const char* mcc, char** alpha3Cou
 
 // Locks and handles ------------------------------------------------------------------------------------------------------------
 
-namespace
-{
-
-constexpr char kSimAccess[] = "CORE_MUTEX_NAME_SIM_ACCESS";
-
-/// Holds the SIM-access lock for the rest of an operation; false when the lock can not be had for want of memory.
-class SimAccess
-{
-public:
-    SimAccess()
-    {
-        kiv::NoThrow(0,
-            [this]
-            {
-                lock_.emplace(kSimAccess);
-                return 0;
-            });
-    }
-
-    explicit operator bool() const { return lock_.has_value(); }
-
-private:
-    std::optional<DAMutexLock> lock_;
-};
-
-/// One platform call under the SIM-access lock.
-/// @return the call's code; an error too when the lock can not be had
-template <class Call>
-int UnderSimAccess(Call&& call)
-{
-    struct Bracket
-    {
-        Bracket() { access.Lock(); }
-        ~Bracket() { access.Unlock(); }
-        DAMutex access{kSimAccess};
-    };
-    return kiv::NoThrow(-ENOMEM,
-        [&]
-        {
-            const Bracket bracket;
-            return call();
-        });
-}
-
-using Tapi = kiv::Owned<TapiHandle, tel_deinit>;
-
-/// The names of the modems.
-class CpNames
-{
-public:
-    CpNames() : names_(tel_get_cp_name_list()) {}
-
-    /// The name of a slot's modem; null when there is none.
-    const char* Of(int slot) const
-    {
-        const guint count = names_ == nullptr ? 0 : g_strv_length(names_.get());
-        return slot >= 0 && static_cast<guint>(slot) < count ? names_.get()[slot] : nullptr;
-    }
-
-    /// Opens a slot's modem; null when there is none or it does not open.
-    Tapi Open(int slot) const
-    {
-        const char* const name = Of(slot);
-        return Tapi(name == nullptr ? nullptr : tel_init(name));
-    }
-
-private:
-    kiv::Owned<char*, g_strfreev> names_;
-};
-
-/// The telephony handles of all slots, for one operation.
-class HandleList
-{
-public:
-    HandleList() : isOpen_(telephony_init(&list_) == 0) {}
-    HandleList(const HandleList&) = delete;
-    HandleList& operator=(const HandleList&) = delete;
-    ~HandleList()
-    {
-        if (isOpen_)
-            telephony_deinit(&list_);
-    }
-
-    /// None when it could not be opened.
-    int Count() const { return isOpen_ ? static_cast<int>(list_.count) : 0; }
-
-    bool Has(int slot) const { return slot >= 0 && slot < Count(); }
-
-    telephony_h operator[](int slot) const { return list_.handle[slot]; }
-
-private:
-    telephony_handle_list_s list_ = {};
-    bool isOpen_;
-};
-
-bool HasSlot(const telephony_handle_list_s& list, int slot)
-{
-    return slot >= 0 && static_cast<unsigned>(slot) < list.count;
-}
-
-/// Reads a card status; the flag that it changed is of no use here.
-int ReadCardStatus(const Tapi& modem, TelSimCardStatus_t* status)
-{
-    int cardChanged = 0;
-    return tel_get_sim_init_info(modem.get(), status, &cardChanged);
-}
-
-} // namespace
-
 bool DASimManager::SuccessToInitTelephonyHandle(telephony_handle_list_s* list)
 {
     telephony_handle_list_s opened = {};
@@ -259,76 +150,11 @@ char** DASimManager::GetCpNameList()
 namespace
 {
 
-enum class OnPolling
-{
-    Stop,
-    Wait,
-    Usable
-};
-
-/// How a card status is judged.
-struct CardStatus
-{
-    int status;
-    OnPolling onPolling;
-    bool isUsable;  ///< now
-    bool isWaiting; ///< may become usable
-};
-
-// clang-format off
-constexpr CardStatus CardStatusTable[] = {
-    // status                           on polling          now    waiting
-    {TAPI_SIM_STATUS_CARD_ERROR,         OnPolling::Stop,    false, false},
-    {TAPI_SIM_STATUS_CARD_NOT_PRESENT,   OnPolling::Stop,    false, false},
-    {TAPI_SIM_STATUS_SIM_INITIALIZING,   OnPolling::Wait,    false, true},
-    {TAPI_SIM_STATUS_SIM_INIT_COMPLETED, OnPolling::Usable,  true,  false},
-    {TAPI_SIM_STATUS_SIM_PIN_REQUIRED,   OnPolling::Wait,    false, true},
-    {TAPI_SIM_STATUS_SIM_PUK_REQUIRED,   OnPolling::Wait,    false, true},
-    {TAPI_SIM_STATUS_CARD_BLOCKED,       OnPolling::Stop,    false, false},
-    {TAPI_SIM_STATUS_SIM_NCK_REQUIRED,   OnPolling::Wait,    false, true},
-    {TAPI_SIM_STATUS_SIM_NSCK_REQUIRED,  OnPolling::Wait,    false, true},
-    {TAPI_SIM_STATUS_SIM_SPCK_REQUIRED,  OnPolling::Wait,    false, true},
-    {TAPI_SIM_STATUS_SIM_CCK_REQUIRED,   OnPolling::Wait,    false, true},
-    {TAPI_SIM_STATUS_CARD_REMOVED,       OnPolling::Stop,    false, false},
-    {TAPI_SIM_STATUS_SIM_LOCK_REQUIRED,  OnPolling::Wait,    false, true},
-    {TAPI_SIM_STATUS_CARD_CRASHED,       OnPolling::Stop,    false, false},
-    {TAPI_SIM_STATUS_CARD_POWEROFF,      OnPolling::Wait,    false, false},
-    {TAPI_SIM_STATUS_UNKNOWN,            OnPolling::Wait,    false, true},
-};
-// clang-format on
-
-/// The row of a status; one that the platform does not name is a definite failure.
-CardStatus Judge(TelSimCardStatus_t status)
-{
-    for (const CardStatus& row : CardStatusTable)
-    {
-        if (row.status == status)
-            return row;
-    }
-    return {status, OnPolling::Stop, false, false};
-}
-
-/// A SIM state that is not a usable one, as the log tells it.
-const char* NameOf(telephony_sim_state_e state)
-{
-    switch (state)
-    {
-    case TELEPHONY_SIM_STATE_UNAVAILABLE:
-        return "TELEPHONY_SIM_STATE_UNAVAILABLE";
-    case TELEPHONY_SIM_STATE_LOCKED:
-        return "TELEPHONY_SIM_STATE_LOCKED";
-    case TELEPHONY_SIM_STATE_UNKNOWN:
-        return "TELEPHONY_SIM_STATE_UNKNOWN";
-    default:
-        return "-";
-    }
-}
-
 /// Opens a modem that may still be starting; null after 100 attempts a second apart.
 Tapi WaitForModem(const Place& here, int slot)
 {
     constexpr int kAttempts = 100;
-    const CpNames names;
+    const kiv::CpNames names;
     for (int attempt = 1; attempt <= kAttempts; ++attempt)
     {
         if (Tapi modem = names.Open(slot))
@@ -355,7 +181,7 @@ bool DASimManager::IsSimExist()
         return false;
 
     bool exists = false;
-    const HandleList list;
+    const kiv::HandleList list;
     for (int slot = 0; slot < list.Count(); ++slot)
     {
         telephony_sim_state_e state = TELEPHONY_SIM_STATE_UNKNOWN;
@@ -364,7 +190,7 @@ bool DASimManager::IsSimExist()
         if (state == TELEPHONY_SIM_STATE_AVAILABLE)
             exists = true;
         else
-            KIV_ERROR("SIM STATE[%d] : %s", slot, NameOf(state));
+            KIV_ERROR("SIM STATE[%d] : %s", slot, kiv::NameOf(state));
     }
     return exists;
 }
@@ -373,7 +199,7 @@ bool DASimManager::IsSimAvailable(telephony_handle_list_s list, int slot)
 {
     telephony_sim_state_e state = TELEPHONY_SIM_STATE_UNKNOWN;
     const bool isRead =
-        HasSlot(list, slot) && UnderSimAccess([&] { return telephony_sim_get_state(list.handle[slot], &state); }) == 0;
+        kiv::HasSlot(list, slot) && kiv::UnderSimAccess([&] { return telephony_sim_get_state(list.handle[slot], &state); }) == 0;
     if (isRead && state == TELEPHONY_SIM_STATE_AVAILABLE)
         return true;
     KIV_ERROR("Sim is not available");
@@ -385,8 +211,8 @@ bool DASimManager::IsAvaliableState(int slot, TelSimCardStatus_t* status)
     const SimAccess access;
     if (!access)
         return false;
-    const Tapi modem = CpNames().Open(slot);
-    return modem && ReadCardStatus(modem, status) == 0 && Judge(*status).isUsable;
+    const Tapi modem = kiv::CpNames().Open(slot);
+    return modem && kiv::ReadCardStatus(modem, status) == 0 && kiv::Judge(*status).isUsable;
 }
 
 bool DASimManager::IsAvaliableSimStateOnPolling(int slot, int, TelSimCardStatus_t* status)
@@ -396,27 +222,27 @@ bool DASimManager::IsAvaliableSimStateOnPolling(int slot, int, TelSimCardStatus_
         return false;
 
     int pauses = 0;
-    OnPolling verdict = OnPolling::Wait;
+    kiv::OnPolling verdict = kiv::OnPolling::Wait;
     for (;;)
     {
-        if (ReadCardStatus(modem, status) == 0)
+        if (kiv::ReadCardStatus(modem, status) == 0)
         {
             KIV_INFO("current SIM Status[%d]", *status);
-            verdict = Judge(*status).onPolling;
-            if (verdict != OnPolling::Wait)
+            verdict = kiv::Judge(*status).onPolling;
+            if (verdict != kiv::OnPolling::Wait)
                 break;
         }
         ++pauses;
         sleep(1);
     }
-    const bool isUsable = verdict == OnPolling::Usable;
+    const bool isUsable = verdict == kiv::OnPolling::Usable;
     KIV_INFO("slotNum[%d], result[%d], status[%d], time[%d]", slot, static_cast<int>(isUsable), *status, pauses);
     return isUsable;
 }
 
 bool DASimManager::IsWaittingSimCheck(TelSimCardStatus_t status)
 {
-    return Judge(status).isWaiting;
+    return kiv::Judge(status).isWaiting;
 }
 
 // SIM identity -----------------------------------------------------------------------------------------------------------------
@@ -427,8 +253,8 @@ namespace
 /// Reads the IMSI record of a slot's modem.
 bool ReadImsiRecord(int slot, TelSimImsiInfo_t& record)
 {
-    const Tapi modem = CpNames().Open(slot);
-    return modem && UnderSimAccess([&] { return tel_get_sim_imsi(modem.get(), &record); }) == 0;
+    const Tapi modem = kiv::CpNames().Open(slot);
+    return modem && kiv::UnderSimAccess([&] { return tel_get_sim_imsi(modem.get(), &record); }) == 0;
 }
 
 /// Reads a text made of the IMSI record of a slot.
@@ -476,7 +302,7 @@ int DASimManager::GetPhoneNumberFromSim(telephony_handle_list_s list, int slot, 
     if (IsSimAvailable(list, slot))
     {
         char* text = nullptr;
-        const int code = UnderSimAccess([&] { return telephony_sim_get_subscriber_number(list.handle[slot], &text); });
+        const int code = kiv::UnderSimAccess([&] { return telephony_sim_get_subscriber_number(list.handle[slot], &text); });
         const CString owner(text);
         if (code == 0 && text != nullptr)
             *number = strdup(text);
@@ -542,7 +368,7 @@ bool DASimManager::GetRoamingStatus(int slot, bool* roaming)
     if (!access || roaming == nullptr)
         return false;
 
-    const HandleList list;
+    const kiv::HandleList list;
     telephony_network_service_state_e state = TELEPHONY_NETWORK_SERVICE_STATE_OUT_OF_SERVICE;
     if (!list.Has(slot) || telephony_network_get_service_state(list[slot], &state) != 0 ||
         state != TELEPHONY_NETWORK_SERVICE_STATE_IN_SERVICE)
@@ -600,10 +426,10 @@ bool DASimManager::IsAvaliableSendSMS(int slot, TelSimCardStatus_t* status, int*
     if (!access)
         return false;
 
-    const Tapi modem = CpNames().Open(slot);
+    const Tapi modem = kiv::CpNames().Open(slot);
     if (!modem)
         return false;
-    const int code = ReadCardStatus(modem, status);
+    const int code = kiv::ReadCardStatus(modem, status);
     if (code != 0)
     {
         KIV_ERROR("Not available. ret[%d]", code);

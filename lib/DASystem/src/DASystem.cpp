@@ -4,10 +4,12 @@
 #include "DAConnectionManager.h"
 #include "DADBusManager.h"
 #include "DASimManager.h"
+#include "Forward.h"
 #include "Handles.h"
 #include "Notifications.h"
 #include "Policy.h"
 #include "Singleton.h"
+#include "Slots.h"
 
 #include <DAUtil.h>
 #include <app_alarm.h>
@@ -151,103 +153,9 @@ int DASystem::GetDeviceUniqueID(const char** id)
 
 // SIM queries over all slots ---------------------------------------------------------------------------------------------------
 
-namespace
-{
-
-/// The telephony handles of all slots, for one query.
-class Slots
-{
-public:
-    Slots() : isOpen_(Ask(false, &DASimManager::SuccessToInitTelephonyHandle, &list_)) {}
-    Slots(const Slots&) = delete;
-    Slots& operator=(const Slots&) = delete;
-    ~Slots()
-    {
-        if (isOpen_)
-            Ask(&DASimManager::DeleteTelephonyHandle, list_);
-    }
-
-    explicit operator bool() const { return isOpen_; }
-
-    /// None when they could not be opened.
-    int Count() const { return isOpen_ ? static_cast<int>(list_.count) : 0; }
-
-    bool IsAvailable(int slot) const { return Ask(false, &DASimManager::IsSimAvailable, list_, slot); }
-
-    telephony_h Handle(int slot) const { return list_.handle[slot]; }
-
-    /// Reads a text of one slot.
-    /// @return the reader's code; 0 with a text
-    template <class Char>
-    int Read(int (DASimManager::*reader)(telephony_handle_list_s, int, Char**), int slot, CString& text) const
-    {
-        Char* value = nullptr;
-        const int code = Ask<DASimManager, int>(KIV_RESULT_INVALID_ARGUMENT, reader, list_, slot, &value);
-        text.reset(const_cast<char*>(value)); // const in the reader of the MCC alone, and the caller's to release there too
-        return code;
-    }
-
-private:
-    telephony_handle_list_s list_ = {};
-    bool isOpen_;
-};
-
-/// A copy of the text of the first slot that answers; the out-parameter is untouched when none does.
-template <class Reader>
-int FirstAnswer(Reader reader, char** out)
-{
-    const Slots slots;
-    int code = KIV_RESULT_INVALID_ARGUMENT;
-    for (int slot = 0; slot < slots.Count(); ++slot)
-    {
-        CString text;
-        code = slots.Read(reader, slot, text);
-        if (code != 0)
-            continue;
-        char* const copy = strdup(text.get());
-        if (copy == nullptr)
-            return KIV_RESULT_INVALID_ARGUMENT;
-        *out = copy;
-        return 0;
-    }
-    return code;
-}
-
-/// Appends a text, and owns it until then.
-/// @return how many were appended: none when there was no memory for the text
-int Append(char* text, std::vector<char*>& values)
-{
-    CString owner(text);
-    if (!owner)
-        return 0;
-    values.push_back(text);
-    static_cast<void>(owner.release());
-    return 1;
-}
-
-/// Appends a copy of the text of every slot that answers.
-template <class Reader>
-void EveryAnswer(Reader reader, std::vector<char*>* values, int* count)
-{
-    const Slots slots;
-    if (!slots)
-        return;
-
-    *count = 0;
-    for (int slot = 0; slot < slots.Count(); ++slot)
-    {
-        CString text;
-        if (slots.Read(reader, slot, text) != 0)
-            continue;
-        *count += kiv::NoThrow(0, [&] { return Append(strdup(text.get()), *values); });
-    }
-}
-
-} // namespace
-
 bool DASystem::IsSimAvailable()
 {
-    const Slots slots;
+    const kiv::Slots slots;
     for (int slot = 0; slot < slots.Count(); ++slot)
     {
         if (slots.IsAvailable(slot))
@@ -258,7 +166,7 @@ bool DASystem::IsSimAvailable()
 
 bool DASystem::IsDualSimAvailable()
 {
-    const Slots slots;
+    const kiv::Slots slots;
     if (!slots)
         return false;
     if (slots.Count() < 2)
@@ -271,42 +179,42 @@ bool DASystem::IsDualSimAvailable()
 
 int DASystem::GetMCCFromSim(char** mcc)
 {
-    return FirstAnswer(&DASimManager::GetMCCFromSim, mcc);
+    return kiv::FirstAnswer(&DASimManager::GetMCCFromSim, mcc);
 }
 
 int DASystem::GetMNCFromSim(char** mnc)
 {
-    return FirstAnswer(&DASimManager::GetMNCFromSim, mnc);
+    return kiv::FirstAnswer(&DASimManager::GetMNCFromSim, mnc);
 }
 
 int DASystem::GetIMSIFromSim(char** imsi)
 {
-    return FirstAnswer(&DASimManager::GetIMSIFromSim, imsi);
+    return kiv::FirstAnswer(&DASimManager::GetIMSIFromSim, imsi);
 }
 
 int DASystem::GetPhoneNumberFromSim(char** number)
 {
-    return FirstAnswer(&DASimManager::GetPhoneNumberFromSim, number);
+    return kiv::FirstAnswer(&DASimManager::GetPhoneNumberFromSim, number);
 }
 
 void DASystem::GetMCCFromSim(std::vector<char*>* values, int* count)
 {
-    EveryAnswer(&DASimManager::GetMCCFromSim, values, count);
+    kiv::EveryAnswer(&DASimManager::GetMCCFromSim, values, count);
 }
 
 void DASystem::GetMNCFromSim(std::vector<char*>* values, int* count)
 {
-    EveryAnswer(&DASimManager::GetMNCFromSim, values, count);
+    kiv::EveryAnswer(&DASimManager::GetMNCFromSim, values, count);
 }
 
 void DASystem::GetIMSIFromSim(std::vector<char*>* values, int* count)
 {
-    EveryAnswer(&DASimManager::GetIMSIFromSim, values, count);
+    kiv::EveryAnswer(&DASimManager::GetIMSIFromSim, values, count);
 }
 
 void DASystem::GetPhoneNumberFromSim(std::vector<char*>* values, int* count)
 {
-    EveryAnswer(&DASimManager::GetPhoneNumberFromSim, values, count);
+    kiv::EveryAnswer(&DASimManager::GetPhoneNumberFromSim, values, count);
 }
 
 // Country lookups --------------------------------------------------------------------------------------------------------------
@@ -511,7 +419,7 @@ int CopyOut(const char* text, char** out)
 /// @return whether one answered
 bool FirstImei(const Place& here, char** imei)
 {
-    const Slots slots;
+    const kiv::Slots slots;
     if (!slots)
         KIV_ERROR_AT(here, "telephony_init Failed. Start to get IMEI from current time");
     for (int slot = 0; slot < slots.Count(); ++slot)

@@ -34,23 +34,6 @@ Class* Singleton(Class*& instance, const Place& here, const char* failure)
     return made;
 }
 
-/// Calls a member of a manager with these arguments: what every forward of the facade does.
-/// @param failure  the result when the manager can not be made
-template <class Manager, class Result, class... Parameters, class... Arguments>
-Result Ask(Result failure, Result (Manager::*member)(Parameters...), Arguments&&... arguments)
-{
-    Manager* const manager = Manager::GetInstance();
-    return manager == nullptr ? failure : (manager->*member)(std::forward<Arguments>(arguments)...);
-}
-
-/// The same for a member without a result.
-template <class Manager, class... Parameters, class... Arguments>
-void Ask(void (Manager::*member)(Parameters...), Arguments&&... arguments)
-{
-    if (Manager* const manager = Manager::GetInstance())
-        (manager->*member)(std::forward<Arguments>(arguments)...);
-}
-
 } // namespace kiv
 
 #endif
