@@ -4,6 +4,7 @@
 #include "SharedConnection.h"
 
 #include <DASubscribeDataManager.h>
+#include <RecordRules.h>
 #include <ResultCode.h>
 
 #include <list>
@@ -63,16 +64,21 @@ void CallEach(const Place& here, const std::list<_SubscriberInfo>& subscribers, 
 
 const char* kiv::Flaw(const _SubscriberInfo& subscriber)
 {
-    if (!g_dbus_is_name(subscriber.busname.c_str()))
+    switch (FlawOf(subscriber.busname, subscriber.objectpath, subscriber.interface))
+    {
+    case RecordFlaw::None:
+        return nullptr;
+    case RecordFlaw::BusName:
         return "busname is not a bus name";
-    if (!g_variant_is_object_path(subscriber.objectpath.c_str()))
+    case RecordFlaw::ObjectPath:
         return "objectpath is not an object path";
-    if (!g_dbus_is_interface_name(subscriber.interface.c_str()))
+    case RecordFlaw::Interface:
         return "interface is not an interface name";
-    if (g_str_has_prefix(subscriber.objectpath.c_str(), "/org/freedesktop/DBus/Local"))
+    case RecordFlaw::ReservedPath:
         return "objectpath is reserved";
-    if (g_str_has_prefix(subscriber.interface.c_str(), "org.freedesktop.DBus.Local"))
+    case RecordFlaw::ReservedInterface:
         return "interface is reserved";
+    }
     return nullptr;
 }
 

@@ -1,0 +1,42 @@
+#ifndef KIV_RECORDRULES_H
+#define KIV_RECORDRULES_H
+
+#include <gio/gio.h>
+
+#include <string>
+
+namespace kiv
+{
+
+/// Why a subscriber cannot be called.
+enum class RecordFlaw
+{
+    None,
+    BusName,
+    ObjectPath,
+    Interface,
+    ReservedPath,
+    ReservedInterface
+};
+
+/// The rules for records, for those who write them and for those who call the subscriber. GDBus does not report a malformed record
+/// as such, and the bus disconnects whoever calls the reserved path or interface, or one that begins with its letters.
+inline RecordFlaw FlawOf(const std::string& busName, const std::string& objectPath, const std::string& interface)
+{
+    const auto isWhole = [](const std::string& text) { return text.find('\0') == std::string::npos; };
+    if (!g_dbus_is_name(busName.c_str()) || !isWhole(busName))
+        return RecordFlaw::BusName;
+    if (!g_variant_is_object_path(objectPath.c_str()) || !isWhole(objectPath))
+        return RecordFlaw::ObjectPath;
+    if (!g_dbus_is_interface_name(interface.c_str()) || !isWhole(interface))
+        return RecordFlaw::Interface;
+    if (g_str_has_prefix(objectPath.c_str(), "/org/freedesktop/DBus/Local"))
+        return RecordFlaw::ReservedPath;
+    if (g_str_has_prefix(interface.c_str(), "org.freedesktop.DBus.Local"))
+        return RecordFlaw::ReservedInterface;
+    return RecordFlaw::None;
+}
+
+} // namespace kiv
+
+#endif
