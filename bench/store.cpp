@@ -25,7 +25,7 @@ void Fill(const std::string& path, int wanted, int stored)
 {
     g_setenv("KIV_SUBSCRIBERS", path.c_str(), TRUE);
     std::string reason;
-    const DASubscription first = {"status", "wanted", {"org.example.Client", "/org/example/Client/0", "org.example.Client"}};
+    const DASubscription first = {"push", "wanted", {"org.example.Client", "/org/example/Client/0", "org.example.Client"}};
     Check(DASubscriberStore().Add(first, reason) == DASubscriberStore::Outcome::Done, reason);
 
     sqlite3* opened = nullptr;
@@ -34,7 +34,7 @@ void Fill(const std::string& path, int wanted, int stored)
     Check(code == SQLITE_OK, sqlite3_errmsg(opened));
     const std::string sql = "WITH RECURSIVE number(n) AS (SELECT 1 UNION ALL SELECT n + 1 FROM number WHERE n + 1 < " +
                             std::to_string(stored) +
-                            ") INSERT INTO subscription(kind, key, busname, objectpath, interface) SELECT 'status',"
+                            ") INSERT INTO subscription(kind, key, busname, objectpath, interface) SELECT 'push',"
                             " CASE WHEN n < " +
                             std::to_string(wanted) +
                             " THEN 'wanted' ELSE n % 1000 END, 'org.example.Client', '/org/example/Client/' || n,"
@@ -50,7 +50,7 @@ Side Finds(const std::string& path, int wanted, int times)
     {
         std::list<_SubscriberInfo> found;
         std::string reason;
-        DASubscriberStore().Find("status", "wanted", found, reason);
+        DASubscriberStore().Find("push", "wanted", found, reason);
         Check(found.size() == static_cast<std::size_t>(wanted), "finds " + std::to_string(found.size()) + ' ' + reason);
     };
     const auto open = [path, find]

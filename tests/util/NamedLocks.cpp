@@ -42,7 +42,7 @@ TEST(NamedLocks, ManyNamesAreAsManyLocksAlsoWhileTheProcessEnds)
     {
         std::list<DAMutexLock> held;
         for (int i = 0; i < 60; ++i)
-            held.emplace_back(i == 0 ? nullptr : ("name " + std::to_string(i)).c_str());
+            held.emplace_back(i == 0 ? nullptr : ("a name that differs at its end " + std::to_string(i)).c_str());
     };
     std::atexit(holdMany);
     EXPECT_EXIT(holdMany(); std::exit(0), testing::ExitedWithCode(0), "");

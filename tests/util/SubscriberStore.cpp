@@ -1,57 +1,17 @@
-#include "support/Texts.h"
+#include "StoreTest.h"
 
-#include <DASubscribeDataManager.h>
-#include <DASubscriberStore.h>
-#include <LogControl.h>
+#include <glib.h>
 
-#include <sys/wait.h>
-#include <unistd.h>
-
-#include <csignal>
+#include <sys/stat.h>
 
 namespace
 {
-
-namespace fs = std::filesystem;
-using kiv::test::Contents;
-using Outcome = DASubscriberStore::Outcome;
-
-struct SubscriberStore : testing::Test
-{
-    SubscriberStore() { Use("new/directory/subscribers.db"); }
-    ~SubscriberStore() override { fs::remove_all(directory); }
-
-    void Use(const std::string& name) { setenv("KIV_SUBSCRIBERS", (directory / name).c_str(), 1); }
-
-    Outcome Add(const char* kind, const std::string& key, const std::string& busname)
-    {
-        return store.Add({kind, key, {busname, "/org/example/A", "org.example.A"}}, reason);
-    }
-
-    /// The bus names that are appended, a blank behind each, and what is logged meanwhile.
-    std::string Find(const char* kind, const char* key)
-    {
-        kiv::platform::StartLog();
-        std::list<_SubscriberInfo> found(1);
-        std::string text = DASubscribeDataManager().GetSubscriber(kind, key, found) ? "" : "failed: ";
-        found.pop_front();
-        for (const _SubscriberInfo& subscriber : found)
-            text += subscriber.busname + ' ';
-        for (const auto& line : kiv::platform::TakeLog())
-            text += std::to_string(line.priority) + ' ' + line.tag + ' ' + line.text;
-        return text;
-    }
-
-    const fs::path directory = mkdtemp((fs::temp_directory_path() / "kiv-store-XXXXXX").string().data());
-    DASubscriberStore store;
-    std::string reason;
-};
 
 TEST_F(SubscriberStore, GivesTheSubscribersOfOneEventInTheOrderInWhichTheySubscribed)
 {
     for (const char* busname : {":1.7", "org.example.Z", "org.example.A"})
     {
-        for (const auto& [kind, key] : {std::pair("status", "7"), {"status", "77"}, {"status", "all"}, {"push", "7"}})
+        for (const auto& [kind, key] : {std::pair("status", "7"), {"status", "77"}, {"auth", "all"}, {"push", "7"}})
             EXPECT_EQ(Outcome::Done, Add(kind, key, busname)) << reason;
     }
     EXPECT_EQ(Outcome::Unchanged, Add("status", "7", "org.example.Z"));
@@ -59,18 +19,20 @@ TEST_F(SubscriberStore, GivesTheSubscribersOfOneEventInTheOrderInWhichTheySubscr
         EXPECT_EQ(outcome, store.Remove({"status", "77", {"org.example.Z", "/org/example/A", "org.example.A"}}, reason));
     EXPECT_EQ(Outcome::Done, Add("status", "77", "org.example.Z"));
 
-    for (const auto& [kind, key] : {std::pair("status", "7"), {"status", "all"}, {"push", "7"}})
+    for (const auto& [kind, key] : {std::pair("status", "7"), {"auth", "all"}, {"push", "7"}})
         EXPECT_EQ(":1.7 org.example.Z org.example.A ", Find(kind, key));
     EXPECT_EQ(":1.7 org.example.A org.example.Z ", Find("status", "77"));
-    for (const auto& [kind, key] : {std::pair("status", "8"), {"auth", "all"}, {"status", nullptr}})
+    for (const auto& [kind, key] : {std::pair("status", "8"), {"activated", "all"}, {"status", nullptr}})
         EXPECT_EQ("", Find(kind, key));
 }
 
-TEST_F(SubscriberStore, RefusesWhatNoSubscriptionCanBeAndIsMadeByTheFirstThatCan)
+TEST_F(SubscriberStore, RefusesWhatNoSubscriptionCanBeAndIsMadeForItsUserAlone)
 {
     const char* const fields[] = {"kind \"", "key \"", "bus name \"", "object path \"", "interface \""};
     const std::pair<int, std::string> faults[] = {{0, "activate"}, {1, ""}, {1, std::string(256, 'k')}, {1, "\xff"}, {1, "a\nb"},
-        {2, {"a.b\0c", 5}}, {3, "/a/"}, {3, "/org/freedesktop/DBus/Locale/x"}, {4, ":1.7"}, {4, "org.freedesktop.DBus.Local"}};
+        {1, "\u202e"}, {1, "\u2028"}, {1, "\u2029"}, {2, {"a.b\0c", 5}}, {3, "/a/"}, {3, {"/\0", 2}},
+        {3, '/' + std::string(1024, 'p')}, {4, {"a.b\0", 4}}, {3, "/org/freedesktop/DBus/Locale/x"}, {4, ":1.7"},
+        {4, "org.freedesktop.DBus.Local"}};
     for (const auto& [field, value] : faults)
     {
         std::string values[] = {"push", "7", "a.b", "/", "a.b"};
@@ -80,43 +42,47 @@ TEST_F(SubscriberStore, RefusesWhatNoSubscriptionCanBeAndIsMadeByTheFirstThatCan
     }
     EXPECT_EQ("", Find("push", "7"));
     EXPECT_TRUE(fs::is_empty(directory));
-    EXPECT_EQ(Outcome::Done, Add("push", std::string(255, 'k'), ":1.7")) << reason;
-    EXPECT_EQ(fs::perms::owner_all, fs::status(directory / "new/directory").permissions());
+    const mode_t usual = umask(0);
+    EXPECT_EQ(Outcome::Done, store.Add({"push", std::string(255, 'k'), {":1.7", '/' + std::string(1023, 'p'), "a.b"}}, reason));
+    umask(usual);
+    for (const char* made : {"new", "new/directory"})
+        EXPECT_EQ(fs::perms::owner_all, fs::status(directory / made).permissions());
+    EXPECT_EQ(fs::perms::owner_read | fs::perms::owner_write, fs::status(store.Path()).permissions());
 }
 
-TEST_F(SubscriberStore, LosesNothingWhenManyProcessesMakeFillAndReadIt)
+TEST_F(SubscriberStore, TakesForAServiceIdOnlyWhatTheAgentLooksUp)
 {
-    for (const std::string writer : {":a.", ":b.", ":c.", ":d."})
+    for (const char* const kind : {"policy", "status"})
     {
-        if (fork() != 0)
-            continue;
-        for (int i = 0; i < 64; ++i)
-        {
-            Use(std::to_string(i / 2));
-            EXPECT_THAT(Find("push", "7"), testing::Not(testing::HasSubstr("failed")));
-            EXPECT_EQ(Outcome::Done, Add("push", "7", writer + std::to_string(i % 2))) << reason;
-        }
-        _exit(HasFailure() ? 1 : 0);
-    }
-    for (int status = 0; wait(&status) > 0;)
-        EXPECT_EQ(0, status);
-    for (int i = 0; i < 32; ++i)
-    {
-        Use(std::to_string(i));
-        EXPECT_THAT(Find("push", "7"), testing::SizeIs(8 * std::string(":a.0 ").size()));
+        for (const char* const key : {"0", "7", "-1", "123456789", "-12345678"})
+            EXPECT_EQ(Outcome::Done, Add(kind, key, ":1.7")) << reason;
+        for (const char* const key : {"all", "-", "-0", "07", "-07", "+7", "7 ", "0x7", "1234567890", "-123456789"})
+            EXPECT_EQ(Outcome::Refused, Add(kind, key, ":1.7")) << key;
     }
 }
 
-TEST_F(SubscriberStore, LeavesAFileThatItCanNotUseAsItIsAndSaysSoInOneErrorLine)
+TEST_F(SubscriberStore, IsWhereTheEnvironmentSaysOrInTheStateDirectory)
+{
+    for (const auto& [name, path] : {std::pair<fs::path, fs::path>("/a/b", "/a/b"), {"a/b", fs::current_path() / "a/b"},
+             {"", fs::path(g_get_user_state_dir()) / "kiv/subscribers.db"}})
+    {
+        setenv("KIV_SUBSCRIBERS", name.c_str(), 1);
+        EXPECT_EQ(path, store.Path());
+    }
+}
+
+TEST_F(SubscriberStore, LeavesAFileThatItCannotUseAsItIsAndSaysWhatToDo)
 {
     ASSERT_EQ(Outcome::Done, Add("push", "7", ":1.7"));
     const std::string good = Contents(store.Path());
     const std::tuple<const char*, std::string, const char*> rows[] = {
-        {"new/directory/subscribers.db", "spoilt while it is open", "file is not a database"},
-        {"later", std::string(good).replace(63, 1, 1, '\2'), "schema version 2 instead of 1; the file is left as it is"},
-        {"foreign", std::string(good).replace(63, 1, 1, '\0'), "schema version 0 instead of 1; the file is left as it is"},
-        {"new/directory", "", "not a regular file"},
-        {"later/subscribers.db", "", "Not a directory"},
+        {"new/directory/subscribers.db", "spoilt while it is open",
+            "file is not a database; the file is damaged: move it away and subscribe again"},
+        {"later", std::string(good).replace(63, 1, 1, '\2'), "schema version 2 instead of 1; set KIV_SUBSCRIBERS to another file"},
+        {"foreign", std::string(good).replace(63, 1, 1, '\0'),
+            "schema version 0 instead of 1; set KIV_SUBSCRIBERS to another file"},
+        {"new/directory", "", "not a regular file; set KIV_SUBSCRIBERS to another file"},
+        {"later/subscribers.db", "", "Not a directory; set KIV_SUBSCRIBERS to another file"},
     };
     for (const auto& [name, content, trouble] : rows)
     {
@@ -126,26 +92,6 @@ TEST_F(SubscriberStore, LeavesAFileThatItCanNotUseAsItIsAndSaysSoInOneErrorLine)
         EXPECT_EQ(Outcome::Failed, Add("push", "7", ":1.8")) << name;
         EXPECT_EQ(content, Contents(store.Path()));
     }
-}
-
-TEST_F(SubscriberStore, IsTheFileAtItsPathAlsoWhileAProcessHasTheFormerOneOpen)
-{
-    for (char letter = 'a'; letter <= 'z'; ++letter)
-        ASSERT_EQ(Outcome::Done, Add("push", std::string(250, letter), ":8.8"));
-    Use("smaller.db");
-    const pid_t holder = fork();
-    if (holder == 0)
-    {
-        raise(Add("push", "7", ":1.7") == Outcome::Done ? SIGSTOP : SIGKILL);
-        _exit(0);
-    }
-    int status = 0;
-    ASSERT_TRUE(waitpid(holder, &status, WUNTRACED) == holder && WIFSTOPPED(status));
-
-    fs::rename(directory / "new/directory/subscribers.db", store.Path());
-    EXPECT_EQ(":8.8 ", Find("push", std::string(250, 'z').c_str()));
-    kill(holder, SIGKILL);
-    EXPECT_EQ(holder, waitpid(holder, nullptr, 0));
 }
 
 } // namespace

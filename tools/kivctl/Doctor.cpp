@@ -71,7 +71,8 @@ Finding LookAtStore(const Command&)
     std::string reason;
     if (DASubscriberStore().List(subscriptions, reason) == DASubscriberStore::Outcome::Done)
         return {DASubscriberStore::Path() + ", subscriptions: " + std::to_string(subscriptions.size())};
-    return {reason, "take the file away, or have KIV_SUBSCRIBERS name another"};
+    const std::size_t end = reason.rfind("; "); // what to do follows, as the store knows the cause
+    return {reason.substr(0, end), reason.substr(end + 2)};
 }
 
 Finding LookAtDevice(const Command& command)

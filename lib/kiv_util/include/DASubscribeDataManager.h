@@ -14,7 +14,7 @@ public:
 
     /// Appends the subscribers of one event in the order in which they subscribed.
     /// @param kind  "policy", "status", "auth", "activated" or "number_changed"
-    /// @param key   decimal service id, or "all"; what was recorded under "all" is found by "all" alone
+    /// @param key   decimal service ID for "policy" and "status", "all" for the others
     /// @return whether the store could be asked; one error line in the platform log when not, and nothing is appended
     /// Any thread; blocks on the store's file.
     bool GetSubscriber(const char* kind, const char* key, std::list<_SubscriberInfo>& subscribers);

@@ -2,6 +2,7 @@
 
 #include "StoreConnection.h"
 
+#include <RecordRules.h>
 #include <gio/gio.h>
 #include <pthread.h>
 
@@ -15,6 +16,8 @@
 namespace
 {
 
+using kiv::FlawOf;
+using kiv::RecordFlaw;
 using Outcome = DASubscriberStore::Outcome;
 
 /// What the process's callers share, since to open the store takes far longer than to search it.
@@ -37,46 +40,93 @@ void AfterFork()
     Shared().use.unlock();
 }
 
-void AtExit()
-{
-    const std::lock_guard<std::mutex> lock(Shared().use);
-    Shared().connection.reset(); // the store is left as one file
-}
-
 /// Never destroyed: the store may still be asked while the process ends.
 SharedConnection& Shared()
 {
     static SharedConnection* const shared = []
     {
         auto made = std::make_unique<SharedConnection>();
-        if (pthread_atfork(BeforeFork, AfterFork, AfterFork) != 0 || std::atexit(AtExit) != 0)
+        if (pthread_atfork(BeforeFork, AfterFork, AfterFork) != 0)
             throw std::bad_alloc();
         return made.release();
     }();
     return *shared;
 }
 
-/// Runs `work` with the open store, or with null where `open` finds none.
+/// Runs `work` with the path of the store, one thread at a time.
 template <typename Work>
-Outcome WithStore(std::unique_ptr<StoreConnection> (*open)(const std::string& path), std::string& reason, Work&& work)
+Outcome Guarded(std::string& reason, Work&& work)
 {
     const std::lock_guard<std::mutex> lock(Shared().use);
-    std::unique_ptr<StoreConnection>& connection = Shared().connection;
     try
     {
-        const std::string path = DASubscriberStore::Path();
-        if (connection != nullptr && !connection->Serves(path))
-            connection.reset();
-        if (connection == nullptr)
-            connection = open(path);
-        return work(connection.get());
+        return work(DASubscriberStore::Path());
     }
     catch (const StoreTrouble& trouble)
     {
-        connection.reset();
         reason = trouble.what();
         return Outcome::Failed;
     }
+}
+
+/// Runs `read` with the open store, if there is one.
+template <typename Read>
+Outcome Reading(std::string& reason, Read&& read)
+{
+    const auto readIf = [&](StoreConnection* store)
+    {
+        if (store != nullptr)
+            read(*store);
+        return Outcome::Done;
+    };
+    return Guarded(reason,
+        [&](const std::string& path)
+        {
+            std::unique_ptr<StoreConnection> connection = std::move(Shared().connection);
+            try
+            {
+                if (connection == nullptr || !connection->IsUpToDate(path))
+                    connection = StoreConnection::Open(path, StoreConnection::Use::Read);
+                readIf(connection.get());
+            }
+            catch (const JournalTrouble&)
+            {
+                connection.reset();
+                return readIf(StoreConnection::Open(path, StoreConnection::Use::Change).get());
+            }
+            if (connection != nullptr && !connection->HasLog())
+                Shared().connection = std::move(connection);
+            return Outcome::Done;
+        });
+}
+
+/// Runs `change`, and says whether it changed anything. One that went into a file while another took its place is made again there.
+template <typename Change>
+Outcome Changing(StoreConnection::Use use, std::string& reason, Change&& change)
+{
+    return Guarded(reason,
+        [&](const std::string& path)
+        {
+            Outcome outcome = Outcome::Unchanged;
+            for (;;)
+            {
+                const std::unique_ptr<StoreConnection> connection = StoreConnection::Open(path, use);
+                if (connection == nullptr)
+                    return outcome;
+                try
+                {
+                    if (change(*connection))
+                        outcome = Outcome::Done;
+                    if (connection->IsInPlace())
+                        return outcome;
+                }
+                catch (const StoreTrouble&)
+                {
+                    if (connection->IsInPlace())
+                        throw;
+                }
+            }
+        });
 }
 
 constexpr const char* kKinds[] = {"policy", "status", "auth", "activated", "number_changed", "push"};
@@ -94,51 +144,83 @@ std::string KindWanted()
     return wanted;
 }
 
-bool IsKey(const std::string& text)
+/// Whether people can read a text on one line as it is: without control and invisible formatting characters and line separators.
+bool IsPlain(const std::string& text)
 {
-    if (text.empty() || text.size() > 255 || g_utf8_validate(text.data(), static_cast<gssize>(text.size()), nullptr) == FALSE)
-        return false;
     for (const char* at = text.c_str(); *at != '\0'; at = g_utf8_next_char(at))
     {
-        if (g_unichar_iscntrl(g_utf8_get_char(at)) != FALSE)
+        switch (g_unichar_type(g_utf8_get_char(at)))
+        {
+        case G_UNICODE_CONTROL:
+        case G_UNICODE_FORMAT:
+        case G_UNICODE_LINE_SEPARATOR:
+        case G_UNICODE_PARAGRAPH_SEPARATOR:
             return false;
+        default:
+            break;
+        }
     }
     return true;
 }
 
-/// Why a subscription can not be one; empty when it can.
+/// Whether the agent can look a service ID up by this text: it writes the ID in decimal and takes the first nine characters.
+bool IsServiceId(const std::string& text)
+{
+    const std::string digits = text.substr(text.front() == '-' ? 1 : 0);
+    return text.size() <= 9 && !digits.empty() && digits.find_first_not_of("0123456789") == std::string::npos &&
+           (digits.front() != '0' || text == "0");
+}
+
+/// What is wanted instead of the key; null if it is possible.
+const char* WantedKey(const DASubscription& subscription)
+{
+    const std::string& key = subscription.key;
+    if (key.empty() || key.size() > 255 || g_utf8_validate(key.data(), static_cast<gssize>(key.size()), nullptr) == FALSE ||
+        !IsPlain(key))
+        return "1 to 255 bytes of UTF-8 without control or invisible characters are needed, such as 7 or all";
+    if ((subscription.kind == "policy" || subscription.kind == "status") && !IsServiceId(key))
+        return "a service ID is needed: a decimal number, of which the first nine characters count, such as 7";
+    return nullptr;
+}
+
+constexpr std::size_t kMostPathBytes = 1024;
+
+std::string Refusal(const char* field, const std::string& value, const std::string& wanted)
+{
+    const g_autofree char* shown = g_strescape(value.c_str(), nullptr);
+    return std::string(field) + " \"" + shown + "\": " + wanted;
+}
+
+/// Why a subscription is not possible; empty when it is.
 std::string Objection(const DASubscription& subscription)
 {
-    const _SubscriberInfo& subscriber = subscription.subscriber;
-    const struct
+    const auto& [busName, objectPath, interface] = subscription.subscriber;
+    constexpr const char* kName = "two or more elements joined by dots are needed, such as org.example.Client";
+    constexpr const char* kPath =
+        "elements of letters, digits and underscores, a slash before each, are needed, such as /org/example/Client";
+    constexpr const char* kReserved = "the bus reserves names that begin like this, and disconnects whoever calls them";
+
+    if (!IsKind(subscription.kind))
+        return Refusal("kind", subscription.kind, KindWanted());
+    if (const char* const wanted = WantedKey(subscription))
+        return Refusal("key", subscription.key, wanted);
+    if (objectPath.size() > kMostPathBytes)
+        return Refusal("object path", objectPath, "at most " + std::to_string(kMostPathBytes) + " bytes are possible");
+
+    switch (FlawOf(busName, objectPath, interface))
     {
-        const char* field;
-        const std::string& value;
-        bool (*isPossible)(const std::string&);
-        std::string wanted;
-    } rules[] = {
-        {"kind", subscription.kind, IsKind, KindWanted()},
-        {"key", subscription.key, IsKey, "1 to 255 bytes of UTF-8 without control characters are needed, such as 7 or all"},
-        {"bus name", subscriber.busname, [](const std::string& text) { return g_dbus_is_name(text.c_str()) != FALSE; },
-            "two or more elements joined by dots are needed, such as org.example.Client"},
-        {"object path", subscriber.objectpath,
-            [](const std::string& text) { return g_variant_is_object_path(text.c_str()) != FALSE; },
-            "elements of letters, digits and underscores, a slash before each, are needed, such as /org/example/Client"},
-        {"object path", subscriber.objectpath,
-            [](const std::string& text) { return g_str_has_prefix(text.c_str(), "/org/freedesktop/DBus/Local") == FALSE; },
-            "the bus reserves what begins like this and disconnects who calls it"},
-        {"interface", subscriber.interface, [](const std::string& text) { return g_dbus_is_interface_name(text.c_str()) != FALSE; },
-            "two or more elements joined by dots are needed, such as org.example.Client"},
-        {"interface", subscriber.interface,
-            [](const std::string& text) { return g_str_has_prefix(text.c_str(), "org.freedesktop.DBus.Local") == FALSE; },
-            "the bus reserves what begins like this and disconnects who calls it"},
-    };
-    for (const auto& rule : rules)
-    {
-        if (rule.value.find('\0') == std::string::npos && rule.isPossible(rule.value))
-            continue;
-        const g_autofree char* shown = g_strescape(rule.value.c_str(), nullptr);
-        return std::string(rule.field) + " \"" + shown + "\": " + rule.wanted;
+    case RecordFlaw::BusName:
+        return Refusal("bus name", busName, kName);
+    case RecordFlaw::ObjectPath:
+        return Refusal("object path", objectPath, kPath);
+    case RecordFlaw::Interface:
+        return Refusal("interface", interface, kName);
+    case RecordFlaw::ReservedPath:
+        return Refusal("object path", objectPath, kReserved);
+    case RecordFlaw::ReservedInterface:
+        return Refusal("interface", interface, kReserved);
+    case RecordFlaw::None:
+        break;
     }
     return {};
 }
@@ -152,7 +234,7 @@ std::vector<std::string> DASubscriberStore::Kinds()
 
 std::string DASubscriberStore::Path()
 {
-    const char* const chosen = std::getenv("KIV_SUBSCRIBERS");
+    const char* const chosen = secure_getenv("KIV_SUBSCRIBERS");
     if (chosen == nullptr || *chosen == '\0')
     {
         const g_autofree char* usual = g_build_filename(g_get_user_state_dir(), "kiv", "subscribers.db", nullptr);
@@ -171,28 +253,21 @@ Outcome DASubscriberStore::Add(const DASubscription& subscription, std::string& 
         reason = objection;
         return Outcome::Refused;
     }
-    return WithStore(StoreConnection::OpenOrMake, reason,
-        [&](StoreConnection* store) { return store->Add(subscription) ? Outcome::Done : Outcome::Unchanged; });
+    return Changing(StoreConnection::Use::Make, reason, [&](StoreConnection& store) { return store.Add(subscription); });
 }
 
 Outcome DASubscriberStore::Remove(const DASubscription& subscription, std::string& reason)
 {
-    return WithStore(StoreConnection::Open, reason,
-        [&](StoreConnection* store)
-        { return store != nullptr && store->Remove(subscription) ? Outcome::Done : Outcome::Unchanged; });
+    return Changing(StoreConnection::Use::Change, reason, [&](StoreConnection& store) { return store.Remove(subscription); });
 }
 
 Outcome DASubscriberStore::List(std::vector<DASubscription>& subscriptions, std::string& reason)
 {
-    return WithStore(StoreConnection::Open, reason,
-        [&](StoreConnection* store)
+    return Reading(reason,
+        [&](StoreConnection& store)
         {
-            if (store != nullptr)
-            {
-                std::vector<DASubscription> all = store->List();
-                std::move(all.begin(), all.end(), std::back_inserter(subscriptions));
-            }
-            return Outcome::Done;
+            std::vector<DASubscription> all = store.List();
+            std::move(all.begin(), all.end(), std::back_inserter(subscriptions));
         });
 }
 
@@ -200,11 +275,5 @@ Outcome DASubscriberStore::Find(const char* kind, const char* key, std::list<_Su
 {
     if (kind == nullptr || key == nullptr)
         return Outcome::Done;
-    return WithStore(StoreConnection::Open, reason,
-        [&](StoreConnection* store)
-        {
-            if (store != nullptr)
-                subscribers.splice(subscribers.end(), store->Find(kind, key));
-            return Outcome::Done;
-        });
+    return Reading(reason, [&](StoreConnection& store) { subscribers.splice(subscribers.end(), store.Find(kind, key)); });
 }

@@ -2,22 +2,30 @@
 
 #include <fcntl.h>
 #include <glib.h>
+#include <sys/file.h>
 #include <unistd.h>
 
 #include <cerrno>
+#include <fstream>
 #include <utility>
 
 namespace
 {
 
-constexpr int kSchemaVersion = 1;
+constexpr const char* kSchemaVersion = "1";
 constexpr int kPatienceMs = 5000; // with other processes that use the file
 
+constexpr const char* kPermit = "allow this user to read and write the file and its directory";
+constexpr const char* kTryAgain = "try again when no other process keeps it busy";
+constexpr const char* kNameAnother = "set KIV_SUBSCRIBERS to another file";
+
 constexpr const char* kSchema =
+    "BEGIN;"
     "CREATE TABLE subscription(id INTEGER PRIMARY KEY, kind TEXT NOT NULL, key TEXT NOT NULL, busname TEXT NOT NULL,"
     " objectpath TEXT NOT NULL, interface TEXT NOT NULL, UNIQUE(kind, key, busname, objectpath, interface));"
     "CREATE INDEX subscription_by_event ON subscription(kind, key, id);"
-    "PRAGMA user_version = 1;";
+    "PRAGMA user_version = 1;"
+    "COMMIT";
 
 // By that index a search reads the rows that it finds, in their order, and no others.
 constexpr const char* kFind = "SELECT busname, objectpath, interface FROM subscription INDEXED BY subscription_by_event"
@@ -39,117 +47,138 @@ _SubscriberInfo Subscriber(sqlite3_stmt* row, int column)
     return {Text(row, column), Text(row, column + 1), Text(row, column + 2)};
 }
 
-bool IsSameFile(const struct stat& one, const struct stat& other)
+/// What to do about a failure of SQLite's.
+const char* Advice(int code, int cause)
 {
-    return one.st_dev == other.st_dev && one.st_ino == other.st_ino;
+    if (code == SQLITE_CORRUPT || code == SQLITE_NOTADB)
+        return "the file is damaged: move it away and subscribe again";
+    if (code == SQLITE_BUSY)
+        return kTryAgain;
+    if (code == SQLITE_FULL || cause == ENOSPC)
+        return "make room on the disk";
+    if (code == SQLITE_READONLY || code == SQLITE_CANTOPEN)
+        return kPermit;
+    return "check the disk and its file system";
 }
 
-bool IsUnchanged(const struct stat& one, const struct stat& other)
+/// Whether a store is in the form of version 1.0.0, with nothing in its log.
+bool HasFoldedLog(const std::string& path)
 {
-    return one.st_size == other.st_size && one.st_mtim.tv_sec == other.st_mtim.tv_sec &&
-           one.st_mtim.tv_nsec == other.st_mtim.tv_nsec;
+    constexpr int kFormPosition = 18;
+    constexpr int kLogForm = 2;
+    std::ifstream file(path, std::ios::binary);
+    struct stat log;
+    return file.seekg(kFormPosition).get() == kLogForm && (stat((path + "-wal").c_str(), &log) != 0 || log.st_size == 0);
 }
 
-/// Makes an empty file, which is a database without tables. One that another process made meanwhile is as good.
+/// Makes an empty file, which is a database without tables, unless there is one. Called with the directory's lock held.
 void MakeFile(const std::string& path)
 {
-    const g_autofree char* directory = g_path_get_dirname(path.c_str());
-    if (g_mkdir_with_parents(directory, 0700) != 0)
-        throw StoreTrouble(std::string(directory) + ": the directory can not be made: " + g_strerror(errno));
-
-    const int file = open(path.c_str(), O_WRONLY | O_CREAT | O_EXCL | O_CLOEXEC, 0600);
+    const int file = open(path.c_str(), O_RDONLY | O_CREAT | O_EXCL | O_CLOEXEC, 0600);
     if (file >= 0)
         close(file);
     else if (errno != EEXIST)
-        throw StoreTrouble(path + ": the file can not be made: " + g_strerror(errno));
+        throw StoreTrouble(path, std::string("the file cannot be made: ") + g_strerror(errno), kPermit);
 }
 
 } // namespace
 
-std::unique_ptr<StoreConnection> StoreConnection::Open(const std::string& path)
+DirectoryLock::DirectoryLock(const std::string& path) : directory_(open(path.c_str(), O_RDONLY | O_DIRECTORY | O_CLOEXEC))
 {
-    std::unique_ptr<StoreConnection> connection = OpenFile(path);
-    return connection == nullptr || connection->IsBlank() ? nullptr : std::move(connection);
+    if (directory_ < 0)
+        throw StoreTrouble(path, g_strerror(errno), kPermit);
+    for (int waitedMs = 0; flock(directory_, LOCK_EX | LOCK_NB) != 0 && errno == EWOULDBLOCK; ++waitedMs)
+    {
+        if (waitedMs == kPatienceMs)
+        {
+            close(directory_);
+            throw StoreTrouble(path, "another process has locked the directory", kTryAgain);
+        }
+        g_usleep(1000);
+    }
 }
 
-std::unique_ptr<StoreConnection> StoreConnection::OpenOrMake(const std::string& path)
+DirectoryLock::~DirectoryLock()
 {
-    MakeFile(path);
-    std::unique_ptr<StoreConnection> connection = OpenFile(path);
-    if (connection == nullptr)
-        throw StoreTrouble(path + ": no file can be made behind this name");
-    if (connection->IsBlank())
-        connection->MakeSchema();
+    close(directory_);
+}
+
+std::unique_ptr<StoreConnection> StoreConnection::Open(const std::string& path, Use use)
+{
+    struct stat file;
+    if (use != Use::Make && stat(path.c_str(), &file) != 0 && errno == ENOENT)
+        return nullptr;
+    std::unique_ptr<StoreConnection> connection(new StoreConnection(path, use));
+    if (use == Use::Read && HasFoldedLog(path) && !connection->CanUseLog())
+        connection.reset(new StoreConnection(path, Use::ReadFrozen));
+    if (!connection->IsBlank())
+        return connection;
+    if (use != Use::Make)
+        return nullptr;
+    connection->Execute(kSchema);
     return connection;
 }
 
-std::unique_ptr<StoreConnection> StoreConnection::OpenFile(const std::string& path)
+StoreConnection::StoreConnection(std::string path, Use use) : path_(std::move(path))
 {
-    struct stat file; // taken before the file is opened: if it is replaced in between, Serves() tells
-    if (stat(path.c_str(), &file) == 0)
-        return std::unique_ptr<StoreConnection>(new StoreConnection(path, file));
-    if (errno == ENOENT)
-        return nullptr;
-    throw StoreTrouble(path + ": " + g_strerror(errno));
-}
+    const g_autofree char* directory = g_path_get_dirname(path_.c_str());
+    if (use == Use::Make && g_mkdir_with_parents(directory, 0700) != 0)
+        throw StoreTrouble(directory, std::string("the directory cannot be made: ") + g_strerror(errno), kPermit);
+    if (use == Use::Change || use == Use::Make)
+        lock_ = std::make_unique<DirectoryLock>(directory);
+    if (use == Use::Make)
+        MakeFile(path_);
 
-StoreConnection::StoreConnection(std::string path, const struct stat& file) : path_(std::move(path)), file_(file)
-{
-    if (!S_ISREG(file.st_mode))
-        throw StoreTrouble(path_ + ": not a regular file");
+    // Before the file is opened: if it is replaced in between, IsInPlace() and IsUpToDate() notice.
+    if (stat(path_.c_str(), &file_) != 0)
+        throw StoreTrouble(path_, g_strerror(errno), errno == EACCES ? kPermit : kNameAnother);
+    if (!S_ISREG(file_.st_mode))
+        throw StoreTrouble(path_, "not a regular file", kNameAnother);
 
     sqlite3* db = nullptr;
-    const int result = sqlite3_open_v2(path_.c_str(), &db, SQLITE_OPEN_READWRITE | SQLITE_OPEN_NOMUTEX, nullptr);
+    const int mode = use == Use::Change || use == Use::Make ? SQLITE_OPEN_READWRITE : SQLITE_OPEN_READONLY;
+    const g_autofree char* uri = g_filename_to_uri(path_.c_str(), nullptr, nullptr);
+    const std::string name = uri + std::string(use == Use::ReadFrozen ? "?immutable=1" : "");
+    const int result = sqlite3_open_v2(name.c_str(), &db, mode | SQLITE_OPEN_URI | SQLITE_OPEN_NOMUTEX, nullptr);
     db_.reset(db);
     if (result != SQLITE_OK)
         Fail();
     sqlite3_busy_timeout(db, kPatienceMs);
-    DropIndexOfAnother();
 }
 
-// SQLite finds the shared index of the write-ahead log by the name of the store. After another file took the store's place, the
-// index there is that of the former one as long as some process keeps it open, and would give wrong pages of the new one. While
-// nobody has this file open (the exclusive lock says so), whatever index is beside it is of no use.
-void StoreConnection::DropIndexOfAnother()
+/// Whether what is in the log can be found; that takes a file beside the store, which SQLite has to write.
+bool StoreConnection::CanUseLog()
 {
-    sqlite3_file* file = nullptr;
-    sqlite3_file_control(db_.get(), "main", SQLITE_FCNTL_FILE_POINTER, &file);
-    if (file->pMethods->xLock(file, SQLITE_LOCK_SHARED) != SQLITE_OK)
-        return;
-    if (file->pMethods->xLock(file, SQLITE_LOCK_EXCLUSIVE) == SQLITE_OK)
-        unlink((std::string(sqlite3_db_filename(db_.get(), "main")) + "-shm").c_str());
-    file->pMethods->xUnlock(file, SQLITE_LOCK_NONE);
+    return sqlite3_exec(db_.get(), "PRAGMA user_version", nullptr, nullptr, nullptr) == SQLITE_OK;
 }
 
-bool StoreConnection::Serves(const std::string& path) const
+bool StoreConnection::IsInPlace() const
 {
     struct stat file;
-    return path == path_ && stat(path.c_str(), &file) == 0 && IsSameFile(file, file_) && IsUnchanged(file, file_);
+    return stat(path_.c_str(), &file) == 0 && file.st_dev == file_.st_dev && file.st_ino == file_.st_ino;
+}
+
+bool StoreConnection::IsUpToDate(const std::string& path) const
+{
+    struct stat file;
+    return stat(path.c_str(), &file) == 0 && file.st_dev == file_.st_dev && file.st_ino == file_.st_ino &&
+           file.st_ctim.tv_sec == file_.st_ctim.tv_sec && file.st_ctim.tv_nsec == file_.st_ctim.tv_nsec;
 }
 
 /// Whether the store is still to be made. Tables and version come into being together, so in this order the two questions are
 /// safe against a process that makes them right now.
 bool StoreConnection::IsBlank()
 {
-    const bool isEmpty = Number("SELECT count(*) FROM sqlite_schema") == 0;
-    const int version = Number("PRAGMA user_version");
-    if (version != kSchemaVersion && !(isEmpty && version == 0))
-        throw StoreTrouble(path_ + ": schema version " + std::to_string(version) + " instead of " + std::to_string(kSchemaVersion) +
-                           "; the file is left as it is");
+    const bool isEmpty = Value("SELECT count(*) FROM sqlite_schema") == "0";
+    const std::string version = Value("PRAGMA user_version");
+    hasLog_ = Value("PRAGMA journal_mode") == "wal";
+    if (version != kSchemaVersion && !(isEmpty && version == "0"))
+        throw StoreTrouble(path_, "schema version " + version + " instead of " + kSchemaVersion, kNameAnother);
     return version != kSchemaVersion;
-}
-
-void StoreConnection::MakeSchema()
-{
-    Execute("BEGIN IMMEDIATE");
-    if (IsBlank()) // else another process made it while this one waited
-        Execute(kSchema);
-    Execute("COMMIT");
 }
 
 bool StoreConnection::Add(const DASubscription& subscription)
 {
-    sqlite3_exec(db_.get(), "PRAGMA journal_mode = WAL", nullptr, nullptr, nullptr); // if not now, then by a later Add
     return Change(kAdd, subscription);
 }
 
@@ -160,27 +189,17 @@ bool StoreConnection::Remove(const DASubscription& subscription)
 
 bool StoreConnection::Change(const char* sql, const DASubscription& subscription)
 {
+    // Folds a log of version 1.0.0 into the file. If a process of that version has it open, a later change will; readers of this
+    // version close it soon, but SQLite itself does not wait for them here.
+    const auto fold = [this] { return sqlite3_exec(db_.get(), "PRAGMA journal_mode = DELETE", nullptr, nullptr, nullptr); };
+    for (int tries = 0; fold() == SQLITE_BUSY && tries < 300; ++tries)
+        g_usleep(1000);
+
     const _SubscriberInfo& subscriber = subscription.subscriber;
     const Statement statement = Prepare(sql);
     Run(statement.get(), {subscription.kind, subscription.key, subscriber.busname, subscriber.objectpath, subscriber.interface},
         [](sqlite3_stmt*) {});
-    if (sqlite3_changes(db_.get()) == 0)
-        return false;
-
-    FoldLog();
-    struct stat file;
-    if (stat(path_.c_str(), &file) == 0 && IsSameFile(file, file_))
-        file_ = file;
-    return true;
-}
-
-// Between changes the store is whole in its one file, so that who replaces that file replaces the store. A log that another
-// process is reading stays for the next change to fold.
-void StoreConnection::FoldLog()
-{
-    sqlite3_busy_timeout(db_.get(), 0);
-    sqlite3_wal_checkpoint_v2(db_.get(), "main", SQLITE_CHECKPOINT_TRUNCATE, nullptr, nullptr);
-    sqlite3_busy_timeout(db_.get(), kPatienceMs);
+    return sqlite3_changes(db_.get()) != 0;
 }
 
 std::vector<DASubscription> StoreConnection::List()
@@ -208,12 +227,12 @@ StoreConnection::Statement StoreConnection::Prepare(const char* sql)
     return Statement(statement);
 }
 
-int StoreConnection::Number(const char* sql)
+std::string StoreConnection::Value(const char* sql)
 {
-    int number = 0;
+    std::string value;
     const Statement statement = Prepare(sql);
-    Run(statement.get(), {}, [&](sqlite3_stmt* row) { number = sqlite3_column_int(row, 0); });
-    return number;
+    Run(statement.get(), {}, [&](sqlite3_stmt* row) { value = Text(row, 0); });
+    return value;
 }
 
 void StoreConnection::Execute(const char* sql)
@@ -251,8 +270,12 @@ void StoreConnection::Run(sqlite3_stmt* statement, std::initializer_list<std::st
 
 void StoreConnection::Fail() const
 {
-    std::string reason = path_ + ": " + sqlite3_errmsg(db_.get());
-    if (const int cause = sqlite3_system_errno(db_.get()); cause != 0 && sqlite3_errcode(db_.get()) == SQLITE_CANTOPEN)
-        reason.append(" (").append(g_strerror(cause)).append(")");
-    throw StoreTrouble(reason);
+    const int code = sqlite3_errcode(db_.get());
+    const int cause = sqlite3_system_errno(db_.get());
+    if (sqlite3_extended_errcode(db_.get()) == SQLITE_READONLY_ROLLBACK)
+        throw JournalTrouble(path_, "a change was interrupted and has to be undone first", kPermit);
+    std::string trouble = sqlite3_errmsg(db_.get());
+    if (cause != 0 && (code == SQLITE_CANTOPEN || code == SQLITE_IOERR))
+        trouble.append(" (").append(g_strerror(cause)).append(")");
+    throw StoreTrouble(path_, trouble, Advice(code, cause));
 }

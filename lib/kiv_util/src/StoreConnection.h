@@ -14,25 +14,63 @@
 #include <string_view>
 #include <vector>
 
-/// The store can not be used; what() names file and trouble.
+/// The store cannot be used; what() is "FILE: TROUBLE; ADVICE".
 struct StoreTrouble : std::runtime_error
 {
-    using std::runtime_error::runtime_error;
+    StoreTrouble(const std::string& file, const std::string& trouble, const std::string& advice)
+        : std::runtime_error(file + ": " + trouble + "; " + advice)
+    {
+    }
 };
 
-/// An open subscriber store. One thread at a time; not to be carried across a fork. Every operation throws StoreTrouble where the
-/// file does not serve, and the connection is of no more use then.
+/// The store has the journal of a change that was interrupted, or that is under way in a file which had its name before.
+struct JournalTrouble : StoreTrouble
+{
+    using StoreTrouble::StoreTrouble;
+};
+
+/// The lock of processes that change a store, on the directory that the store is in. Waits for it a few seconds.
+class DirectoryLock
+{
+public:
+    explicit DirectoryLock(const std::string& path);
+    DirectoryLock(const DirectoryLock&) = delete;
+    DirectoryLock& operator=(const DirectoryLock&) = delete;
+    ~DirectoryLock();
+
+private:
+    int directory_;
+};
+
+/// An open subscriber store. One thread at a time; not to be carried across a fork. Every operation throws StoreTrouble when the
+/// file cannot be used, and the connection is of no more use then.
+///
+/// SQLite finds the journal of a change by the name of the store, and a journal that nobody holds is played back into the file that
+/// has that name, even if another process writes it for a file that had the name before. So only connections that can change the
+/// store play a journal back, and the directory's lock lets one of them be open at a time.
 class StoreConnection
 {
 public:
-    /// Opens the store at an absolute path; null when none was made there yet.
-    static std::unique_ptr<StoreConnection> Open(const std::string& path);
+    enum class Use
+    {
+        Read,       ///< JournalTrouble where there is a journal
+        ReadFrozen, ///< what the file itself holds, whatever is beside it
+        Change,     ///< holds the directory's lock, and plays a journal back
+        Make        ///< likewise; makes the store first if there is none
+    };
 
-    /// Opens the store at an absolute path, which it makes first where there is none.
-    static std::unique_ptr<StoreConnection> OpenOrMake(const std::string& path);
+    /// Opens the store at an absolute path; null if none was made there.
+    static std::unique_ptr<StoreConnection> Open(const std::string& path, Use use);
 
-    /// Whether this is the path that was opened and the file that stands there is the one that was read last.
-    bool Serves(const std::string& path) const;
+    /// Whether the file at its path is the one that was opened.
+    bool IsInPlace() const;
+
+    /// Whether this is the file at that path, and nobody has written to it since it was opened. SQLite notices what other
+    /// connections write, but not another store that was copied into the file.
+    bool IsUpToDate(const std::string& path) const;
+
+    /// Whether it has a write-ahead log, as version 1.0.0 made it; nobody can convert such a store while it is open.
+    bool HasLog() const { return hasLog_; }
 
     /// Whether the subscription is new.
     bool Add(const DASubscription& subscription);
@@ -52,17 +90,13 @@ private:
     using Database = std::unique_ptr<sqlite3, Close>;
     using Statement = std::unique_ptr<sqlite3_stmt, Close>;
 
-    StoreConnection(std::string path, const struct stat& file);
-    static std::unique_ptr<StoreConnection> OpenFile(const std::string& path);
-
-    void DropIndexOfAnother();
+    StoreConnection(std::string path, Use use);
+    bool CanUseLog();
     bool IsBlank();
-    void MakeSchema();
     bool Change(const char* sql, const DASubscription& subscription);
-    void FoldLog();
 
     Statement Prepare(const char* sql);
-    int Number(const char* sql);
+    std::string Value(const char* sql);
     void Execute(const char* sql);
     template <typename Row>
     void Run(sqlite3_stmt* statement, std::initializer_list<std::string_view> values, Row&& row);
@@ -70,6 +104,8 @@ private:
 
     std::string path_;
     struct stat file_;
+    bool hasLog_ = false;
+    std::unique_ptr<DirectoryLock> lock_; // held until the database is closed
     Database db_;
     Statement find_; // kept, since a search goes before every notification
 };
