@@ -231,6 +231,29 @@ TEST_F(KivctlTest, ServicesHoldTheirNamesAndSubscriptionsUntilTheyEnd)
     EXPECT_EQ(1, service.End());
 }
 
+TEST_F(KivctlTest, SubscribesByTheServiceAsItDoesInTheFile)
+{
+    Service service("env KIV_SUBSCRIBERS=" + directory + "/served.db " KIV_SUBSCRIPTION_SERVICE);
+    const std::string file = "env KIV_SUBSCRIBERS=served.db " KIVCTL " subscribers list";
+    {
+        Service client(KIVCTL " subscribe --name a.b --kind auth");
+        EXPECT_EQ("", Kivctl("subscribers list").out);
+        EXPECT_THAT(Outcome(file).out, HasSubstr("a.b"));
+        EXPECT_EQ(0, client.End(SIGINT));
+        EXPECT_EQ("", Outcome(file).out);
+    }
+    const auto compare = [](const std::string& command, int exit)
+    {
+        const Outcome byService = Kivctl(command), inFile = Kivctl(command + " --store served.db");
+        EXPECT_EQ(exit, byService.exit) << command;
+        EXPECT_EQ(exit, inFile.exit) << command;
+        EXPECT_EQ(inFile.err, byService.err);
+    };
+    compare("subscribe --push '' --name a.b", 4);
+    std::ofstream("served.db") << std::string(4096, 'x');
+    compare("subscribe --push a --name a.b", 6);
+}
+
 TEST_F(KivctlTest, TellsAMissingBusFromABrokenStore)
 {
     std::ofstream("subscribers.db") << std::string(4096, 'x');

@@ -207,6 +207,7 @@ void AddSubscribe(CLI::App& app, Command& command)
     verb->add_option("--key", options->key, "Service of policy and status (a number) and of push (a name)")->type_name("SERVICE");
     verb->add_option("--push", options->pushes, "The same as --kind push --key SERVICE")->type_name("SERVICE");
     verb->add_option("--name", options->name, "Bus name to own; the connection's unique name without it")->type_name("BUS_NAME");
+    verb->add_option("--store", options->store, "Subscribe in this file, not by the subscription service")->type_name("FILE");
 }
 
 void AddSubscribers(CLI::App& app, Command& command)

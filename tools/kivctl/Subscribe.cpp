@@ -5,17 +5,23 @@
 #include <BusInterfaces.h>
 #include <BusParty.h>
 #include <StopSignals.h>
+#include <SubscriptionService.h>
 
 #include <utility>
 
 namespace
 {
 
-/// Subscriptions that are taken back when the client service ends.
+using Outcome = DASubscriberStore::Outcome;
+
+/// Subscriptions that are taken back when the client service ends. They are made by the subscription service where it answers or
+/// can be started, else in the store's file.
 class Subscriptions
 {
 public:
-    Subscriptions() = default;
+    /// @param party    who subscribes; outlives the subscriptions
+    /// @param useFile  leave the subscription service alone
+    Subscriptions(const kiv::BusParty& party, bool useFile) : party_(party), isServed_(!useFile && IsServiceThere()) {}
     Subscriptions(const Subscriptions&) = delete;
     Subscriptions& operator=(const Subscriptions&) = delete;
 
@@ -24,7 +30,8 @@ public:
         std::string reason;
         for (const DASubscription& subscription : made_)
         {
-            if (store_.Remove(subscription, reason) == DASubscriberStore::Outcome::Failed)
+            const Outcome outcome = isServed_ ? Call("Unsubscribe", subscription, reason) : store_.Remove(subscription, reason);
+            if (outcome == Outcome::Failed || outcome == Outcome::Refused)
                 Note("could not take the subscription back: " + reason);
         }
     }
@@ -32,11 +39,39 @@ public:
     void Make(DASubscription subscription)
     {
         std::string reason;
-        RequireStored(store_.Add(subscription, reason), reason);
+        RequireStored(isServed_ ? Call("Subscribe", subscription, reason) : store_.Add(subscription, reason), reason);
         made_.push_back(std::move(subscription));
     }
 
 private:
+    bool IsServiceThere() const
+    {
+        const char* const name = kiv::SubscriptionService::kBusName;
+        return party_.CallBus("GetNameOwner", g_variant_new("(s)", name), "(s)") != nullptr ||
+               party_.CallBus("StartServiceByName", g_variant_new("(su)", name, 0U), "(u)") != nullptr;
+    }
+
+    Outcome Call(const char* method, const DASubscription& subscription, std::string& reason)
+    {
+        const _SubscriberInfo& who = subscription.subscriber;
+        g_autoptr(GError) error = nullptr;
+        g_autoptr(GVariant) reply = g_dbus_connection_call_sync(party_.Connection(), kiv::SubscriptionService::kBusName,
+            "/org/kiv/Subscriptions", "org.kiv.Subscriptions1", method,
+            g_variant_new("(sssos)", subscription.kind.c_str(), subscription.key.c_str(), who.busname.c_str(),
+                who.objectpath.c_str(), who.interface.c_str()),
+            G_VARIANT_TYPE("(b)"), G_DBUS_CALL_FLAGS_NONE, -1, nullptr, &error);
+        if (reply != nullptr)
+            return Outcome::Done;
+        const bool isRefused = g_error_matches(error, G_DBUS_ERROR, G_DBUS_ERROR_INVALID_ARGS) ||
+                               g_error_matches(error, G_DBUS_ERROR, G_DBUS_ERROR_ACCESS_DENIED) ||
+                               g_error_matches(error, G_DBUS_ERROR, G_DBUS_ERROR_LIMITS_EXCEEDED);
+        g_dbus_error_strip_remote_error(error);
+        reason = error->message;
+        return isRefused ? Outcome::Refused : Outcome::Failed;
+    }
+
+    const kiv::BusParty& party_;
+    const bool isServed_;
     DASubscriberStore store_;
     std::vector<DASubscription> made_;
 };
@@ -78,7 +113,9 @@ Exit Subscribe(const SubscribeOptions& options, const Command& command)
     if (!options.name.empty())
         party.OwnName(options.name);
 
-    Subscriptions subscriptions;
+    if (!options.store.empty())
+        g_setenv("KIV_SUBSCRIBERS", options.store.c_str(), TRUE);
+    Subscriptions subscriptions(party, !options.store.empty());
     std::vector<std::string> subscribed;
     for (const auto& [kind, key] : wanted)
     {

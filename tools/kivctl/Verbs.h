@@ -110,7 +110,8 @@ struct SubscribeOptions
     std::vector<std::string> kinds; ///< of DASubscriberStore::Kinds()
     std::string key;
     std::vector<std::string> pushes;
-    std::string name; ///< empty for the connection's unique name alone
+    std::string name;  ///< empty for the connection's unique name alone
+    std::string store; ///< empty for the subscription service, or else the usual file
 };
 Exit Subscribe(const SubscribeOptions& options, const Command& command);
 /// @}
