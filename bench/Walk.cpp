@@ -16,7 +16,7 @@ void CompareWalk(Table& table, const PrivateSystemBus& bus, const Walk& walk)
         walk.bare();
     };
     Subscribe(walk.kind, walk.subscribers);
-    Compare(table, {walk.name + " to " + key + ", a subscriber, against a store lookup and bare", walk.goal, work,
+    Compare(table, {walk.name + " to " + key + ", per subscriber, against store and bare", walk.goal, work,
                        static_cast<double>(walk.subscribers), {walk.library, Drain}, {findAndBare, Drain}, kRoundSeconds, walk.name,
                        walk.subscribers});
     Drain();

@@ -79,6 +79,7 @@ TEST_F(ConnectionTrouble, IsATimeOutOnlyWhenTheMessageSaysTime)
 
 TEST_F(ConnectionTrouble, IsPassedByWhenTheSharedOneIsDeadOrFails)
 {
+    store.records = {{"org.example.Nobody", "/", "a.b"}};
     const Connection dead = bus.Connect();
     g_dbus_connection_close_sync(dead.get(), nullptr, nullptr);
     gio.refusal = "The connection is closed"; // as GDBus repeats it for a connection whose making failed
@@ -93,8 +94,16 @@ TEST_F(ConnectionTrouble, IsPassedByWhenTheSharedOneIsDeadOrFails)
         EXPECT_NE(nullptr, g_dbus_connection_get_unique_name(taken.get()));
         EXPECT_EQ(77, error) << "which is left alone";
         EXPECT_THAT(log.TakeErrors(), testing::IsEmpty());
+        EXPECT_EQ(0, manager.SendActivatedNotification(imsi, 1));
+        EXPECT_THAT(log.TakeErrors(), testing::Contains(testing::EndsWith("Unable to create proxy: no reason given")))
+            << "and nothing of the shared connection";
         gio.refusal = nullptr;
     }
+    bus.Stop();
+    int error = 0;
+    EXPECT_EQ(nullptr, manager.InitDbusConnection(&error));
+    EXPECT_EQ(1, error);
+    EXPECT_THAT(log.TakeErrors(), testing::Contains(testing::HasSubstr("g_bus_get_sync() failed:[")));
 }
 
 TEST_F(ConnectionTrouble, DoesNotEndTheProcessWhoeverMadeTheConnection)

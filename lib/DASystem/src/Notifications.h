@@ -39,24 +39,24 @@ enum class Body
 struct NotificationType
 {
     _KIV_NOTI_TYPE_E type;
-    const Notification& event;
     Body body;
+    const Notification& event;
+    int (DADBusManager::*sendFlag)(char*, int); ///< the member that sends a Body::Flag to subscribers
     int flag;                                   ///< of Body::Flag
-    int (DADBusManager::*sendFlag)(char*, int); ///< the member that sends it to subscribers
     char status[4];                             ///< of Body::Status
 };
 
 // clang-format off
 inline constexpr NotificationType kNotificationTypes[] = {
-    // type                        event           body        flag  sendFlag                                  status
-    {KIV_NOTI_TYPE_AUTH_SUCCESS,   kAuth,          Body::Flag,   1, &DADBusManager::SendAuthNotification,      ""},
-    {KIV_NOTI_TYPE_AUTH_FAIL,      kAuth,          Body::Flag,   0, &DADBusManager::SendAuthNotification,      ""},
-    {KIV_NOTI_TYPE_STATUS_ON,      kStatus,        Body::Status, 0, nullptr,                                   "on"},
-    {KIV_NOTI_TYPE_STATUS_OFF,     kStatus,        Body::Status, 0, nullptr,                                   "off"},
-    {KIV_NOTI_TYPE_POLICY,         kPolicy,        Body::Policy, 0, nullptr,                                   ""},
-    {KIV_NOTI_TYPE_ACTIVATED,      kActivated,     Body::Flag,   1, &DADBusManager::SendActivatedNotification, ""},
-    {KIV_NOTI_TYPE_DEACTIVATED,    kActivated,     Body::Flag,   0, &DADBusManager::SendActivatedNotification, ""},
-    {KIV_NOTI_TYPE_NUMBER_CHANGED, kNumberChanged, Body::Number, 0, nullptr,                                   ""},
+    // type                        body          event           sendFlag                                 flag  status
+    {KIV_NOTI_TYPE_AUTH_SUCCESS,   Body::Flag,   kAuth,          &DADBusManager::SendAuthNotification,      1, ""},
+    {KIV_NOTI_TYPE_AUTH_FAIL,      Body::Flag,   kAuth,          &DADBusManager::SendAuthNotification,      0, ""},
+    {KIV_NOTI_TYPE_STATUS_ON,      Body::Status, kStatus,        nullptr,                                   0, "on"},
+    {KIV_NOTI_TYPE_STATUS_OFF,     Body::Status, kStatus,        nullptr,                                   0, "off"},
+    {KIV_NOTI_TYPE_POLICY,         Body::Policy, kPolicy,        nullptr,                                   0, ""},
+    {KIV_NOTI_TYPE_ACTIVATED,      Body::Flag,   kActivated,     &DADBusManager::SendActivatedNotification, 1, ""},
+    {KIV_NOTI_TYPE_DEACTIVATED,    Body::Flag,   kActivated,     &DADBusManager::SendActivatedNotification, 0, ""},
+    {KIV_NOTI_TYPE_NUMBER_CHANGED, Body::Number, kNumberChanged, nullptr,                                   0, ""},
 };
 // clang-format on
 

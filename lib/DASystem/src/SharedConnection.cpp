@@ -60,27 +60,27 @@ char* BusAddress()
 void EndRequest(GTask* task, GDBusConnection* connection, GError* error)
 {
     if (connection == nullptr)
-        return g_task_return_error(task, error);
-    g_clear_error(&error);
-    g_task_return_pointer(task, connection, g_object_unref);
+        g_task_return_error(task, error);
+    else
+        g_task_return_pointer(task, connection, g_object_unref);
 }
 
 void OwnMade(GObject*, GAsyncResult* result, gpointer data)
 {
     g_autoptr(GTask) task = G_TASK(data);
-    GError* error = static_cast<GError*>(g_task_get_task_data(task));
-    GDBusConnection* const own = g_dbus_connection_new_for_address_finish(result, error == nullptr ? &error : nullptr);
+    GError* error = nullptr;
+    GDBusConnection* const own = g_dbus_connection_new_for_address_finish(result, &error);
     EndRequest(task, own, error);
 }
 
 void SharedTaken(GObject*, GAsyncResult* result, gpointer data)
 {
     g_autoptr(GTask) task = G_TASK(data);
-    GError* error = nullptr;
+    g_autoptr(GError) error = nullptr;
     g_autoptr(GDBusConnection) shared = g_bus_get_finish(result, &error);
     if (IsSettled(shared, error))
-        return EndRequest(task, static_cast<GDBusConnection*>(g_steal_pointer(&shared)), error);
-    g_task_set_task_data(task, error, nullptr);
+        return EndRequest(
+            task, static_cast<GDBusConnection*>(g_steal_pointer(&shared)), static_cast<GError*>(g_steal_pointer(&error)));
     g_autofree char* address = BusAddress();
     g_dbus_connection_new_for_address(address, kBusClient, nullptr, nullptr, OwnMade, g_steal_pointer(&task));
 }

@@ -12,7 +12,7 @@ namespace kiv
 {
 
 /// Takes a connection that is alive: the shared one, or where that is dead, one for the caller alone.
-/// @param error  receives why there is none: what the shared connection says of itself comes first; null before
+/// @param error  null before; receives why there is none, from the shared connection if that failed
 /// @return a new reference, or null
 ///
 /// - Once taken, no connection ends the process when it ends, whoever made it.
@@ -28,7 +28,8 @@ GDBusConnection* TakeConnection(GError** error);
 void RequestConnection(GAsyncReadyCallback callback, gpointer data);
 
 /// The outcome of a request, once each; after it, the callback sees what was written before the request.
-/// @return as TakeConnection()
+/// @param error  receives why there is none, from the last try
+/// @return a new reference, or null
 GDBusConnection* FinishConnection(GAsyncResult* result, GError** error);
 
 /// A main context for the proxies of one scope, in which it is the thread's default: what they leave behind ends with it, and the
