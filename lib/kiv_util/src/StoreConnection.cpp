@@ -192,7 +192,7 @@ bool StoreConnection::Change(const char* sql, const DASubscription& subscription
     // Folds a log of version 1.0.0 into the file. If a process of that version has it open, a later change will; readers of this
     // version close it soon, but SQLite itself does not wait for them here.
     const auto fold = [this] { return sqlite3_exec(db_.get(), "PRAGMA journal_mode = DELETE", nullptr, nullptr, nullptr); };
-    for (int tries = 0; fold() == SQLITE_BUSY && tries < 300; ++tries)
+    for (int tries = 0; fold() == SQLITE_BUSY && tries < kPatienceMs; ++tries)
         g_usleep(1000);
 
     const _SubscriberInfo& subscriber = subscription.subscriber;
