@@ -1,7 +1,7 @@
 /// @file
 /// What the simulated device does with the lines of the platform log. Nothing unless somebody asks: tests keep them, tools
 /// listen to them, and the environment variable KIV_LOG prints them to standard error, "error" those of error priority and up,
-/// "info" those of information priority and up.
+/// "info" those of information priority and up; "journal" sends all of them to the system log instead.
 #ifndef KIV_DEVICE_LOGCONTROL_H
 #define KIV_DEVICE_LOGCONTROL_H
 

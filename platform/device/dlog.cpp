@@ -4,7 +4,9 @@
 #include "LogControl.h"
 
 #include <glib.h>
+#include <syslog.h>
 
+#include <algorithm>
 #include <atomic>
 #include <cstdarg>
 #include <cstdio>
@@ -28,6 +30,7 @@ struct Log
 {
     std::mutex mutex;
     int printedFrom = kNobody;
+    bool goesToJournal = false; // instead of standard error
     bool keeping = false;
     std::vector<LogLine> kept;
     std::shared_ptr<const Sink> sink;
@@ -39,6 +42,9 @@ struct Log
             printedFrom = DLOG_ERROR;
         else if (g_strcmp0(wish, "info") == 0)
             printedFrom = DLOG_INFO;
+        else if (g_strcmp0(wish, "journal") == 0)
+            printedFrom = DLOG_VERBOSE;
+        goesToJournal = printedFrom == DLOG_VERBOSE;
         Settle();
     }
 
@@ -63,21 +69,29 @@ void Print(const LogLine& line)
     fputs(whole.c_str(), stderr);
 }
 
+void SendToJournal(const LogLine& line)
+{
+    constexpr int kPriorities[] = {LOG_DEBUG, LOG_DEBUG, LOG_INFO, LOG_WARNING, LOG_ERR, LOG_CRIT}; // from DLOG_VERBOSE on
+    const int level = std::clamp<int>(line.priority, DLOG_VERBOSE, DLOG_FATAL) - DLOG_VERBOSE;
+    syslog(LOG_USER | kPriorities[level], "%s: %s", line.tag.c_str(), line.text.c_str());
+}
+
 void Distribute(const LogLine& line)
 {
     std::shared_ptr<const Sink> sink;
-    bool printed = false;
+    void (*print)(const LogLine&) = nullptr;
     {
         const kiv::platform::Locked log(TheLog());
         if (log->keeping)
             log->kept.push_back(line);
         sink = log->sink;
-        printed = line.priority >= log->printedFrom;
+        if (line.priority >= log->printedFrom)
+            print = log->goesToJournal ? SendToJournal : Print;
     }
     if (sink)
         (*sink)(line);
-    if (printed)
-        Print(line);
+    if (print != nullptr)
+        print(line);
 }
 
 } // namespace
