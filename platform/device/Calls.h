@@ -45,8 +45,8 @@ int AnswerForSlot(Call call, HandleKind kind, const void* handle, Work work) noe
             const OpenHandle* const open = state.handles.Find(kind, handle, call);
             if (open == nullptr)
                 return -EINVAL;
-            const auto slot = static_cast<std::size_t>(open->slot);
-            return slot < state.device.slots.size() ? work(state.device.slots[slot]) : -ENODEV;
+            SimSlot* const slot = state.Find(open->slot, open->subject);
+            return slot != nullptr ? work(*slot) : -ENODEV;
         });
 }
 

@@ -49,7 +49,7 @@ struct Device
     Text tizenId, platformName, platformVersion, modelName, salesCode, serial;
     std::optional<std::int64_t> currentTime; ///< seconds since 1970; without one it is the host's clock
     Text deviceName, language;
-    int fontSize = 1;
+    std::optional<int> fontSize = 1;
     bool mobileData = true;
     bool flightMode = false, packetData = true, dataRoaming = false;
     int wifiStatus = 0; ///< runtime_info_wifi_status_e
@@ -58,6 +58,8 @@ struct Device
     std::uint32_t blockSize = 4096;
     std::uint64_t blocksAvailable = 0;
     std::map<std::string, std::string> packages; ///< version by package ID
+
+    std::map<std::string, std::string> reasons; ///< why a value is missing, by "GROUP.KEY" as in a device file, where that is known
 };
 
 /// The device as it is. Before anything was set, it is what the environment variable KIV_PROFILE names, a profile or a device
@@ -72,6 +74,10 @@ void SetDevice(const Device& device);
 /// As SetDevice(), with what `change` makes of the device as it is; a device that follows a file goes on following it. `change`
 /// calls nothing of the platform or of this control.
 void ChangeDevice(const std::function<void(Device&)>& change);
+
+/// Why the device has no such value, or cannot know it better: one of its `reasons`; empty where none is known.
+/// @param key  "GROUP.KEY" as in a device file
+std::string ReasonFor(const std::string& key);
 
 /// What is wrong with the profile or file that KIV_PROFILE names; empty when nothing is.
 std::string DeviceTrouble();

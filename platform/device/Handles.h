@@ -39,7 +39,7 @@ struct OpenHandle
     HandleKind kind;
     int slot;
     Opening opening;
-    std::string package;           ///< of a package handle
+    std::string subject;           ///< package of a package handle, CP name of the modem that belongs to one of a slot
     std::vector<telephony_h> list; ///< of a handle list
 };
 

@@ -57,6 +57,18 @@ public:
     /// Waits until no callback of the topic runs on another thread; not within a callback, which could wait for itself.
     void AwaitEnd(Topic topic);
 
+    /// @name Around fork()
+    /// @{
+    void HoldStill() { mutex_.lock(); }
+    void GoOn() { mutex_.unlock(); }
+    /// In the child, where no callback runs on another thread.
+    void GoOnAlone()
+    {
+        running_ = {};
+        mutex_.unlock();
+    }
+    /// @}
+
     /// Whether this thread is within a callback.
     static bool IsDelivering();
 

@@ -6,6 +6,7 @@
 #include "DeviceControl.h"
 
 #include <memory>
+#include <string>
 
 namespace kiv::platform
 {
@@ -22,6 +23,14 @@ public:
     /// Starts or ends its work, as it is in use and there are registrations. Called after either may have changed, with no lock
     /// held. Ended, its thread is gone, except that a callback does not wait for it.
     virtual void Settle() noexcept {}
+
+    /// @name What it looks up when a call asks for it, if anything; the state is locked, and the device is that of the state
+    /// @{
+    virtual void Refresh(Device& /*device*/, Text Device::* /*text*/) {}
+    virtual void RefreshStorage(Device& /*device*/) {}
+    /// @return whether the platform has packages at all
+    virtual bool RefreshPackage(Device& /*device*/, const std::string& /*id*/) { return true; }
+    /// @}
 };
 
 /// A device, and what keeps it current; null when nothing does.

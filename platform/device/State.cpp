@@ -4,6 +4,7 @@
 #include "Locked.h"
 
 #include <algorithm>
+#include <pthread.h>
 #include <utility>
 
 namespace kiv::platform
@@ -31,7 +32,27 @@ void Apply(Make change)
 
 State& TheState()
 {
-    static State* const state = new State;
+    // A child of fork() has no thread but the one that called it: what others had locked at that moment stays locked for good.
+    static State* const state = []
+    {
+        pthread_atfork(
+            []
+            {
+                TheState().mutex.lock();
+                TheState().notifier.HoldStill();
+            },
+            []
+            {
+                TheState().notifier.GoOn();
+                TheState().mutex.unlock();
+            },
+            []
+            {
+                TheState().notifier.GoOnAlone();
+                TheState().mutex.unlock();
+            });
+        return new State;
+    }();
     return *state;
 }
 
@@ -68,6 +89,14 @@ int State::SlotOf(const char* cpName) const
     const auto found =
         std::find_if(device.slots.begin(), device.slots.end(), [cpName](const SimSlot& sim) { return sim.cpName == cpName; });
     return found == device.slots.end() ? kNoSlot : static_cast<int>(found - device.slots.begin());
+}
+
+SimSlot* State::Find(int slot, const std::string& cpName)
+{
+    auto index = static_cast<std::size_t>(slot);
+    if (index >= device.slots.size() || device.slots[index].cpName != cpName)
+        index = static_cast<std::size_t>(SlotOf(cpName.c_str()));
+    return index < device.slots.size() ? &device.slots[index] : nullptr;
 }
 
 void SettleSource() noexcept
@@ -109,6 +138,13 @@ void ChangeDevice(const std::function<void(Device&)>& change)
             change(next);
             return state.Replace(std::move(next));
         });
+}
+
+std::string ReasonFor(const std::string& key)
+{
+    const Locked state(TheState());
+    const auto found = state->device.reasons.find(key);
+    return found == state->device.reasons.end() ? "" : found->second;
 }
 
 std::string DeviceTrouble()

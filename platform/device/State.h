@@ -33,8 +33,19 @@ struct State
     /// Puts a device in place; the changes are then to be delivered with the lock released.
     Changes Replace(Device next);
 
+    /// A text of the device, as it is now.
+    const Text& Current(Text Device::*text)
+    {
+        if (source != nullptr)
+            source->Refresh(device, text);
+        return device.*text;
+    }
+
     /// The slot whose modem has the name, or kNoSlot.
     int SlotOf(const char* cpName) const;
+
+    /// The slot that a handle was opened for, wherever its modem is now; null when that is gone.
+    SimSlot* Find(int slot, const std::string& cpName);
 
 private:
     friend void ResetDevice();

@@ -4,6 +4,23 @@
 
 using namespace kiv::platform;
 
+namespace
+{
+
+// The version of a package, or the code of its absence.
+int FindPackage(State& state, const std::string& id, const std::string*& version)
+{
+    if (state.source != nullptr && !state.source->RefreshPackage(state.device, id))
+        return -ENOTSUP;
+    const auto found = state.device.packages.find(id);
+    if (found == state.device.packages.end())
+        return static_cast<int>(PACKAGE_MANAGER_ERROR_NO_SUCH_PACKAGE);
+    version = &found->second;
+    return PACKAGE_MANAGER_ERROR_NONE;
+}
+
+} // namespace
+
 PLATFORM_API int package_manager_get_package_size_info(
     const char* package_id, package_manager_size_info_receive_cb callback, void* /*user_data*/)
 {
@@ -14,8 +31,8 @@ PLATFORM_API int package_manager_get_package_size_info(
                 return -EINVAL;
             if (callback) // packages have no sizes here
                 return -ENOTSUP;
-            return static_cast<int>(
-                state.device.packages.count(package_id) != 0 ? PACKAGE_MANAGER_ERROR_NONE : PACKAGE_MANAGER_ERROR_NO_SUCH_PACKAGE);
+            const std::string* version = nullptr;
+            return FindPackage(state, package_id, version);
         });
 }
 
@@ -27,8 +44,9 @@ PLATFORM_API int package_info_create(const char* package_id, package_info_h* pac
         {
             if (package_id == nullptr || package_info == nullptr)
                 return -EINVAL;
-            if (state.device.packages.count(package_id) == 0)
-                return static_cast<int>(PACKAGE_MANAGER_ERROR_NO_SUCH_PACKAGE);
+            const std::string* version = nullptr;
+            if (const int code = FindPackage(state, package_id, version); code != 0)
+                return code;
             const Opening opening = state.handles.Open(Call::package_info_create, caller);
             *package_info = state.handles.Add<package_info_h>({HandleKind::PackageInfo, kNoSlot, opening, package_id, {}});
             return 0;
@@ -50,8 +68,8 @@ PLATFORM_API int package_info_get_version(package_info_h package_info, char** ve
             const auto* const handle = state.handles.Find(HandleKind::PackageInfo, package_info, Call::package_info_get_version);
             if (handle == nullptr)
                 return -EINVAL;
-            const auto found = state.device.packages.find(handle->package);
-            return found == state.device.packages.end() ? static_cast<int>(PACKAGE_MANAGER_ERROR_NO_SUCH_PACKAGE)
-                                                        : GiveText(version, found->second);
+            const std::string* text = nullptr;
+            const int code = FindPackage(state, handle->subject, text);
+            return code == 0 ? GiveText(version, *text) : code;
         });
 }

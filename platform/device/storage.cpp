@@ -11,6 +11,8 @@ PLATFORM_API int storage_get_internal_memory_size64(struct statvfs* buf)
         {
             if (buf == nullptr)
                 return -EINVAL;
+            if (state.source != nullptr)
+                state.source->RefreshStorage(state.device);
             *buf = {};
             buf->f_bsize = state.device.blockSize;
             buf->f_bavail = state.device.blocksAvailable;

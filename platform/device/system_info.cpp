@@ -29,7 +29,7 @@ PLATFORM_API int system_info_get_platform_string(const char* key, char** value)
         {
             for (const auto& row : kKeys)
                 if (g_strcmp0(key, row.key) == 0)
-                    return GiveText(value, state.device.*row.text);
+                    return GiveText(value, state.Current(row.text));
             return -EINVAL;
         });
 }

@@ -7,7 +7,12 @@ using namespace kiv::platform;
 PLATFORM_API int system_settings_get_value_int(system_settings_key_e key, int* value)
 {
     return Answer(Call::system_settings_get_value_int, {},
-        [&](State& state) { return key == SYSTEM_SETTINGS_KEY_FONT_SIZE ? Give(value, state.device.fontSize) : -EINVAL; });
+        [&](State& state)
+        {
+            if (key != SYSTEM_SETTINGS_KEY_FONT_SIZE)
+                return -EINVAL;
+            return state.device.fontSize ? Give(value, *state.device.fontSize) : -ENODATA;
+        });
 }
 
 PLATFORM_API int system_settings_get_value_bool(system_settings_key_e key, bool* value)
@@ -25,9 +30,9 @@ PLATFORM_API int system_settings_get_value_string(system_settings_key_e key, cha
             switch (key)
             {
             case SYSTEM_SETTINGS_KEY_LOCALE_LANGUAGE:
-                return GiveText(value, state.device.language);
+                return GiveText(value, state.Current(&Device::language));
             case SYSTEM_SETTINGS_KEY_DEVICE_NAME:
-                return GiveText(value, state.device.deviceName);
+                return GiveText(value, state.Current(&Device::deviceName));
             default:
                 return -EINVAL;
             }

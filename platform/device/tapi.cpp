@@ -55,7 +55,8 @@ PLATFORM_API TapiHandle* tel_init(const char* cp_name)
             const int slot = cp_name != nullptr && state.device.telephony ? state.SlotOf(cp_name) : kNoSlot;
             if (slot == kNoSlot)
                 return -EINVAL;
-            handle = state.handles.Add<TapiHandle*>({HandleKind::Tapi, slot, state.handles.Open(Call::tel_init, caller), {}, {}});
+            const Opening opening = state.handles.Open(Call::tel_init, caller);
+            handle = state.handles.Add<TapiHandle*>({HandleKind::Tapi, slot, opening, cp_name, {}});
             return 0;
         });
     return handle;

@@ -61,8 +61,12 @@ PLATFORM_API int telephony_init(telephony_handle_list_s* list)
                 return 0;
 
             OpenHandle handles{HandleKind::HandleList, kNoSlot, state.handles.Open(Call::telephony_init, caller), {}, {}};
-            for (int slot = 0; slot < static_cast<int>(state.device.slots.size()); ++slot)
-                handles.list.push_back(state.handles.Add<telephony_h>({HandleKind::Telephony, slot, handles.opening, {}, {}}));
+            for (const SimSlot& sim : state.device.slots)
+            {
+                const int slot = static_cast<int>(handles.list.size());
+                handles.list.push_back(
+                    state.handles.Add<telephony_h>({HandleKind::Telephony, slot, handles.opening, sim.cpName, {}}));
+            }
             list->count = static_cast<unsigned>(handles.list.size());
             list->handle = state.handles.Add<telephony_h*>(std::move(handles));
             return 0;

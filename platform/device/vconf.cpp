@@ -11,6 +11,6 @@ PLATFORM_API char* vconf_get_str(const char* in_key)
     char* value = nullptr;
     Answer(Call::vconf_get_str, {},
         [&](State& state)
-        { return g_strcmp0(in_key, "db/csc/salescode") == 0 ? GiveText(&value, state.device.salesCode) : -EINVAL; });
+        { return g_strcmp0(in_key, "db/csc/salescode") == 0 ? GiveText(&value, state.Current(&Device::salesCode)) : -EINVAL; });
     return value;
 }

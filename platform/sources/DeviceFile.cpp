@@ -187,12 +187,6 @@ std::string DefaultOf(const std::string& /*value*/)
     return "required";
 }
 
-template <class Value>
-std::string DefaultOf(const std::optional<Value>& /*value*/)
-{
-    return "none";
-}
-
 std::string DefaultOf(bool value)
 {
     return value ? "true" : "false";
@@ -207,6 +201,12 @@ std::string DefaultOf(Number value)
 std::string DefaultOf(const std::vector<int>& value)
 {
     return DefaultOf(value.back());
+}
+
+template <class Value>
+std::string DefaultOf(const std::optional<Value>& value)
+{
+    return value ? DefaultOf(*value) : "none";
 }
 
 template <class Owner>

@@ -3,6 +3,7 @@
 #ifndef KIV_SOURCES_FOLLOWEDFILE_H
 #define KIV_SOURCES_FOLLOWEDFILE_H
 
+#include "LoopThread.h"
 #include "Source.h"
 
 #include <gio/gio.h>
@@ -23,9 +24,7 @@ public:
     void Settle() noexcept override;
 
 private:
-    struct Follower;
-
-    void Run(Follower& follower);
+    std::shared_ptr<LoopThread> Follow();
     void ReadAgain();
     static void OnEvent(GFileMonitor* monitor, GFile* file, GFile* other, GFileMonitorEvent event, gpointer source);
 
@@ -36,7 +35,7 @@ private:
     std::string lastReport_; ///< what was wrong with the file that was read again; guarded by `reading_`
 
     std::mutex mutex_; ///< guards the follower
-    std::shared_ptr<Follower> follower_;
+    std::shared_ptr<LoopThread> follower_;
 };
 
 } // namespace kiv::platform

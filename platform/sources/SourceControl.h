@@ -1,6 +1,6 @@
 /// @file
-/// Where the device's state comes from: profiles, which the library carries, and device files. For tests and tools; the product
-/// never calls it. Any thread may call anything here.
+/// Where the device's state comes from: profiles, which the library carries, device files, and the machine itself. For tests and
+/// tools; the product never calls it. Any thread may call anything here.
 #ifndef KIV_SOURCES_SOURCECONTROL_H
 #define KIV_SOURCES_SOURCECONTROL_H
 
@@ -22,8 +22,11 @@ struct Profile
     std::string description;
 };
 
-/// The profiles that UseProfile() and KIV_PROFILE know by name.
+/// The simulated devices that UseProfile() and KIV_PROFILE know by name.
 std::vector<Profile> ListProfiles();
+
+/// The machine itself, which they know too: ModemManager, NetworkManager and its files tell what it is.
+Profile HostProfile();
 
 /// What one key of a device file is.
 struct FieldInfo

@@ -2,6 +2,7 @@
 
 #include "DeviceFile.h"
 #include "FollowedFile.h"
+#include "Host.h"
 #include "Locked.h"
 #include "State.h"
 
@@ -30,6 +31,7 @@ constexpr EmbeddedProfile kProfiles[] = {
 #include "profiles.inc"
 };
 constexpr const char* kDefaultProfile = "dual";
+constexpr const char* kHost = "host";
 
 const char* TextOfProfile(const std::string& name)
 {
@@ -50,6 +52,9 @@ public:
 
 Origin Open(const std::string& nameOrPath)
 {
+    if (nameOrPath == kHost)
+        return Host::Open();
+
     if (const char* const text = TextOfProfile(nameOrPath))
         return {ReadDevice(text, "profile " + nameOrPath), std::make_shared<EmbeddedSource>(text)};
 
@@ -57,8 +62,8 @@ Origin Open(const std::string& nameOrPath)
     {
         std::string names;
         for (const EmbeddedProfile& profile : kProfiles)
-            names += (names.empty() ? "" : ", ") + std::string(profile.name);
-        throw DeviceFileError("\"" + nameOrPath + "\" is no profile and no file; profiles are " + names);
+            names += std::string(profile.name) + ", ";
+        throw DeviceFileError("\"" + nameOrPath + "\" is no profile and no file; profiles are " + names + kHost);
     }
     std::string text = ReadFile(nameOrPath);
     Device device = ReadDevice(text, nameOrPath);
@@ -119,6 +124,11 @@ std::vector<Profile> ListProfiles()
     for (const EmbeddedProfile& profile : kProfiles)
         profiles.push_back({profile.name, ReadDevice(profile.text, profile.name).description});
     return profiles;
+}
+
+Profile HostProfile()
+{
+    return {kHost, kHostDescription};
 }
 
 std::string SetInDeviceFile(const std::string& path, const std::vector<std::string>& assignments)

@@ -1,0 +1,58 @@
+/// @file
+/// What the services on the bus report, and what it means for the device.
+#ifndef KIV_SOURCES_REPORTS_H
+#define KIV_SOURCES_REPORTS_H
+
+#include "DeviceControl.h"
+
+#include <gio/gio.h>
+#include <map>
+#include <memory>
+#include <string>
+
+namespace kiv::platform
+{
+
+using Variant = std::shared_ptr<GVariant>;
+using Properties = std::map<std::string, Variant>;
+using Interfaces = std::map<std::string, Properties>;
+using Objects = std::map<std::string, Interfaces>; ///< by object path
+
+enum class Presence
+{
+    Absent,
+    Denied, ///< this user may not ask it
+    Present
+};
+
+struct ServiceReport
+{
+    Presence presence = Presence::Absent;
+    Objects objects;
+};
+
+struct Reports
+{
+    ServiceReport modems, network, bluetooth; ///< of ModemManager, NetworkManager, BlueZ
+};
+
+/// A method call that reads an object.
+struct DetailCall
+{
+    const char* interface;
+    const char* method;
+    const char* argument; ///< null when the method takes none
+};
+
+/// Objects that the modems refer to, beside those of the object manager: their SIMs.
+std::map<std::string, DetailCall> DetailsOfModems(const Objects& modems);
+
+/// The connections that modems use or would use.
+std::map<std::string, DetailCall> DetailsOfNetwork(const Objects& network);
+
+/// Sets everything in the device that the services decide, and why it is missing.
+void Describe(const Reports& reports, Device& device);
+
+} // namespace kiv::platform
+
+#endif
