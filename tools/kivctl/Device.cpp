@@ -2,6 +2,7 @@
 #include "Verbs.h"
 
 #include <DASystem.h>
+#include <DeviceControl.h>
 #include <glib.h>
 
 #include <algorithm>
@@ -10,24 +11,28 @@
 namespace
 {
 
-std::string NotTold(int code)
+using kiv::platform::ReasonFor;
+
+/// @param key  of the device file, by which the device knows why it has no such value
+std::string NotTold(const char* key, int code)
 {
-    return "the platform does not tell" + (code ? ", code " + std::to_string(code) : std::string());
+    const std::string reason = ReasonFor(key);
+    return !reason.empty() ? reason : "the platform does not tell" + (code ? ", code " + std::to_string(code) : std::string());
 }
 
 /// @param read  stores a text and gives the platform's code
 template <typename Read>
-Field ReadText(const char* name, Read read)
+Field ReadText(const char* name, const char* key, Read read)
 {
     char* text = nullptr;
     const int code = read(&text);
     const LibraryText owner(text);
-    return TextOr(name, text, NotTold(code));
+    return TextOr(name, text, NotTold(key, code));
 }
 
-Field ReadText(const char* name, int (DASystem::*read)(char**))
+Field ReadText(const char* name, const char* key, int (DASystem::*read)(char**))
 {
-    return ReadText(name, [read](char** text) { return (DASystem::GetInstance()->*read)(text); });
+    return ReadText(name, key, [read](char** text) { return (DASystem::GetInstance()->*read)(text); });
 }
 
 Field Masked(Field field, Identifiers identifiers)
@@ -68,7 +73,7 @@ std::string ImeiFallback()
 
 Field Imei(Identifiers identifiers)
 {
-    Field field = ReadText("imei", &DASystem::GetIMEI);
+    Field field = ReadText("imei", "", &DASystem::GetIMEI);
     if (field.value != Value(ImeiFallback()))
         return Masked(field, identifiers);
     field.note = "no modem answered; derived from the UTC offset";
@@ -79,14 +84,14 @@ Field FontSize()
 {
     int size = 0;
     const int code = DASystem::GetInstance()->GetFontSize(&size);
-    return code ? Missing("font_size", NotTold(code)) : Field{"font_size", std::int64_t{size}};
+    return code ? Missing("font_size", NotTold("settings.font-size", code)) : Field{"font_size", std::int64_t{size}};
 }
 
 Field CurrentTime()
 {
     std::tm now{};
     if (const int code = DASystem::GetInstance()->GetCurrentTime(&now))
-        return Missing("time", NotTold(code));
+        return Missing("time", NotTold("", code));
     std::array<char, 32> text{};
     std::strftime(text.data(), text.size(), "%Y-%m-%d %H:%M:%S", &now);
     return {"time", std::string(text.data())};
@@ -115,7 +120,7 @@ void AppendPackage(Record& record, std::string package)
     record.push_back({"package", package});
     record.push_back({"package_installed", system->IsPackageInstalled(package.data())});
     record.push_back(
-        ReadText("package_version", [&](char** version) { return system->GetPackageVersion(package.c_str(), version); }));
+        ReadText("package_version", "", [&](char** version) { return system->GetPackageVersion(package.c_str(), version); }));
 }
 
 } // namespace
@@ -129,21 +134,21 @@ Exit ShowDevice(const DeviceOptions& options, const Command& command)
         return 0;
     };
     Record record{
-        ReadText("name", &DASystem::GetDeviceName),
-        ReadText("model", &DASystem::GetModelName),
-        ReadText("platform", &DASystem::GetPlatformName),
-        ReadText("platform_version", &DASystem::GetSWVersion),
-        Masked(ReadText("platform_device_id", &DASystem::GetTizenIdN), command.identifiers),
+        ReadText("name", "settings.device-name", &DASystem::GetDeviceName),
+        ReadText("model", "device.model-name", &DASystem::GetModelName),
+        ReadText("platform", "device.platform-name", &DASystem::GetPlatformName),
+        ReadText("platform_version", "device.platform-version", &DASystem::GetSWVersion),
+        Masked(ReadText("platform_device_id", "device.tizen-id", &DASystem::GetTizenIdN), command.identifiers),
         Masked(Serial(), command.identifiers),
         Imei(command.identifiers),
-        ReadText("sales_code", salesCode),
+        ReadText("sales_code", "device.sales-code", salesCode),
         Language("language", LanguageCode::Plain),
         Language("language_iso639", LanguageCode::Iso639),
         CurrentTime(),
         FontSize(),
-        {"flight_mode", system->IsFlightMode()},
-        {"mobile_data", system->IsMobileData()},
-        {"data_roaming", system->IsDataRoamingEnabled()},
+        {"flight_mode", system->IsFlightMode(), ReasonFor("runtime.flight-mode")},
+        {"mobile_data", system->IsMobileData(), ReasonFor("settings.mobile-data")},
+        {"data_roaming", system->IsDataRoamingEnabled(), ReasonFor("runtime.data-roaming")},
         {"storage_needed_mib", options.storageMiB},
         {"storage_suffices", system->IsSystemMemoryAvailable(options.storageMiB)},
     };

@@ -48,6 +48,12 @@ std::vector<std::string> DeviceFileKeys()
 Exit SetInDeviceFile(const std::vector<std::string>& assignments, const Command& command)
 {
     const std::string file = DeviceAskedFor(command);
+    if (IsHost(file))
+    {
+        throw Failure(Exit::Usage,
+            "the machine itself is changed by its own tools, such as nmcli and mmcli; what can be changed here "
+            "is a device file, which --profile names, such as ./my.profile");
+    }
     if (IsProfileName(file))
     {
         throw Failure(
@@ -74,7 +80,9 @@ Exit ShowDeviceKeys(const Command& command)
 Exit ShowProfiles(const Command& command)
 {
     std::vector<Record> rows;
-    for (const kiv::platform::Profile& profile : kiv::platform::ListProfiles())
+    std::vector<kiv::platform::Profile> profiles = kiv::platform::ListProfiles();
+    profiles.push_back(kiv::platform::HostProfile());
+    for (const kiv::platform::Profile& profile : profiles)
         rows.push_back({{"name", profile.name}, {"description", profile.description}});
     PrintTable(rows, command.form);
     return Exit::Done;

@@ -65,6 +65,43 @@ Finding LookAtServiceManager(const Command&)
     return LookAtService(kiv::ServiceManager::kBusName, "kiv-service-manager");
 }
 
+/// A daemon that the machine itself is known from. Asking does not start it.
+Finding LookAtHostDaemon(const char* name, const std::string& unit, const char* interface, const char* path)
+{
+    g_autoptr(GDBusConnection) connection = g_bus_get_sync(G_BUS_TYPE_SYSTEM, nullptr, nullptr);
+    if (!connection)
+        return {"not asked without a bus", "mend the bus first"};
+    g_autoptr(GError) error = nullptr;
+    g_autoptr(GVariant) reply = g_dbus_connection_call_sync(connection, interface, path, "org.freedesktop.DBus.Properties", "Get",
+        g_variant_new("(ss)", interface, "Version"), G_VARIANT_TYPE("(v)"), G_DBUS_CALL_FLAGS_NO_AUTO_START, kPatienceMs, nullptr,
+        &error);
+    if (reply)
+    {
+        g_autoptr(GVariant) version = nullptr;
+        g_variant_get(reply, "(v)", &version);
+        const bool isText = g_variant_is_of_type(version, G_VARIANT_TYPE_STRING);
+        return {std::string("version ") + (isText ? g_variant_get_string(version, nullptr) : "unknown") + ", answers this user"};
+    }
+    if (g_error_matches(error, G_DBUS_ERROR, G_DBUS_ERROR_ACCESS_DENIED))
+        return {"not permitted", std::string("have the bus policy of ") + name + " let this user ask it"};
+    if (g_error_matches(error, G_DBUS_ERROR, G_DBUS_ERROR_SERVICE_UNKNOWN) ||
+        g_error_matches(error, G_DBUS_ERROR, G_DBUS_ERROR_NAME_HAS_NO_OWNER))
+        return {"does not run", "install and start it: systemctl start " + unit};
+    g_dbus_error_strip_remote_error(error);
+    return {std::string("does not answer: ") + error->message, "start it again: systemctl restart " + unit};
+}
+
+Finding LookAtModemManager(const Command&)
+{
+    return LookAtHostDaemon("ModemManager", "ModemManager", "org.freedesktop.ModemManager1", "/org/freedesktop/ModemManager1");
+}
+
+Finding LookAtNetworkManager(const Command&)
+{
+    return LookAtHostDaemon(
+        "NetworkManager", "NetworkManager", "org.freedesktop.NetworkManager", "/org/freedesktop/NetworkManager");
+}
+
 Finding LookAtStore(const Command&)
 {
     std::vector<DASubscription> subscriptions;
@@ -117,6 +154,7 @@ struct Check
 {
     const char* name;
     Finding (*look)(const Command&);
+    bool isForHost = false; ///< looked at only when the device is the machine itself
 };
 
 constexpr Check kChecks[] = {
@@ -125,6 +163,8 @@ constexpr Check kChecks[] = {
     {"service manager", LookAtServiceManager},
     {"subscriber store", LookAtStore},
     {"device", LookAtDevice},
+    {"ModemManager", LookAtModemManager, true},
+    {"NetworkManager", LookAtNetworkManager, true},
     {"library", LookAtSystemLibrary},
     {"platform", LookAtPlatformLibrary},
 };
@@ -136,8 +176,11 @@ Exit Examine(const Command& command)
     std::vector<Record> rows;
     Exit exit = Exit::Done;
     const Progress progress;
+    const bool isHost = IsHost(DeviceAskedFor(command));
     for (const Check& check : kChecks)
     {
+        if (check.isForHost && !isHost)
+            continue;
         progress.Show(std::string("looking at the ") + check.name);
         const Finding finding = check.look(command);
         const bool isWell = finding.remedy.empty();

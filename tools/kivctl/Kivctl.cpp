@@ -86,6 +86,7 @@ std::vector<std::string> ProfileNames()
     std::vector<std::string> names;
     for (const kiv::platform::Profile& profile : kiv::platform::ListProfiles())
         names.push_back(profile.name);
+    names.push_back(kiv::platform::HostProfile().name);
     return names;
 }
 
@@ -93,6 +94,11 @@ bool IsProfileName(const std::string& device)
 {
     const std::vector<std::string> names = ProfileNames();
     return device.empty() || std::find(names.begin(), names.end(), device) != names.end();
+}
+
+bool IsHost(const std::string& device)
+{
+    return device == kiv::platform::HostProfile().name;
 }
 
 void Note(const std::string& text)

@@ -56,7 +56,7 @@ inline constexpr Variable kEnvironment[] = {
     {"DBUS_SYSTEM_BUS_ADDRESS", "the system bus to use"},
     {"KIV_SUBSCRIBERS", "file of the subscriber store"},
     {"KIV_PROFILE", "the device where --profile names none"},
-    {"KIV_LOG", "\"error\" or \"info\" shows the platform log on standard error"},
+    {"KIV_LOG", "\"error\" or \"info\" shows the platform log on standard error, \"journal\" sends it to the system log"},
     {"NO_COLOR", "when not empty, no colour on a terminal either"},
 };
 
@@ -133,6 +133,9 @@ std::string WordFor(const Word (&words)[N], int value)
     }
     return "other (" + std::to_string(value) + ")";
 }
+
+/// Whether `device` names the machine itself.
+bool IsHost(const std::string& device);
 
 /// A diagnostic line on standard error.
 void Note(const std::string& text);

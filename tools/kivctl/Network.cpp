@@ -1,17 +1,20 @@
 #include "Verbs.h"
 
 #include <DASystem.h>
+#include <DeviceControl.h>
 #include <net_connection.h>
 
 namespace
 {
+
+using kiv::platform::ReasonFor;
 
 template <std::size_t N>
 Field StateField(const char* name, const Word (&words)[N], int state)
 {
     if (state == KIV_CONNECTION_STATE_UNKNOWN)
         return {name, std::string("unknown"), "the device does not answer"};
-    return {name, WordFor(words, state)};
+    return {name, WordFor(words, state), ReasonFor(std::string("network.") + name)};
 }
 
 } // namespace
@@ -31,7 +34,7 @@ Exit ShowNetwork(const NetworkOptions& options, const Command& command)
     const bool isConnected = system->IsNetworkConnected(options.countsWifi, options.countsBluetooth);
     Print({StateField("cellular", kCellular, system->GetCellularNetworkState()),
               StateField("wifi", kWifi, system->GetWifiNetworkState()),
-              StateField("bluetooth", kBluetooth, system->GetBTNetworkState()), {"connected", isConnected}},
+              StateField("bluetooth", kBluetooth, system->GetBTNetworkState()), {"connected", isConnected, ReasonFor("network")}},
         command.form);
     return isConnected ? Exit::Done : Exit::No;
 }

@@ -3,6 +3,7 @@
 
 #include <DASimManager.h>
 #include <DASystem.h>
+#include <DeviceControl.h>
 
 namespace
 {
@@ -62,9 +63,16 @@ Field Gone(const std::string& reason)
 {
     return Missing("", reason);
 }
-Field TextOrGone(const LibraryText& text, const std::string& reason)
+/// A field that is missing because a ready card does not hold it, or for what else keeps the slot from answering.
+Field GoneFromCard(const Slot& slot, const char* key, const char* reason)
 {
-    return TextOr("", text.get(), reason);
+    const std::string known = kiv::platform::ReasonFor("sim" + std::to_string(slot.index) + "." + key);
+    return Gone(slot.reason != kNoAnswer ? slot.reason : known.empty() ? reason : known);
+}
+
+Field TextOrGone(const LibraryText& text, const Slot& slot, const char* key)
+{
+    return text ? Held(std::string(text.get())) : GoneFromCard(slot, key, kNoAnswer);
 }
 
 Field SimState(const Slot& slot)
@@ -94,7 +102,7 @@ Field Country(const Slot& slot)
 {
     const LibraryText mcc = ReadMcc(slot);
     if (!mcc)
-        return Gone(slot.reason);
+        return GoneFromCard(slot, "mcc", kNoAnswer);
     char* name = nullptr;
     DASystem::GetInstance()->GetCountryNameFromMcc(mcc.get(), &name);
     const LibraryText owner(name);
@@ -104,7 +112,7 @@ Field Country(const Slot& slot)
 Field Imsi(const Slot& slot)
 {
     const LibraryText imsi = Read(slot, &DASimManager::GetIMSIFromSim);
-    return imsi ? Held(Mask(imsi.get(), 5, 0, slot.identifiers)) : Gone(slot.reason);
+    return imsi ? Held(Mask(imsi.get(), 5, 0, slot.identifiers)) : GoneFromCard(slot, "mcc", kNoAnswer);
 }
 
 Field Number(const Slot& slot)
@@ -112,7 +120,7 @@ Field Number(const Slot& slot)
     const LibraryText number = Read(slot, &DASimManager::GetPhoneNumberFromSim);
     if (number)
         return Held(Mask(number.get(), 0, 2, slot.identifiers));
-    return Gone(slot.reason == kNoAnswer ? "none given" : slot.reason);
+    return GoneFromCard(slot, "number", "none given");
 }
 
 Field Service(const Slot& slot)
@@ -173,9 +181,9 @@ const SlotField kFields[] = {
     {"cp_name", [](const Slot& slot) { return Held(slot.cpName); }},
     {"state", SimState},
     {"card", [](const Slot& slot) { return slot.card.empty() ? Gone(kNoAnswer) : Held(slot.card); }},
-    {"mcc", [](const Slot& slot) { return TextOrGone(ReadMcc(slot), slot.reason); }},
+    {"mcc", [](const Slot& slot) { return TextOrGone(ReadMcc(slot), slot, "mcc"); }},
     {"country", Country},
-    {"mnc", [](const Slot& slot) { return TextOrGone(Read(slot, &DASimManager::GetMNCFromSim), slot.reason); }},
+    {"mnc", [](const Slot& slot) { return TextOrGone(Read(slot, &DASimManager::GetMNCFromSim), slot, "mcc"); }},
     {"imsi", Imsi},
     {"number", Number},
     {"service", Service},

@@ -3,6 +3,7 @@
 #include "Kivctl.h"
 
 #include <DASystem.h>
+#include <DeviceControl.h>
 #include <glib.h>
 
 #include <numeric>
@@ -34,7 +35,10 @@ std::vector<std::string> RequireCpNames()
 {
     g_auto(GStrv) names = DASystem::GetInstance()->GetCpNameList();
     if (!names || !names[0])
-        throw Failure(Exit::No, "this device has no modem, or its telephony does not work");
+    {
+        const std::string reason = kiv::platform::ReasonFor("telephony.available");
+        throw Failure(Exit::No, !reason.empty() ? reason : "this device has no modem, or its telephony does not work");
+    }
     return {names, names + g_strv_length(names)};
 }
 

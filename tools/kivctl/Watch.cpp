@@ -42,7 +42,8 @@ private:
 
 Exit Watch(const Command& command)
 {
-    if (IsProfileName(DeviceAskedFor(command)))
+    const std::string device = DeviceAskedFor(command);
+    if (IsProfileName(device) && !IsHost(device))
         Note("this device comes from a profile and never changes; one from a file does (kivctl device set --profile FILE)");
 
     // Registered for as long as the process lives: taking it back is for a moment in which no change can be under way, and there
