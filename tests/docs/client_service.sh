@@ -50,6 +50,7 @@ LD_LIBRARY_PATH=$(dirname "$(find "$scratch/prefix" -name libkiv_system.so)")
 if [[ $language == cpp ]]; then
     block cpp 1 >mail.cpp
     command=$(block sh 1)
+    command=${command//\/usr\/share/$scratch/prefix/share}
     eval "${command/g++/$cxx -Wall -Wextra -Werror}"
     service=(./mail)
 else
@@ -61,6 +62,8 @@ unset KIV_PROFILE KIV_LOG
 ln -s "$sources/dbus"
 HOME=$scratch eval "$(block sh 2)" >bus.pid 2>bus.log
 pids+=("$(<bus.pid)")
+read -ra subscriptions <<<"$(block sh 3)"
+start subscriptions ready "${subscriptions[@]::3}"
 start service ready "${service[@]}"
 
 # What the page shows once more: what the service printed stands behind its start.
