@@ -197,4 +197,14 @@ TEST_F(MemorySweep, MakesEachInstanceUnderItsNamedLock)
     }
 }
 
+TEST_F(MemorySweep, LogsThatAnInstanceCannotBeMade)
+{
+    for (const std::string name : {"DASystem", "DASimManager", "DADBusManager", "DAConnectionManager"})
+    {
+        const Operation& operation = Find(name + "::GetInstance()");
+        for (const unsigned allocation : {1U, 2U}) // for the lock of that name, for the instance
+            EXPECT_EQ(operation.failing.at(0).story, TryFailing(operation, allocation, allocation)) << name << ", " << allocation;
+    }
+}
+
 } // namespace

@@ -5,8 +5,10 @@
 #include "DADBusManager.h"
 #include "DASimManager.h"
 #include "Forward.h"
+#include "GuardedLookup.h"
 #include "Handles.h"
 #include "Notifications.h"
+#include "PlatformRead.h"
 #include "Policy.h"
 #include "Singleton.h"
 #include "Slots.h"
@@ -21,14 +23,18 @@
 #include <system_settings.h>
 #include <vconf.h>
 
-#include <cerrno>
 #include <cstdint>
 #include <cstring>
-#include <utility>
 
 using kiv::Ask;
+using kiv::CopyOut;
 using kiv::CString;
+using kiv::GuardedLookup;
+using kiv::HasKey;
+using kiv::MccOfCallingCode;
 using kiv::Place;
+using kiv::Read;
+using kiv::ReadSwitch;
 
 DASystem* DASystem::__pInstance = nullptr;
 
@@ -39,117 +45,6 @@ DASystem* DASystem::GetInstance()
 
 DASystem::DASystem() = default;
 DASystem::~DASystem() = default;
-
-// Forwards ---------------------------------------------------------------------------------------------------------------------
-
-void DASystem::SetConnectionEventListener(IDAConnectionStateListener* listener, void* userData)
-{
-    Ask(&DAConnectionManager::SetConnectionEventListener, listener, userData);
-}
-
-int DASystem::GetCellularNetworkState()
-{
-    return Ask(KIV_CONNECTION_STATE_UNKNOWN, &DAConnectionManager::GetCellularNetworkState);
-}
-
-int DASystem::GetWifiNetworkState()
-{
-    return Ask(KIV_CONNECTION_STATE_UNKNOWN, &DAConnectionManager::GetWifiNetworkState);
-}
-
-int DASystem::GetBTNetworkState()
-{
-    return Ask(KIV_CONNECTION_STATE_UNKNOWN, &DAConnectionManager::GetBTNetworkState);
-}
-
-bool DASystem::IsNetworkConnected(bool checkWifi, bool checkBT)
-{
-    return Ask(false, &DAConnectionManager::IsNetworkConnected, checkWifi, checkBT);
-}
-
-bool DASystem::GetRoamingStatus(int slot, bool* roaming)
-{
-    return Ask(false, &DASimManager::GetRoamingStatus, slot, roaming);
-}
-
-bool DASystem::InitHandleList(telephony_handle_list_s* list)
-{
-    return Ask(false, &DASimManager::InitHandleList, list);
-}
-
-char** DASystem::GetCpNameList()
-{
-    return Ask<DASimManager, char**>(nullptr, &DASimManager::GetCpNameList);
-}
-
-bool DASystem::DeinitHandleList(telephony_handle_list_s* list)
-{
-    return Ask(false, &DASimManager::DeinitHandleList, list);
-}
-
-bool DASystem::IsAvaliableState(int slot, TelSimCardStatus_t* status)
-{
-    return Ask(false, &DASimManager::IsAvaliableState, slot, status);
-}
-
-bool DASystem::IsAvaliableSendSMS(int slot, TelSimCardStatus_t* status, int* serviceType)
-{
-    return Ask(false, &DASimManager::IsAvaliableSendSMS, slot, status, serviceType);
-}
-
-bool DASystem::IsAvaliableSimStateOnPolling(int slot, int unread, TelSimCardStatus_t* status)
-{
-    return Ask(false, &DASimManager::IsAvaliableSimStateOnPolling, slot, unread, status);
-}
-
-bool DASystem::IsWaittingSimCheck(TelSimCardStatus_t status)
-{
-    return Ask(false, &DASimManager::IsWaittingSimCheck, status);
-}
-
-bool DASystem::GetMainSimSubscription(char* cpName, TelNetworkDefaultSubs_t* subs)
-{
-    return Ask(false, &DASimManager::GetMainSimSubscription, cpName, subs);
-}
-
-bool DASystem::GetCallPreferredSubscription(char* cpName, TelCallPreferredVoiceSubs_t* subs)
-{
-    return Ask(false, &DASimManager::GetCallPreferredSubscription, cpName, subs);
-}
-
-bool DASystem::GetDefaultDataSubscription(char* cpName, TelNetworkDefaultDataSubs_t* subs)
-{
-    return Ask(false, &DASimManager::GetDefaultDataSubscription, cpName, subs);
-}
-
-bool DASystem::CheckSmsEnabled(char* cpName, int* status)
-{
-    return Ask(false, &DASimManager::CheckSmsEnabled, cpName, status);
-}
-
-bool DASystem::GetSimInfo(const char* cpName, std::string* mcc, std::string* mnc, std::string* msin)
-{
-    return Ask(false, &DASimManager::GetSimInfo, cpName, mcc, mnc, msin);
-}
-
-bool DASystem::GetPhoneNumber(telephony_data** handle, char** number)
-{
-    return Ask(false, &DASimManager::GetPhoneNumber, handle, number);
-}
-
-bool DASystem::IsSimExist()
-{
-    return Ask(false, &DASimManager::IsSimExist);
-}
-
-int DASystem::GetDeviceUniqueID(const char** id)
-{
-    const char* uniqueId = nullptr;
-    const int code =
-        Ask<DADBusManager, int, const char*&>(KIV_RESULT_INVALID_ARGUMENT, &DADBusManager::GetDeviceUniqueID, uniqueId);
-    *id = uniqueId;
-    return code;
-}
 
 // SIM queries over all slots ---------------------------------------------------------------------------------------------------
 
@@ -218,43 +113,6 @@ void DASystem::GetPhoneNumberFromSim(std::vector<char*>* values, int* count)
 }
 
 // Country lookups --------------------------------------------------------------------------------------------------------------
-
-namespace
-{
-
-/// Whether there is a key to look up; logs that there is none.
-bool HasKey(const char* key, const char* keyName, const Place& here)
-{
-    if (key != nullptr && *key != '\0')
-        return true;
-    KIV_ERROR_AT(here, "%s is empty. %s finish.", keyName, here.function);
-    return false;
-}
-
-using StringLookup = void (DASimManager::*)(const char*, char**);
-
-/// A string lookup of the manager behind the guard.
-void GuardedLookup(StringLookup lookup, const char* key, char** out, const char* keyName, const Place& here)
-{
-    if (!HasKey(key, keyName, here))
-        return;
-    char* found = nullptr;
-    Ask(lookup, key, &found);
-    *out = found;
-}
-
-/// The MCC of a calling code behind the guard; null, and logged, when there is none.
-CString MccOfCallingCode(const char* countryCallingCode, const Place& here)
-{
-    if (!HasKey(countryCallingCode, "countryCallingCode", here))
-        return nullptr;
-    char* mcc = nullptr;
-    Ask(&DASimManager::GetMccFromCountryCallingCode, countryCallingCode, &mcc);
-    CString owner(mcc);
-    return HasKey(mcc, "mcc", here) ? std::move(owner) : nullptr;
-}
-
-} // namespace
 
 bool DASystem::IsValidMcc(char* mcc)
 {
@@ -385,35 +243,6 @@ int DASystem::SendMultiOnOffNotiToServiceManager(const char* imsi, int count, in
 
 namespace
 {
-
-/// Reads one value of a platform service: stored in every case, zero or null when the service wrote none.
-template <class Key, class Value>
-int Read(int (*read)(Key, Value*), Key key, Value* out)
-{
-    Value value{};
-    const int code = read(key, &value);
-    *out = value;
-    return code;
-}
-
-/// Reads a switch of a platform service; off when the service wrote none.
-template <class Key>
-bool ReadSwitch(int (*read)(Key, bool*), Key key)
-{
-    bool isOn = false;
-    Read(read, key, &isOn);
-    return isOn;
-}
-
-/// Hands out a copy of a platform's text; a service that succeeds without one gives null.
-int CopyOut(const char* text, char** out)
-{
-    char* const copy = text == nullptr ? nullptr : strdup(text);
-    if (text != nullptr && copy == nullptr)
-        return -ENOMEM;
-    *out = copy;
-    return 0;
-}
 
 /// The IMEI of the first modem that answers, the platform's own text.
 /// @return whether one answered
@@ -578,55 +407,4 @@ bool DASystem::IsSystemMemoryAvailable(double requiredMiB)
 char* DASystem::GetCSC()
 {
     return vconf_get_str("db/csc/salescode");
-}
-
-// Device language --------------------------------------------------------------------------------------------------------------
-
-int DASystem::GetDeviceLanguageCode(char** languageCode, bool isISO639)
-{
-    char* value = nullptr;
-    const int code = system_settings_get_value_string(SYSTEM_SETTINGS_KEY_LOCALE_LANGUAGE, &value);
-    const CString owner(value);
-    const char* const setting = code == 0 && value != nullptr ? value : "en_us";
-
-    return kiv::NoThrow(code,
-        [&]
-        {
-            const int end = GetTagStartPosition(setting, "_");
-            std::string language = GetValueFromPosition(setting, 0, end - 1);
-            for (char& ch : language)
-                ch = To_Capital(ch);
-
-            char* iso = nullptr;
-            if (isISO639)
-                GetISO639LangCodeFromDeviceLang(language, &iso);
-            const char* const answer = isISO639 ? iso : language.c_str();
-            if (answer != nullptr)
-                CopyOut(answer, languageCode);
-            return code;
-        });
-}
-
-void DASystem::GetISO639LangCodeFromDeviceLang(std::string deviceLang, char** iso639LangCode)
-{
-    const std::size_t row = kiv::ISO639LangCodeTable::deviceLangCode.FirstRow(deviceLang.c_str());
-    *iso639LangCode = row == kiv::kNoRow ? nullptr : const_cast<char*>(kiv::ISO639LangCodeTable::iso639LangCode[row]);
-}
-
-int DASystem::GetTagStartPosition(std::string source, std::string tag)
-{
-    const auto position = source.find(tag);
-    return position == std::string::npos ? -1 : static_cast<int>(position);
-}
-
-std::string DASystem::GetValueFromPosition(std::string source, int startPosition, int endPosition)
-{
-    // Widened first: a negative length becomes one that reaches to the end.
-    const long long length = static_cast<long long>(endPosition) - startPosition + 1;
-    return source.substr(static_cast<std::size_t>(startPosition), static_cast<std::size_t>(length));
-}
-
-char DASystem::To_Capital(char ch)
-{
-    return ch >= 'a' && ch <= 'z' ? static_cast<char>(ch - ('a' - 'A')) : ch;
 }
