@@ -142,7 +142,6 @@ TEST_F(Push, GoesToTheNewBusAfterOneThatDied)
 TEST_F(Push, LetsNoConnectionEndTheProcessWhileItConnects)
 {
     Peer client(bus);
-    Subscribe(client);
     const Connection other = bus.Connect();
     const auto staysDeadly = [&]
     {
@@ -150,7 +149,9 @@ TEST_F(Push, LetsNoConnectionEndTheProcessWhileItConnects)
         g_signal_emit_by_name(other.get(), "closed", FALSE, nullptr);
         return g_dbus_connection_get_exit_on_close(other.get()) != FALSE;
     };
-    EXPECT_TRUE(staysDeadly());
+    Deliver();
+    EXPECT_TRUE(staysDeadly()) << "where there is nobody to connect for";
+    Subscribe(client);
     Deliver();
     EXPECT_FALSE(staysDeadly());
     Settle();
