@@ -109,17 +109,22 @@ start_bus_and_services()
     await bus "$DBUS_SYSTEM_BUS_ADDRESS"
     start board "$build/platform/services/kiv-board-daemon"
     start manager "$build/platform/services/kiv-service-manager"
+    start subscriptions "$build/platform/services/kiv-subscription-service"
     await board ready
     await manager ready
+    await subscriptions ready
 }
 
 start_client_services()
 {
     start mail "$kivctl" subscribe --name org.example.Mail --key 7 --kind policy --kind status --kind auth --kind activated \
         --kind number_changed --push mail
-    start calls "$kivctl" subscribe --name org.example.Calls --key 8 --kind status --kind auth --push mail
     await mail ready
+    start calls "$kivctl" subscribe --name org.example.Calls --key 8 --kind status --kind auth --push mail
     await calls ready
+
+    title "Client services that subscribed over the bus"
+    show subscribers list
 }
 
 show_device()

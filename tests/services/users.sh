@@ -1,0 +1,120 @@
+#!/usr/bin/env bash
+# The subscription service among users: on a bus that denies by default, with the policies as they are installed, a client service of
+# another user subscribes and is notified of everything, and a third user cannot meddle. Only root can be several users.
+# usage: users.sh BUILD_DIR SOURCE_DIR
+set -euo pipefail
+build=$1 sources=$2
+readonly agent=daemon client=mail stranger=games
+((EUID == 0)) || { echo "skipped: only root can be several users"; exit 77; }
+command -v setpriv >/dev/null || { echo "skipped: util-linux is not installed"; exit 77; }
+
+scratch=$(mktemp -d)
+pids=()
+trap '((${#pids[@]})) && kill "${pids[@]}" 2>/dev/null; wait; rm -rf "$scratch"' EXIT
+chmod 755 "$scratch"
+mkdir "$scratch"/{store,services}
+chown $agent "$scratch/store"
+export DBUS_SYSTEM_BUS_ADDRESS=unix:path=$scratch/bus KIV_SUBSCRIBERS=$scratch/store/subscribers.db
+unset KIV_PROFILE KIV_LOG
+cmake --install "$build" --prefix "$scratch/prefix" >"$scratch/installed"
+readonly share=$scratch/prefix/share kivctl=$scratch/prefix/bin/kivctl
+
+fail() # text
+{
+    echo "$1" >&2
+    head -50 "$scratch"/*.log >&2
+    exit 1
+}
+
+# For subshells, whose process it takes.
+be() # user command...
+{
+    exec setpriv --reuid="$1" --regid="$1" --clear-groups "${@:2}"
+}
+
+start() # name text-that-it-prints command...
+{
+    local log=$scratch/$1.log text=$2 deadline=$((SECONDS + 20))
+    shift 2
+    : >"$log"
+    "$@" >>"$log" 2>&1 &
+    pids+=($!)
+    until grep --quiet "$text" "$log"; do
+        ((SECONDS < deadline)) && kill -0 "${pids[-1]}" 2>/dev/null || fail "not ready: $*"
+        sleep 0.02
+    done
+}
+
+call() # user method argument...
+{
+    be "$1" dbus-send --system --print-reply=literal --reply-timeout=20000 --dest=org.kiv.Subscriptions /org/kiv/Subscriptions \
+        "org.kiv.Subscriptions1.$2" "${@:3}" 2>&1
+}
+
+expect() # text command...
+{
+    local answer
+    answer=$("${@:2}" 2>&1) || true
+    [[ $answer == *"$1"* ]] || fail "not \"$1\", but \"$answer\": ${*:2}"
+}
+
+# Where a stock bus has its helper start a service as a user, this one starts it by itself.
+sed "s|^Exec=.*/|Exec=$(command -v setpriv) --reuid=$agent --regid=$agent --clear-groups $scratch/prefix/bin/|" \
+    "$share/dbus-1/system-services/org.kiv.Subscriptions.service" >"$scratch/services/org.kiv.Subscriptions.service"
+for policy in "$sources/dbus/kiv-agent.conf" "$share/dbus-1/system.d/org.kiv.Subscriptions.conf" \
+    "$share/doc/libkiv-client-dev/examples/org.example.Mail.conf"; do
+    sed "s/user=\"kiv-agent\"/user=\"$agent\"/; s|/org/example/Mail|/org/kiv/ClientService|" "$policy" \
+        >"$scratch/$(basename "$policy")"
+done
+cat >"$scratch/bus.conf" <<CONF
+<busconfig>
+  <type>system</type>
+  <listen>$DBUS_SYSTEM_BUS_ADDRESS</listen>
+  <auth>EXTERNAL</auth>
+  <servicedir>$scratch/services</servicedir>
+  <policy context="default">
+    <allow user="*"/>
+    <deny own="*"/>
+    <deny send_type="method_call"/>
+    <allow send_destination="org.freedesktop.DBus" send_interface="org.freedesktop.DBus"/>
+    <allow send_type="signal"/>
+    <allow send_requested_reply="true" send_type="method_return"/>
+    <allow send_requested_reply="true" send_type="error"/>
+    <allow receive_type="*"/>
+  </policy>
+  <include>$scratch/kiv-agent.conf</include>
+  <include>$scratch/org.kiv.Subscriptions.conf</include>
+  <include>$scratch/org.example.Mail.conf</include>
+</busconfig>
+CONF
+start bus unix: dbus-daemon --config-file="$scratch/bus.conf" --nofork --nosyslog --print-address
+start mail ready be $client "$kivctl" subscribe --name org.example.Mail --key 7 --kind policy --kind status --kind auth \
+    --kind activated --kind number_changed --push mail
+[[ $(stat --format=%U "$KIV_SUBSCRIBERS") == "$agent" ]] || fail "the store is not the agent's"
+
+while read -r -a words; do
+    expect "sent subscribers=1 delivered=1" be $agent "$kivctl" "${words[@]}"
+done <<EVENTS
+notify auth-success
+notify on --service 7
+notify policy --service 7 --texts a b c d
+notify activated
+notify number-changed --texts a b c d
+push mail --data a --message b
+EVENTS
+(($(wc --lines <"$scratch/mail.log") == 7)) || fail "not everything is received"
+
+before=$(call $agent List)
+[[ $before == *org.example.Mail* && $(call root List) == "$before" ]] || fail "not listed: $before"
+readonly record=(string:auth string:all string:org.example.Mail objpath:/org/kiv/ClientService string:org.kiv.ClientService)
+expect AccessDenied call $stranger Subscribe "${record[@]}"
+expect AccessDenied call $stranger Unsubscribe "${record[@]}"
+expect AccessDenied call root Subscribe "${record[@]}"
+[[ $(call $stranger List) != *org.example* ]] || fail "a stranger sees the subscriptions of others"
+expect "not allowed to own" be $stranger "$kivctl" subscribe --name org.kiv.Subscriptions --push mail
+expect AccessDenied be $client dbus-send --system --print-reply --dest=org.kiv.Subscriptions / org.freedesktop.DBus.Peer.Ping
+[[ $(call $agent List) == "$before" ]] || fail "somebody else changed the subscriptions"
+
+kill "${pids[1]}"
+wait "${pids[1]}" || fail "the client service does not end"
+[[ $(be $agent "$kivctl" subscribers list 2>/dev/null) == "" ]] || fail "the subscriptions are still there"
