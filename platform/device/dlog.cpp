@@ -2,6 +2,7 @@
 
 #include "Locked.h"
 #include "LogControl.h"
+#include "Visible.h"
 
 #include <glib.h>
 #include <syslog.h>
@@ -65,7 +66,8 @@ void Print(const LogLine& line)
     const std::unique_ptr<char, decltype(&g_free)> time(
         now != nullptr ? g_date_time_format(now.get(), "%H:%M:%S.%f") : nullptr, g_free);
     const char letter = line.priority >= DLOG_VERBOSE && line.priority <= DLOG_FATAL ? kLetters[line.priority] : '?';
-    const std::string whole = std::string(time != nullptr ? time.get() : "") + ' ' + letter + ' ' + line.tag + ": " + line.text;
+    const std::string text = kiv::platform::Visible(line.text.substr(0, line.text.find_last_not_of('\n') + 1)) + '\n';
+    const std::string whole = std::string(time != nullptr ? time.get() : "") + ' ' + letter + ' ' + line.tag + ": " + text;
     fputs(whole.c_str(), stderr);
 }
 

@@ -1,5 +1,7 @@
 #include "BusCall.h"
 
+#include <Visible.h>
+
 namespace kiv
 {
 namespace
@@ -43,13 +45,19 @@ std::vector<BusCall::Value> BusCall::Values() const
     return named;
 }
 
+std::string BusCall::Event() const
+{
+    const std::string name = method.name;
+    return name == "activate" ? "activated" : name == "number_change" ? "number_changed" : name;
+}
+
 std::string BusCall::Line() const
 {
-    std::string line = method.name;
+    std::string line = Event();
     for (const Value& value : Values())
     {
         g_autofree char* text = g_variant_print(value.value.get(), FALSE);
-        line += ' ' + value.name + '=' + text;
+        line += ' ' + value.name + '=' + platform::Visible(text);
     }
     return line;
 }

@@ -33,7 +33,11 @@ struct BusCall
     /// structure is told by the members of that structure.
     std::vector<Value> Values() const;
 
-    /// The call on one line: method, then name=value with values in GVariant text form, so that no value breaks the line.
+    /// The kind of event that the call is about, as the subscriber store names it; the method's name for a call without a kind.
+    std::string Event() const;
+
+    /// The call on one line: event, then name=value with values in GVariant text form, so that no value breaks the line; what a
+    /// terminal should not see is escaped.
     std::string Line() const;
 };
 

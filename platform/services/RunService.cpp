@@ -34,7 +34,7 @@ try
 
     StopSignals signals;
     const std::unique_ptr<BusParty> service = start();
-    std::printf("ready: %s %s\n", service->Name().c_str(), service->ObjectPath());
+    std::printf("ready bus_names=%s\n", service->Name().c_str()); // as kivctl services prints it
     std::fflush(stdout);
     if (signals.IterateWhile([&service] { return service->IsConnected() && service->GoOn(); }) || service->IsConnected())
         return 0;

@@ -1,114 +1,14 @@
-#include "support/Deliveries.h"
-#include "support/PrivateBus.h"
-#include "support/Texts.h"
-
-#include <csignal>
-#include <regex>
-
-using testing::AllOf;
-using testing::HasSubstr;
+#include "tools/KivctlTest.h"
 
 namespace kiv::test
 {
 namespace
 {
 
-using Words = std::set<std::string>;
-
-/// What the pattern's group holds at every place where the pattern fits.
-Words All(const char* pattern, const std::string& text)
-{
-    const std::regex regex(pattern);
-    return {std::sregex_token_iterator(text.begin(), text.end(), regex, 1), std::sregex_token_iterator()};
-}
-
-/// The text without what differs from run to run and from machine to machine: times, addresses, directories, widths of columns.
-std::string Steady(const std::string& text)
-{
-    const std::regex passing(R"(\d{4}-\d\d-\d\d \d\d:\d\d:\d\d|waited seconds +\d+|\d+(?= s:)|unix:[^ "]*|[^ "]*/)");
-    return std::regex_replace(std::regex_replace(text, passing, ""), std::regex(" +"), " ");
-}
-
-/// A program that runs beside the test, in its directory, and is killed with its owner.
-struct Program
-{
-    /// @param command  as a shell takes it
-    explicit Program(const std::string& command)
-    {
-        const std::string line = "exec " + command + " >" + name + ".out 2>" + name + ".err";
-        process.reset(g_subprocess_new(G_SUBPROCESS_FLAGS_NONE, nullptr, "sh", "-c", line.c_str(), nullptr));
-    }
-    ~Program() { g_subprocess_force_exit(process.get()); }
-
-    std::string Out() const { return Contents(name + ".out"); }
-    std::string Err() const { return Contents(name + ".err"); }
-
-    /// Waits until it printed that.
-    void Await(const std::string& text) const
-    {
-        SCOPED_TRACE(text);
-        IterateUntil([&] { return Out().find(text) != std::string::npos; });
-    }
-
-    /// Waits for its end, which the signal brings about if there is one. @return the exit code; -1 when a signal ended it
-    int End(int signal = 0)
-    {
-        g_subprocess_send_signal(process.get(), signal);
-        g_subprocess_wait(process.get(), nullptr, nullptr);
-        return g_subprocess_get_if_exited(process.get()) ? g_subprocess_get_exit_status(process.get()) : -1;
-    }
-
-    static inline int count = 0;
-    const std::string name = std::to_string(++count);
-    std::unique_ptr<GSubprocess, Unref> process;
-};
-
-/// One that says when it is ready.
-struct Service : Program
-{
-    explicit Service(const std::string& command) : Program(command) { Await("ready"); }
-};
-
-/// One that has ended.
-struct Outcome : Program
-{
-    explicit Outcome(const std::string& command) : Program(command) {}
-
-    const int exit = End();
-    const std::string out = Out(), err = Err();
-};
-
-Outcome Kivctl(const std::string& arguments)
-{
-    return Outcome(KIVCTL " " + arguments);
-}
-
-/// What bash offers behind those words, one a line.
-std::string Complete(const std::string& words)
-{
-    return Outcome("bash -c 'source <(" KIVCTL " print-bash-completion); COMP_WORDS=(kivctl " + words +
-                   R"( ""); COMP_CWORD=$((${#COMP_WORDS[@]} - 1)); _kivctl; printf "%s\n" "${COMPREPLY[@]}"')")
-        .out;
-}
-
-/// A bus, a subscriber store and a directory of its own for each test.
-struct KivctlTest : testing::Test
-{
-    KivctlTest()
-    {
-        std::filesystem::current_path(directory);
-        g_setenv("KIV_SUBSCRIBERS", (directory + "/subscribers.db").c_str(), TRUE);
-    }
-    ~KivctlTest() override { std::filesystem::remove_all(directory); }
-
-    const std::string directory = mkdtemp((std::filesystem::temp_directory_path() / "kivctl-XXXXXX").string().data());
-    PrivateBus bus;
-};
-
 TEST_F(KivctlTest, EndsWithTheDocumentedExitCode)
 {
     const std::tuple<std::string, int, const char*, const char*> cases[] = {
-        {"--version", 0, "kivctl " KIV_VERSION "\n", ""},
+        {"-V", 0, "kivctl " KIV_VERSION "\n", ""},
         {"sim wate", 2, "", "did you mean \"wait\"?"},
         {"sim --slott 1", 2, "", "did you mean \"--slot\"?"},
         {"sim --profile Singel", 10, "", "host (did you mean \"single\"?)"},
@@ -154,7 +54,35 @@ TEST_F(KivctlTest, EndsWithTheDocumentedExitCode)
         {"subscribe --kind status", 2, "", "--key"},
         {"subscribers add status 7 7up /a a.b", 4, "", "7up"},
         {"subscribers remove status 7 a.b /a a.b", 1, "", "no such subscription"},
+        {"sim wait --profile none", 1, "", "waiting makes no SIM usable"},
+        {"sim wait --profile pin-required --timeout 0", 3, "", "no SIM is usable after 0 s"},
+        {"network --profile no-telephony", 1, "out of service", ""},
+        {"country +81", 0, "Japan", ""},
+        {"-t --fields imsi,number sim -p single", 0, "45005**********:***********78\n", ""},
+        {"device --show-ids --fields imei,platform_device_id -j", 0, "\"imei\": \"356938035643809\"", ""},
+        {"device set -p ./w network.cellular=0 network.wifi=2 device.tizen-id=1234", 0, "", ""},
+        {"network -p ./w --bt", 1, "connected  no", ""},
+        {"network -p ./w --wifi", 0, "connected  yes", ""},
+        {"device set -p ./w network.wifi=0 network.bluetooth=2 settings.device-name='a:\\\xe2\x80\xae'", 0, "", ""},
+        {"network -p ./w --bt", 0, "connected  yes", ""},
+        {"device -p ./w -t --fields platform_device_id,name", 0, "****:a\\:\\\\\\u202e\n", ""},
+        {"device -p ./w -j --fields name", 0, "\"a:\\\\\\u202e\"", ""},
+        {"network -p './\x1b[31m\n'", 10, "", "./\\x1b[31m\\n"},
+        {"device --fields nam,model", 2, "", "there is no field \"nam\" (did you mean \"name\"?); the fields are name, model,"},
+        {"subscribers list --fields key,x", 2, "", "the fields are kind, key, bus_name, object_path, interface"},
+        {"notify auth --fields event", 2, "", "--fields and --terse are for queries"},
+        {"-j --fields slot,service-type,imsi sim -p single", 0,
+            "{\n    \"slot\": 0,\n    \"service_type\": 6,\n    \"imsi\": \"45005**********\",\n    \"notes\": {\n"
+            "      \"imsi\": \"masked; --show-ids shows all of it\"\n",
+            ""},
+        {"push m --data d --message m --time now", 2, "", "--time: \"now\" is wrong; a whole number of 64 bits would be right"},
+        {"device --storage x", 2, "", "--storage: \"x\" is wrong; a number would be right"},
+        {"country 450 --by", 2, "", "--by needs a value: mcc|alpha2|calling|service"},
+        {"--color always -p single --fields slot sim", 0, "\033[1mslot\033[0m\n", ""},
         {"subscribers list --json", 0, "[]", "nobody"},
+        {"subscribers add auth all a.b /a a.b --json", 0, "\"result\": \"added\",\n  \"kind\": \"auth\"", ""},
+        {"subscribers add auth all a.b /a a.b --json", 0, "\"result\": \"unchanged\"", "was subscribed before"},
+        {"subscribers remove auth all a.b /a a.b --json", 0, "\"result\": \"removed\"", ""},
     };
     std::ofstream("broken") << "[device]\nserial=\\q\n";
     for (const auto& [arguments, exit, out, err] : cases)
@@ -169,189 +97,50 @@ TEST_F(KivctlTest, EndsWithTheDocumentedExitCode)
     EXPECT_EQ(10, Outcome("env KIV_PROFILE=tripel " KIVCTL " network").exit);
 }
 
-TEST_F(KivctlTest, CarriesEveryNotificationToItsReceivers)
+TEST_F(KivctlTest, SaysThatTheOutputCannotBeWritten)
 {
-    const Service services(KIVCTL " services --serial S1");
-    const Service all(KIVCTL " subscribe --name a.all --key 7 --kind policy --kind status --kind auth --kind activated"
-                             " --kind number_changed --push mail");
-    const Service other(KIVCTL " subscribe --kind status --key 8");
-    EXPECT_EQ("device id  S1\n", Kivctl("device id").out);
-
-    const std::pair<std::string, const char*> cases[] = {
-        {"activated", "activate imsi='1' active=1\n"},
-        {"auth-fail", "auth imsi='1' success=0\n"},
-        {"auth-success", "auth imsi='1' success=1\n"},
-        {"deactivated", "activate imsi='1' active=0\n"},
-        {"number-changed --texts w x y z", "number_change imsi='1' text1='w' text2='x' text3='y' text4='z'\n"},
-        {"off --service 7", "status imsi='1' service_id=7 status='off'\n"},
-        {"on --service 7", "status imsi='1' service_id=7 status='on'\n"},
-        {"policy --service 7 --texts w x y z",
-            "policy imsi='1' service_id=7 service_status='w' policy_feature='x' policy_version='y' policy_doc_url='z'\n"},
-    };
-    std::string types = "right are";
-    for (const auto& [arguments, call] : cases)
-    {
-        types += ' ' + arguments.substr(0, arguments.find(' ')) + ',';
-        const Outcome told = Kivctl("notify --imsi 1 " + arguments);
-        EXPECT_EQ("sent subscribers=1 delivered=1\n", told.out) << arguments << "\n" << told.err;
-        all.Await(call);
-        const bool isRefused = Kivctl("notify --to manager --imsi 1 " + arguments).exit == 4;
-        EXPECT_EQ(arguments.find("number-changed") == 0, isRefused) << arguments;
-        if (!isRefused)
-            services.Await(call);
-    }
-    types.back() = ';';
-    EXPECT_THAT(Kivctl("notify nothing").err, HasSubstr(types));
-    EXPECT_EQ("sent subscribers=2 delivered=2\n", Kivctl("notify --imsi 1 on off --service 8 --service 7").out);
-    other.Await("status imsi='1' service_id=8 status='on'\n");
-
-    for (const char* what : {"status 7", "push mail"})
-        ASSERT_EQ(0, Kivctl(std::string("subscribers add ") + what + " org.gone.Away /a a.b").exit);
     for (const char* arguments :
-        {"notify --imsi 1 on --service 7", "push mail --data '{\"a\":1}' --message 'two words' --time -5000000000"})
+        {"device", "sim", "country 450 -t", "--help", "--version", "sim --help", "completion bash", "services"})
     {
-        const Outcome told = Kivctl(arguments);
-        EXPECT_EQ(1, told.exit) << arguments;
-        EXPECT_EQ("sent subscribers=2 delivered=1\n", told.out) << arguments;
-        EXPECT_THAT(told.err, HasSubstr("ServiceUnknown")) << arguments;
+        const Outcome outcome("sh -c '" KIVCTL " " + std::string(arguments) + " >/dev/full'");
+        EXPECT_EQ(7, outcome.exit) << arguments;
+        EXPECT_EQ("kivctl: cannot write to standard output: No space left on device\n", outcome.err) << arguments;
     }
-    all.Await("push service_id='mail' data='{\"a\":1}' message='two words' time=-5000000000\n");
+    // A reader that has gone ends a stream.
+    EXPECT_EQ(0, Outcome("bash -c 'exec 3> >(:); wait $!; " KIVCTL " subscribe --kind auth >&3'").exit);
 }
 
-TEST_F(KivctlTest, ServicesHoldTheirNamesAndSubscriptionsUntilTheyEnd)
+/// What the program prints on a terminal that is as wide.
+std::vector<std::string> OnTerminal(const std::string& columns, const std::string& arguments)
 {
-    const std::pair<int, std::string> services[] = {
-        {SIGINT, KIVCTL " subscribe --name a.b --kind auth"}, {SIGTERM, KIV_BOARD_DAEMON}, {SIGHUP, KIV_SERVICE_MANAGER}};
-    for (const auto& [signal, command] : services)
-    {
-        Service service(command);
-        const Outcome second(command);
-        EXPECT_EQ(1, second.exit);
-        EXPECT_THAT(second.err, HasSubstr("is taken"));
-        EXPECT_EQ(0, service.End(signal));
-        EXPECT_EQ("", Kivctl("subscribers list").out);
-    }
-    Service service(KIV_BOARD_DAEMON);
-    bus.Stop();
-    EXPECT_EQ(1, service.End());
+    const std::string out =
+        Outcome("script --quiet --command 'stty cols " + columns + "; " KIVCTL " " + arguments + "' /dev/null").out;
+    const std::regex ends("\r*\n");
+    return {std::sregex_token_iterator(out.begin(), out.end(), ends, -1), std::sregex_token_iterator()};
 }
 
-TEST_F(KivctlTest, SubscribesByTheServiceAsItDoesInTheFile)
+TEST_F(KivctlTest, PrintsNoLineThatIsWiderThanTheTerminal)
 {
-    Service service("env KIV_SUBSCRIBERS=" + directory + "/served.db " KIV_SUBSCRIPTION_SERVICE);
-    const std::string file = "env KIV_SUBSCRIBERS=served.db " KIVCTL " subscribers list";
+    for (const char* columns : {"80", "40"})
     {
-        Service client(KIVCTL " subscribe --name a.b --kind auth");
-        EXPECT_EQ("", Kivctl("subscribers list").out);
-        EXPECT_THAT(Outcome(file).out, HasSubstr("a.b"));
-        EXPECT_EQ(0, client.End(SIGINT));
-        EXPECT_EQ("", Outcome(file).out);
-    }
-    const auto compare = [](const std::string& command, int exit)
-    {
-        const Outcome byService = Kivctl(command), inFile = Kivctl(command + " --store served.db");
-        EXPECT_EQ(exit, byService.exit) << command;
-        EXPECT_EQ(exit, inFile.exit) << command;
-        EXPECT_EQ(inFile.err, byService.err);
-    };
-    compare("subscribe --push '' --name a.b", 4);
-    std::ofstream("served.db") << std::string(4096, 'x');
-    compare("subscribe --push a --name a.b", 6);
-}
-
-TEST_F(KivctlTest, TellsAMissingBusFromABrokenStore)
-{
-    std::ofstream("subscribers.db") << std::string(4096, 'x');
-    for (const char* arguments :
-        {"subscribers list", "notify --imsi 1 auth-fail", "push mail --data d --message m", "subscribe --push a"})
-        EXPECT_EQ(6, Kivctl(arguments).exit) << arguments;
-    const Outcome examined = Kivctl("doctor");
-    EXPECT_EQ(1, examined.exit);
-    EXPECT_THAT(Steady(examined.out),
-        AllOf(HasSubstr("bus yes"), HasSubstr("deviced is not on the bus start it: kiv-board-daemon"),
-            testing::ContainsRegex("subscriber store no .*: file is not a database the file is damaged: move it away"),
-            HasSubstr("library yes")));
-    bus.Stop();
-    EXPECT_THAT(Steady(Kivctl("doctor --profile nosuch").out), AllOf(HasSubstr("bus no"), HasSubstr("device no")));
-    for (const char* arguments : {"device id", "notify --imsi 1 auth-fail", "notify --imsi 1 auth-fail --to manager",
-             "push mail --data d --message m", "subscribe --push a", "services"})
-        EXPECT_EQ(8, Kivctl(arguments).exit) << arguments;
-    // The library tells a bus that is too slow by the word in the reason, which names an unknown transport.
-    EXPECT_EQ(9, Outcome("env DBUS_SYSTEM_BUS_ADDRESS=Time: " KIVCTL " device id").exit);
-}
-
-TEST_F(KivctlTest, PrintsWhatThePagesShow)
-{
-    std::map<std::string, Service> beside; // by what each is to print
-    const std::string pages = Contents(KIV_DOCS "/profiles.md") + Contents(KIV_DOCS "/kivctl.md");
-    g_auto(GStrv) examples = g_strsplit(pages.c_str(), "\n$ kivctl ", -1);
-    EXPECT_LT(36U, g_strv_length(examples));
-    for (char** rest = examples + 1; *rest != nullptr; ++rest)
-    {
-        const std::string text = *rest, example = text.substr(0, text.find("\n```")) + '\n';
-        const std::string arguments = example.substr(0, example.find('\n'));
-        const std::string printed = example.substr(arguments.size() + 1);
-        if (arguments.back() == '&')
+        for (const char* arguments : {"--color never sim", "--color never device", "--color never device keys", "--help",
+                 "notify --help", "notify wrong", "--color never -p pin-required sim"})
         {
-            beside.try_emplace(printed, KIVCTL " " + arguments.substr(0, arguments.size() - 2));
-            continue;
+            for (const std::string& line : OnTerminal(columns, arguments))
+                EXPECT_LE(line.size(), std::stoul(columns)) << arguments << "\n" << line;
         }
-        const Outcome outcome = Kivctl(arguments);
-        const std::string end = outcome.exit ? "(exit code " + std::to_string(outcome.exit) + ")\n" : "";
-        EXPECT_EQ(Steady(printed), Steady(outcome.out + outcome.err + end)) << arguments;
     }
-    for (const auto& [printed, program] : beside)
-    {
-        program.Await(printed);
-        EXPECT_EQ(printed, program.Out());
-    }
-
-    const Words rows = All("\n(\\| `kivctl [^`]*` \\| (?:object|array) \\| .*) \\|", pages); // of the fields in JSON
-    EXPECT_EQ(13U, rows.size());
-    for (const std::string& row : rows)
-    {
-        const std::string out = Kivctl("--json --profile single " + *All("`kivctl (.*?)`", row).begin()).out;
-        Words names = All("\"(\\w+)\": ?", out);
-        names.erase("notes");
-        EXPECT_EQ(All("`(\\w+)`", row), names) << row;
-        EXPECT_EQ(row.find("| array |") != row.npos, out.front() == '[') << row;
-    }
+    EXPECT_EQ((std::vector<std::string>{"slot  0", "card  ready", "", "slot  1", "card  ready"}),
+        OnTerminal("40", "--color never --fields slot,card sim"));
+    EXPECT_EQ((std::vector<std::string>{"slot  card", "0     ready", "1     ready"}),
+        OnTerminal("80", "--color never --fields slot,card sim"));
+    EXPECT_THAT(OnTerminal("40", "sim --help"), testing::IsSupersetOf({"  --slot N", "    Only this slot, counted from 0"}));
 }
 
-TEST_F(KivctlTest, PagesAndCompletionListAllThatTheHelpLists)
+TEST_F(KivctlTest, PausesBetweenTwoQuestionsWhileItWaitsForASim)
 {
-    const std::string man = std::regex_replace(Kivctl("print-man-page").out, std::regex(R"(\\([-:]))"), "$1");
-    const std::string general = Kivctl("--help").out, page = Contents(KIV_DOCS "/kivctl.md");
-    const char* const inHelp = "(?:\n  |,)(--?[a-z-]+)";
-    const Words everywhere = All(inHelp, general);
-    EXPECT_THAT(everywhere, testing::Contains("--json"));
-    std::vector<std::string> verbs{""};
-    for (size_t i = 0; i < verbs.size(); ++i)
-    {
-        const std::string verb = verbs[i], help = Kivctl(verb + " --help").out;
-        Words words = All("\n  ([a-z]+)  ", help);
-        for (const std::string& name : words)
-            verbs.push_back(verb + (verb.empty() ? "" : " ") + name);
-        words.merge(All(inHelp, help));
-        words.insert(everywhere.begin(), everywhere.end());
-        EXPECT_THAT(All("(.+)\n", Complete(verb)), testing::IsSupersetOf(words)) << verb;
-
-        const std::string below = man.substr(man.find(verb.empty() ? ".SH OPTIONS" : ".SS \"" + verb + " ["));
-        Words described = All(R"((?:\\fB|, )(--?[a-z-]+))", below.substr(0, below.find("\n.S")));
-        described.insert({"-h", "--help"}); // told once for all verbs
-        EXPECT_THAT(described, testing::IsSupersetOf(All(inHelp, help))) << verb;
-    }
-    EXPECT_EQ(20U, verbs.size());
-    EXPECT_EQ("subscribers\nmanager\n", Complete("notify on --to"));
-    EXPECT_THAT(Complete("device set"), HasSubstr("\nruntime.flight-mode=\n"));
-
-    const Words codes = All("\n +([0-9]+  .*)", general);
-    EXPECT_EQ(10U, codes.size());
-    for (const std::string& code : codes)
-    {
-        EXPECT_THAT(page, HasSubstr("| " + std::regex_replace(code, std::regex("  "), " | ") + " |\n"));
-        EXPECT_THAT(man, HasSubstr("\\fB" + std::regex_replace(code, std::regex("  "), "\\fR\n")));
-    }
+    Kivctl("device set -p ./slow 'sim0.card-status=2;3' sim1.card-status=1");
+    EXPECT_NE("0:0\n", Kivctl("sim wait -p ./slow -t --fields usable_slot,waited_seconds").out);
 }
 
 TEST_F(KivctlTest, ShowsColoursAndProgressOnATerminal)

@@ -19,7 +19,7 @@ Value ToValue(GVariant* value)
 
 Record CallRecord(const kiv::BusCall& call)
 {
-    Record record{{"event", call.method.name}};
+    Record record{{"event", call.Event()}};
     for (const auto& [name, value] : call.Values())
         record.push_back({name, ToValue(value.get())});
     return record;

@@ -69,10 +69,10 @@ const KeyKind& Guess(const std::string& key)
         return kAlpha2;
     if (key.empty() || !IsAll(std::isdigit, key))
     {
-        std::string text = '"' + key + "\" is no key of a country; one is";
+        std::vector<std::string> shapes;
         for (const KeyKind& kind : kKeyKinds)
-            text += std::string("\n  ") + kind.name + ": " + kind.shape;
-        throw Failure(Exit::Usage, text);
+            shapes.push_back(std::string(kind.name) + ": " + kind.shape);
+        throw Failure(Exit::Usage, '"' + key + "\" is no key of a country; one is", shapes);
     }
     if (key.size() != 3 || !IsKnownMcc(key))
         return kCalling;

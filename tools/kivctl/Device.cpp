@@ -35,13 +35,6 @@ Field ReadText(const char* name, const char* key, int (DASystem::*read)(char**))
     return ReadText(name, key, [read](char** text) { return (DASystem::GetInstance()->*read)(text); });
 }
 
-Field Masked(Field field, Identifiers identifiers)
-{
-    if (auto* text = std::get_if<std::string>(&field.value))
-        *text = Mask(*text, 0, 4, identifiers);
-    return field;
-}
-
 /// The device unique ID as the library answers; the text is the owner's, for all that its type says.
 struct DeviceId
 {
@@ -75,7 +68,7 @@ Field Imei(Identifiers identifiers)
 {
     Field field = ReadText("imei", "", &DASystem::GetIMEI);
     if (field.value != Value(ImeiFallback()))
-        return Masked(field, identifiers);
+        return Masked(std::move(field), 0, 4, identifiers);
     field.note = "no modem answered; derived from the UTC offset";
     return field;
 }
@@ -138,8 +131,8 @@ Exit ShowDevice(const DeviceOptions& options, const Command& command)
         ReadText("model", "device.model-name", &DASystem::GetModelName),
         ReadText("platform", "device.platform-name", &DASystem::GetPlatformName),
         ReadText("platform_version", "device.platform-version", &DASystem::GetSWVersion),
-        Masked(ReadText("platform_device_id", "device.tizen-id", &DASystem::GetTizenIdN), command.identifiers),
-        Masked(Serial(), command.identifiers),
+        Masked(ReadText("platform_device_id", "device.tizen-id", &DASystem::GetTizenIdN), 0, 4, command.identifiers),
+        Masked(Serial(), 0, 4, command.identifiers),
         Imei(command.identifiers),
         ReadText("sales_code", "device.sales-code", salesCode),
         Language("language", LanguageCode::Plain),

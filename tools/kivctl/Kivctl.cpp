@@ -1,10 +1,12 @@
 #include "Kivctl.h"
 
+#include "Layout.h"
 #include "Nearest.h"
 
 #include <DeviceControl.h>
 #include <ResultCode.h>
 #include <SourceControl.h>
+#include <Visible.h>
 
 #include <unistd.h>
 
@@ -48,10 +50,7 @@ void RequireSuccess(int code, const std::vector<std::string>& log)
     if (code == KIV_RESULT_SUCCESS)
         return;
     const CodeMeaning meaning = Find(code);
-    std::string text = std::string(meaning.meaning) + "; " + meaning.remedy;
-    for (const std::string& line : log)
-        text += "\n  " + line;
-    throw Failure(meaning.exit, text);
+    throw Failure(meaning.exit, std::string(meaning.meaning) + "; " + meaning.remedy, log);
 }
 
 std::string MeaningOf(int code)
@@ -101,7 +100,14 @@ bool IsHost(const std::string& device)
     return device == kiv::platform::HostProfile().name;
 }
 
-void Note(const std::string& text)
+void Note(const std::string& text, const std::vector<std::string>& details)
 {
-    std::fprintf(stderr, "kivctl: %s\n", text.c_str());
+    const auto print = [width = TerminalWidth(STDERR_FILENO)](const std::string& line, size_t indent)
+    {
+        for (const std::string& piece : Wrapped(line, width, indent))
+            std::fprintf(stderr, "%s\n", piece.c_str());
+    };
+    print("kivctl: " + kiv::platform::Visible(text), 2);
+    for (const std::string& detail : details)
+        print("  " + kiv::platform::Visible(detail), 4);
 }

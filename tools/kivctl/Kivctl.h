@@ -20,6 +20,7 @@ enum class Exit : int
     Refused = 4,
     NoService = 5,
     NoStore = 6,
+    NotWritten = 7,
     NoBus = 8,
     BusTimedOut = 9,
     BadDevice = 10
@@ -40,6 +41,7 @@ inline constexpr ExitMeaning kExitMeanings[] = {
     {Exit::Refused, "the library refuses an argument"},
     {Exit::NoService, "the service can not be addressed"},
     {Exit::NoStore, "the subscriber store can not be used"},
+    {Exit::NotWritten, "the output cannot be written"},
     {Exit::NoBus, "the system bus can not be reached"},
     {Exit::BusTimedOut, "reaching the system bus timed out"},
     {Exit::BadDevice, "the device file is wrong"},
@@ -60,13 +62,17 @@ inline constexpr Variable kEnvironment[] = {
     {"NO_COLOR", "when not empty, no colour on a terminal either"},
 };
 
-/// What ends a verb early: the exit code, and a text that says what was wrong and what would be right.
+/// What ends a verb early: the exit code, and a text that says what was wrong and what would be right, perhaps with more lines.
 class Failure : public std::runtime_error
 {
 public:
-    Failure(Exit code, const std::string& text) : std::runtime_error(text), exit(code) {}
+    Failure(Exit code, const std::string& text, std::vector<std::string> moreLines = {})
+        : std::runtime_error(text), exit(code), details(std::move(moreLines))
+    {
+    }
 
     const Exit exit;
+    const std::vector<std::string> details;
 };
 
 /// Whether a verb asks the device, which has to be in order then.
@@ -76,13 +82,21 @@ enum class DeviceUse
     Leaves
 };
 
+/// What a verb prints: records that a query returns, of which the command line may choose fields, or what happens.
+enum class Prints
+{
+    Records,
+    Events
+};
+
 /// What the command line asks for.
 struct Command
 {
-    Form form = Form::Text;
+    Form form;
     Identifiers identifiers = Identifiers::Masked;
     std::string profile; ///< name or file of the device; empty for that of the environment
     DeviceUse deviceUse = DeviceUse::Asks;
+    Prints prints = Prints::Records;
     std::function<Exit()> verb; ///< may throw Failure, kiv::BusError
 };
 
@@ -137,7 +151,7 @@ std::string WordFor(const Word (&words)[N], int value)
 /// Whether `device` names the machine itself.
 bool IsHost(const std::string& device);
 
-/// A diagnostic line on standard error.
-void Note(const std::string& text);
+/// A diagnostic on standard error: one line, and one more for each detail. Line ends and control characters in them are escaped.
+void Note(const std::string& text, const std::vector<std::string>& details = {});
 
 #endif

@@ -11,6 +11,7 @@ struct OptionManual
     std::string value;              ///< what stands behind it; empty for a flag
     std::vector<std::string> words; ///< what the value may be, where that is a choice of words
     std::string help;
+    bool isRepeated = false; ///< there may be several values
 };
 
 /// A verb, or the program, with the verbs below it.
@@ -25,8 +26,5 @@ struct VerbManual
 
 /// kivctl(1), in man's macros.
 std::string ManPage(const VerbManual& program);
-
-/// The completion of kivctl's command line for bash.
-std::string BashCompletion(const VerbManual& program);
 
 #endif

@@ -1,5 +1,7 @@
+#include "Deadline.h"
 #include "LibraryLog.h"
 #include "Progress.h"
+#include "StaleRecord.h"
 #include "Verbs.h"
 
 #include <DADBusManager.h>
@@ -13,10 +15,13 @@
 namespace
 {
 
+/// The types by name; a kind of event is the name of what most of its notifications say.
 const std::map<std::string, _KIV_NOTI_TYPE_E> kTypes = {
+    {"auth", KIV_NOTI_TYPE_AUTH_SUCCESS},
     {"auth-success", KIV_NOTI_TYPE_AUTH_SUCCESS},
     {"auth-fail", KIV_NOTI_TYPE_AUTH_FAIL},
     {"on", KIV_NOTI_TYPE_STATUS_ON},
+    {"status", KIV_NOTI_TYPE_STATUS_ON},
     {"off", KIV_NOTI_TYPE_STATUS_OFF},
     {"policy", KIV_NOTI_TYPE_POLICY},
     {"activated", KIV_NOTI_TYPE_ACTIVATED},
@@ -26,7 +31,22 @@ const std::map<std::string, _KIV_NOTI_TYPE_E> kTypes = {
 
 bool IsSwitch(const std::string& type)
 {
-    return type == "on" || type == "off";
+    return type == "on" || type == "off" || type == "status";
+}
+
+/// The subscriptions that a type goes to: kind, and key of those that are not by service.
+struct Audience
+{
+    const char* kind;
+    std::string key;
+};
+
+Audience AudienceOf(const NotifyOptions& options)
+{
+    const std::string& type = options.types.front();
+    if (IsSwitch(type) || type == "policy")
+        return {type == "policy" ? "policy" : "status", std::to_string(options.services.front())};
+    return {type.rfind("auth", 0) == 0 ? "auth" : type == "number-changed" ? "number_changed" : "activated", "all"};
 }
 
 bool TakesTexts(const std::string& type)
@@ -41,7 +61,7 @@ void Require(bool holds, const char* text)
 }
 
 /// What the options of one line must have to do with each other.
-void Check(const NotifyOptions& options)
+void CheckOptions(const NotifyOptions& options)
 {
     const std::string& first = options.types.front();
     const bool areSwitches = std::all_of(options.types.begin(), options.types.end(), IsSwitch);
@@ -87,6 +107,20 @@ private:
     std::vector<std::string> refusals_;
 };
 
+bool IsClosed(const std::string& trouble)
+{
+    return trouble.find("onnection is closed") != trouble.npos;
+}
+
+/// Why there was no delivery; a connection that was closed at the deadline is told as what it means.
+std::string Explained(const Delivery& delivery, const NotifyOptions& options, bool wasMissed)
+{
+    if (wasMissed && IsClosed(delivery.trouble))
+        return "no answer in time";
+    const Audience audience = AudienceOf(options);
+    return DeliveryTrouble(delivery.trouble, audience.kind, audience.key, delivery.busName);
+}
+
 /// Sends the notifications through the facade. @return its result code
 int SendToSubscribers(const NotifyOptions& options, std::string imsi, const std::array<const char*, 4>& texts)
 {
@@ -99,12 +133,14 @@ int SendToSubscribers(const NotifyOptions& options, std::string imsi, const std:
     std::vector<int> services = options.services;
     std::vector<std::string> words = options.types;
     std::vector<char*> statuses(words.size());
+    std::replace(words.begin(), words.end(), std::string("status"), std::string("on"));
     std::transform(words.begin(), words.end(), statuses.begin(), [](std::string& word) { return word.data(); });
     return system->SendMultiOnOffNotiToServiceManager(
         imsi.c_str(), static_cast<int>(statuses.size()), services.data(), statuses.data());
 }
 
-Exit TellSubscribers(const NotifyOptions& options, const std::string& imsi, const std::array<const char*, 4>& texts, Form form)
+Exit TellSubscribers(
+    const NotifyOptions& options, const std::string& imsi, const std::array<const char*, 4>& texts, const Form& form)
 {
     Walk walk;
     const Progress progress;
@@ -121,7 +157,9 @@ Exit TellSubscribers(const NotifyOptions& options, const std::string& imsi, cons
     g_autoptr(GDBusConnection) connection = DADBusManager::GetInstance()->InitDbusConnection(&code);
     RequireSuccess(connection ? KIV_RESULT_SUCCESS : code, log.Errors());
 
+    Deadline deadline(connection, options.timeout);
     code = SendToSubscribers(options, imsi, texts);
+    const bool wasMissed = deadline.WasMissed();
     progress.Show("");
     log.RequireStore();
     RequireSuccess(code == KIV_RESULT_SUCCESS && !walk.Refusals().empty() ? KIV_RESULT_INVALID_ARGUMENT : code, walk.Refusals());
@@ -132,20 +170,29 @@ Exit TellSubscribers(const NotifyOptions& options, const std::string& imsi, cons
         if (delivery.trouble.empty())
             ++delivered;
         else
-            Note("not delivered to " + delivery.busName + ": " + delivery.trouble);
+            Note("not delivered to " + delivery.busName + ": " + Explained(delivery, options, wasMissed));
     }
     const auto subscribers = static_cast<std::int64_t>(walk.Deliveries().size());
     PrintLine({{"event", "sent"}, {"subscribers", subscribers}, {"delivered", delivered}}, form);
     if (subscribers == 0)
         Note("nobody has subscribed to that (kivctl subscribers list)");
+    if (wasMissed && delivered < subscribers)
+        throw Failure(Exit::TimeUp, "the time is up");
     return subscribers > 0 && delivered == subscribers ? Exit::Done : Exit::No;
 }
 
-Exit TellManager(const NotifyOptions& options, const std::string& imsi, const std::array<const char*, 4>& texts, Form form)
+Exit TellManager(const NotifyOptions& options, const std::string& imsi, const std::array<const char*, 4>& texts, const Form& form)
 {
     const LibraryLog log;
-    const int code = DADBusManager::GetInstance()->SendNotiToServiceManager(kTypes.at(options.types.front()), imsi.c_str(),
+    int code = 0;
+    g_autoptr(GDBusConnection) connection = DADBusManager::GetInstance()->InitDbusConnection(&code);
+    RequireSuccess(connection != nullptr ? 0 : code, log.Errors());
+
+    Deadline deadline(connection, options.timeout);
+    code = DADBusManager::GetInstance()->SendNotiToServiceManager(kTypes.at(options.types.front()), imsi.c_str(),
         options.services.empty() ? 0 : options.services.front(), texts[0], texts[1], texts[2], texts[3]);
+    if (deadline.WasMissed() && code != 0)
+        throw Failure(Exit::TimeUp, "the service manager did not answer in time");
     RequireSuccess(code, log.Errors());
     PrintLine({{"event", "sent"}, {"delivered", std::int64_t{1}}}, form);
     return Exit::Done;
@@ -175,7 +222,7 @@ std::vector<std::string> NotificationTypes()
 
 Exit Notify(const NotifyOptions& options, const Command& command)
 {
-    Check(options);
+    CheckOptions(options);
     std::array<const char*, 4> texts{};
     std::transform(options.texts.begin(), options.texts.end(), texts.begin(), [](const std::string& text) { return text.c_str(); });
     const auto tell = options.to == "manager" ? TellManager : TellSubscribers;

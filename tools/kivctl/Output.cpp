@@ -1,16 +1,21 @@
 #include "Output.h"
 
+#include "Kivctl.h"
+#include "Layout.h"
+#include "Nearest.h"
+
+#include <Visible.h>
 #include <glib.h>
 #include <nlohmann/json.hpp>
 
-#include <sys/ioctl.h>
 #include <unistd.h>
 
 #include <algorithm>
+#include <atomic>
+#include <cerrno>
 #include <cstdio>
 #include <cstdlib>
 #include <cstring>
-#include <limits>
 #include <numeric>
 #include <type_traits>
 #include <utility>
@@ -19,6 +24,7 @@ namespace
 {
 
 using Json = nlohmann::ordered_json;
+using kiv::platform::Visible;
 
 Json ToJson(const Value& value)
 {
@@ -40,7 +46,9 @@ Json ToJson(const Record& record)
     for (const Field& field : record)
     {
         object[field.name] = ToJson(field.value);
-        if (!field.note.empty())
+        if (field.isMasked)
+            notes[field.name] = "masked; --show-ids shows all of it";
+        else if (!field.note.empty())
             notes[field.name] = field.note;
     }
     if (!notes.empty())
@@ -48,10 +56,12 @@ Json ToJson(const Record& record)
     return object;
 }
 
-/// JSON is UTF-8; what the platform gives may be anything.
+/// JSON is UTF-8, and the values may be anything. What no terminal should see raw is escaped, and the rest with it.
 std::string Dump(const Json& json, int indent)
 {
-    return json.dump(indent, ' ', false, Json::error_handler_t::replace);
+    const std::string line = json.dump(-1, ' ', false, Json::error_handler_t::replace);
+    const bool isPlain = Visible(line) == line;
+    return json.dump(indent, ' ', !isPlain, Json::error_handler_t::replace);
 }
 
 std::string Label(std::string name)
@@ -60,32 +70,52 @@ std::string Label(std::string name)
     return name;
 }
 
+/// A value in words, empty where it holds nothing.
 std::string ToText(const Value& value)
 {
     if (const auto* text = std::get_if<std::string>(&value))
-        return text->empty() ? "(empty)" : *text;
+        return *text;
     if (const auto* yes = std::get_if<bool>(&value))
         return *yes ? "yes" : "no";
     if (const auto* list = std::get_if<std::vector<std::string>>(&value))
-    {
-        std::string joined;
-        for (const std::string& item : *list)
-            joined += (joined.empty() ? "" : ",") + item;
-        return joined.empty() ? "none" : joined;
-    }
+        return Joined(*list, ",");
     if (const auto* number = std::get_if<double>(&value))
     {
         g_autofree char* text = g_strdup_printf("%g", *number);
         return text;
     }
-    return Dump(ToJson(value), -1);
+    if (const auto* number = std::get_if<std::int64_t>(&value))
+        return std::to_string(*number);
+    return "";
 }
 
 std::string CellText(const Field& field)
 {
     if (std::holds_alternative<std::monostate>(field.value))
-        return field.note.empty() ? "-" : "(" + field.note + ")";
-    return ToText(field.value) + (field.note.empty() ? "" : " (" + field.note + ")");
+        return field.note.empty() ? "-" : Visible("(" + field.note + ")");
+    const std::string text = ToText(field.value);
+    const bool isList = std::holds_alternative<std::vector<std::string>>(field.value);
+    return Visible((!text.empty() ? text : isList ? "none" : "(empty)") + (field.note.empty() ? "" : " (" + field.note + ")"));
+}
+
+std::string TerseText(const Field& field)
+{
+    std::string text;
+    for (const char letter : ToText(field.value))
+    {
+        if (letter == ':' || letter == '\\')
+            text += '\\';
+        text += letter;
+    }
+    return Visible(text);
+}
+
+std::string TerseLine(const Record& record)
+{
+    std::string line;
+    for (const Field& field : record)
+        line += (&field == &record.front() ? "" : ":") + TerseText(field);
+    return line + '\n';
 }
 
 constexpr char kBold[] = "\033[1m";
@@ -101,48 +131,31 @@ const char* Style(const Field& field)
     return std::holds_alternative<std::monostate>(field.value) ? kFaint : "";
 }
 
-bool UsesColour()
+bool IsColourTerminal()
 {
     const char* const refusal = std::getenv("NO_COLOR");
     const char* const terminal = std::getenv("TERM");
-    return isatty(STDOUT_FILENO) == 1 && !(refusal && *refusal) && terminal && std::strcmp(terminal, "dumb") != 0;
+    return isatty(STDOUT_FILENO) == 1 && (refusal == nullptr || *refusal == '\0') && terminal != nullptr &&
+           std::strcmp(terminal, "dumb") != 0;
 }
 
-std::string Painted(const std::string& text, const char* style)
+std::string Painted(const std::string& text, const char* style, const Form& form)
 {
-    static const bool usesColour = UsesColour();
-    return usesColour && *style ? style + text + "\033[0m" : text;
-}
-
-/// Characters, not bytes; what is no UTF-8 counts by its bytes.
-size_t Width(const std::string& text)
-{
-    return g_utf8_validate(text.c_str(), -1, nullptr) ? static_cast<size_t>(g_utf8_strlen(text.c_str(), -1)) : text.size();
-}
-
-std::string Padded(const std::string& text, size_t width)
-{
-    return text + std::string(width - std::min(width, Width(text)), ' ');
-}
-
-/// Columns of the terminal that standard output is; more than any line has if it is none.
-size_t TerminalWidth()
-{
-    winsize size{};
-    const bool isTerminal = ioctl(STDOUT_FILENO, TIOCGWINSZ, &size) == 0 && size.ws_col > 0;
-    return isTerminal ? size.ws_col : std::numeric_limits<size_t>::max();
+    static const bool isColourTerminal = IsColourTerminal();
+    const bool usesColour = form.colour == Form::Colour::Auto ? isColourTerminal : form.colour == Form::Colour::Always;
+    return usesColour && *style != '\0' && !text.empty() ? style + text + "\033[0m" : text;
 }
 
 /// The value in a line of name=value: texts quoted and escaped, so that none breaks the line.
 std::string LineText(const Value& value)
 {
     const auto* text = std::get_if<std::string>(&value);
-    if (!text)
-        return ToText(value);
+    if (text == nullptr)
+        return Visible(ToText(value));
     g_autofree char* valid = g_utf8_make_valid(text->c_str(), -1);
     g_autoptr(GVariant) variant = g_variant_ref_sink(g_variant_new_string(valid));
     g_autofree char* quoted = g_variant_print(variant, FALSE);
-    return quoted;
+    return Visible(quoted);
 }
 
 struct Cell
@@ -165,9 +178,10 @@ std::vector<size_t> ColumnWidths(const Cells& rows)
 
 constexpr size_t kGap = 2; ///< between two columns
 
-bool Fits(const std::vector<size_t>& widths)
+bool Fits(const Cells& rows, size_t width)
 {
-    return std::accumulate(widths.begin(), widths.end(), kGap * (widths.size() - 1)) <= TerminalWidth();
+    const std::vector<size_t> widths = ColumnWidths(rows);
+    return std::accumulate(widths.begin(), widths.end(), kGap * (widths.size() - 1)) <= width;
 }
 
 Cells Transposed(const Cells& rows)
@@ -181,12 +195,66 @@ Cells Transposed(const Cells& rows)
     return columns;
 }
 
-void PrintRow(const std::vector<Cell>& cells, const std::vector<size_t>& widths)
+void PrintRows(const Cells& rows, const Form& form)
 {
-    std::string line;
-    for (size_t i = 0; i < cells.size(); ++i)
-        line += Painted(i + 1 == cells.size() ? cells[i].text : Padded(cells[i].text, widths[i] + kGap), cells[i].style);
-    std::puts(line.c_str());
+    const std::vector<size_t> widths = ColumnWidths(rows);
+    for (const auto& row : rows)
+    {
+        std::string line;
+        for (size_t i = 0; i < row.size(); ++i)
+            line += Painted(i + 1 == row.size() ? row[i].text : Padded(row[i].text, widths[i] + kGap), row[i].style, form);
+        Write(line + '\n');
+    }
+}
+
+/// A field per line, as wide as the terminal.
+void PrintFields(const Record& record, const Form& form)
+{
+    size_t indent = 0;
+    for (const Field& field : record)
+        indent = std::max(indent, field.name.size() + kGap);
+    for (const Field& field : record)
+    {
+        const std::string text = Padded(Label(field.name), indent) + CellText(field);
+        size_t begin = indent; // of the value in a line
+        for (const std::string& line : WrappedBehindHeading(text, TerminalWidth(STDOUT_FILENO), indent))
+        {
+            begin = std::min(begin, line.size());
+            Write(line.substr(0, begin) + Painted(line.substr(begin), Style(field), form) + '\n');
+            begin = 0;
+        }
+    }
+}
+
+/// The fields of a record that the form asks for.
+Record Chosen(const Record& record, const Form& form)
+{
+    if (form.fields.empty())
+        return record;
+    std::vector<std::string> known;
+    for (const Field& field : record)
+        known.push_back(field.name);
+    Record chosen;
+    for (const std::string& name : form.fields)
+    {
+        const auto found = std::find(known.begin(), known.end(), name);
+        if (found == known.end())
+        {
+            throw Failure(Exit::Usage,
+                "there is no field \"" + name + '"' + DidYouMean(name, known) + "; the fields are " + Joined(known, ", "));
+        }
+        chosen.push_back(record[static_cast<size_t>(found - known.begin())]);
+    }
+    return chosen;
+}
+
+std::atomic<int> writeError{0};
+
+void NoteWriteError(bool isWritten)
+{
+    int none = 0;
+    if (!isWritten)
+        writeError.compare_exchange_strong(none, errno);
 }
 
 } // namespace
@@ -201,68 +269,109 @@ Field TextOr(std::string name, const char* text, std::string reason)
     return text ? Field{std::move(name), std::string(text)} : Missing(std::move(name), std::move(reason));
 }
 
-void Print(const Record& record, Form form)
+void RequireFields(const Record& record, const Form& form)
 {
-    if (form == Form::Json)
-    {
-        std::puts(Dump(ToJson(record), 2).c_str());
-        return;
-    }
-    size_t width = 0;
-    for (const Field& field : record)
-        width = std::max(width, field.name.size());
-    for (const Field& field : record)
-        std::puts((Padded(Label(field.name), width + 2) + Painted(CellText(field), Style(field))).c_str());
+    Chosen(record, form);
 }
 
-void PrintTable(const std::vector<Record>& records, Form form)
+void Print(const Record& record, const Form& form)
 {
-    if (form == Form::Json)
+    const Record chosen = Chosen(record, form);
+    if (form.notation == Form::Notation::Json)
+        Write(Dump(ToJson(chosen), 2) + '\n');
+    else if (form.notation == Form::Notation::Terse)
+        Write(TerseLine(chosen));
+    else
+        PrintFields(chosen, form);
+}
+
+void PrintTable(const std::vector<Record>& records, const Form& form)
+{
+    std::vector<Record> chosen;
+    for (const Record& record : records)
+        chosen.push_back(Chosen(record, form));
+    if (form.notation == Form::Notation::Json)
     {
         Json array = Json::array();
-        for (const Record& record : records)
+        for (const Record& record : chosen)
             array.push_back(ToJson(record));
-        std::puts(Dump(array, 2).c_str());
+        return Write(Dump(array, 2) + '\n');
+    }
+    if (form.notation == Form::Notation::Terse)
+    {
+        for (const Record& record : chosen)
+            Write(TerseLine(record));
         return;
     }
-    if (records.empty())
+    if (chosen.empty())
         return;
 
     Cells rows(1);
-    for (const Field& field : records.front())
+    for (const Field& field : chosen.front())
         rows.front().push_back({Label(field.name), kBold});
-    for (const Record& record : records)
+    for (const Record& record : chosen)
     {
         rows.emplace_back();
         for (const Field& field : record)
             rows.back().push_back({CellText(field), Style(field)});
     }
-    if (!Fits(ColumnWidths(rows)) && Fits(ColumnWidths(Transposed(rows))))
-        rows = Transposed(rows);
-    const std::vector<size_t> widths = ColumnWidths(rows);
-    for (const auto& row : rows)
-        PrintRow(row, widths);
+    constexpr size_t kTableWidth = 60; // columns of the narrowest terminal that shows tables
+    const size_t width = TerminalWidth(STDOUT_FILENO);
+    if (width >= kTableWidth && Fits(rows, width))
+        return PrintRows(rows, form);
+    if (width >= kTableWidth && Fits(Transposed(rows), width))
+        return PrintRows(Transposed(rows), form);
+    for (const Record& record : chosen)
+    {
+        if (&record != &chosen.front())
+            Write("\n");
+        PrintFields(record, form);
+    }
 }
 
-void PrintLine(const Record& record, Form form)
+void PrintLine(const Record& record, const Form& form)
 {
     std::string line;
-    if (form == Form::Json)
+    if (form.notation == Form::Notation::Json)
         line = Dump(ToJson(record), -1);
     else
         for (const Field& field : record)
             line += line.empty() ? CellText(field) : " " + field.name + "=" + LineText(field.value);
-    std::puts(line.c_str());
-    if (std::fflush(stdout) != 0)
-        g_main_context_wakeup(nullptr); // whoever waits for what is printed here sees that nobody reads it any more
+    Write(line + '\n');
+    if (WriteError() != 0)
+        g_main_context_wakeup(nullptr); // whoever waits for what is printed here sees that it cannot be
 }
 
-std::string Mask(std::string text, size_t first, size_t last, Identifiers identifiers)
+void Write(const std::string& text)
 {
-    if (identifiers == Identifiers::Shown)
-        return text;
+    NoteWriteError(std::fputs(text.c_str(), stdout) >= 0);
+}
+
+int WriteError()
+{
+    NoteWriteError(std::fflush(stdout) == 0);
+    return writeError;
+}
+
+void EndStream()
+{
+    int readerGone = EPIPE;
+    writeError.compare_exchange_strong(readerGone, 0);
+}
+
+std::string Masked(std::string text, size_t first, size_t last)
+{
     if (first + last >= text.size())
         first = last = 0;
     std::fill(text.begin() + static_cast<std::ptrdiff_t>(first), text.end() - static_cast<std::ptrdiff_t>(last), '*');
     return text;
+}
+
+Field Masked(Field field, size_t first, size_t last, Identifiers identifiers)
+{
+    auto* const text = std::get_if<std::string>(&field.value);
+    field.isMasked = text != nullptr && identifiers == Identifiers::Masked;
+    if (field.isMasked)
+        *text = Masked(*text, first, last);
+    return field;
 }

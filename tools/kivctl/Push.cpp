@@ -1,5 +1,6 @@
 #include "LibraryLog.h"
 #include "Progress.h"
+#include "StaleRecord.h"
 #include "Verbs.h"
 
 #include <DADBusManager.h>
@@ -83,7 +84,7 @@ Exit Push(const PushOptions& options, const Command& command)
 
     const size_t failed = deliveries.Troubles().size();
     for (const std::string& trouble : deliveries.Troubles())
-        Note("a delivery failed: " + trouble);
+        Note("a delivery failed: " + DeliveryTrouble(trouble, "push", options.service, ""));
     PrintLine({{"event", "sent"}, {"subscribers", static_cast<std::int64_t>(deliveries.Started())},
                   {"delivered", static_cast<std::int64_t>(deliveries.Started() - failed)}},
         command.form);

@@ -11,7 +11,9 @@ Exit RunServices(const ServicesOptions& options, const Command& command)
     const kiv::BoardDaemon board(options.serial.empty() ? kiv::BoardDaemon::DeviceSerial() : options.serial);
     const kiv::ServiceManager manager([form = command.form](const kiv::BusCall& call) { PrintLine(CallRecord(call), form); });
     PrintLine({{"event", "ready"}, {"bus_names", std::vector{board.Name(), manager.Name()}}}, command.form);
-    if (signals.IterateWhile([&] { return board.IsConnected() && manager.IsConnected(); }))
+    const bool wasStopped = signals.IterateWhile([&] { return board.IsConnected() && manager.IsConnected(); });
+    EndStream();
+    if (wasStopped)
         return Exit::Done;
     throw Failure(Exit::NoBus, "the bus went away");
 }

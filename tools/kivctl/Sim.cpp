@@ -112,14 +112,14 @@ Field Country(const Slot& slot)
 Field Imsi(const Slot& slot)
 {
     const LibraryText imsi = Read(slot, &DASimManager::GetIMSIFromSim);
-    return imsi ? Held(Mask(imsi.get(), 5, 0, slot.identifiers)) : GoneFromCard(slot, "mcc", kNoAnswer);
+    return imsi ? Masked(Held(std::string(imsi.get())), 5, 0, slot.identifiers) : GoneFromCard(slot, "mcc", kNoAnswer);
 }
 
 Field Number(const Slot& slot)
 {
     const LibraryText number = Read(slot, &DASimManager::GetPhoneNumberFromSim);
     if (number)
-        return Held(Mask(number.get(), 0, 2, slot.identifiers));
+        return Masked(Held(std::string(number.get())), 0, 2, slot.identifiers);
     return GoneFromCard(slot, "number", "none given");
 }
 
@@ -128,9 +128,12 @@ Field Service(const Slot& slot)
     static constexpr Word kWords[] = {{0, "unknown"}, {1, "none"}, {2, "emergency only"}, {3, "searching"}};
     if (slot.serviceType < 0)
         return Gone(kNoAnswer);
-    if (slot.serviceType > 3)
-        return {"", "in service", "type " + std::to_string(slot.serviceType)};
-    return Held(WordFor(kWords, slot.serviceType));
+    return Held(slot.serviceType > 3 ? "in service" : WordFor(kWords, slot.serviceType));
+}
+
+Field ServiceType(const Slot& slot)
+{
+    return slot.serviceType < 0 ? Gone(kNoAnswer) : Held(std::int64_t{slot.serviceType});
 }
 
 Field Roaming(const Slot& slot)
@@ -187,6 +190,7 @@ const SlotField kFields[] = {
     {"imsi", Imsi},
     {"number", Number},
     {"service", Service},
+    {"service_type", ServiceType},
     {"roaming", Roaming},
     {"sms", Sms},
     {"default_for", DefaultFor},

@@ -31,6 +31,19 @@ std::string CardStatusWord(TelSimCardStatus_t status)
     return WordFor(kWords, status);
 }
 
+CardAnswer AskForCard(int slot)
+{
+    constexpr auto kUnread = static_cast<TelSimCardStatus_t>(-1);
+    DASystem* const system = DASystem::GetInstance();
+    TelSimCardStatus_t status = kUnread;
+    const bool isUsable = system->IsAvaliableState(slot, &status);
+    if (status == kUnread)
+        return {slot, false, true, "modem does not answer"};
+    // A card without power is waited for, as the library's own poll does.
+    const bool mayBecomeUsable = system->IsWaittingSimCheck(status) || status == TAPI_SIM_STATUS_CARD_POWEROFF;
+    return {slot, isUsable, mayBecomeUsable, CardStatusWord(status)};
+}
+
 std::vector<std::string> RequireCpNames()
 {
     g_auto(GStrv) names = DASystem::GetInstance()->GetCpNameList();

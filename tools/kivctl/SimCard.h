@@ -9,6 +9,18 @@
 /// A card status in a few words, such as "PIN required".
 std::string CardStatusWord(TelSimCardStatus_t status);
 
+/// The card of one slot, as one question found it.
+struct CardAnswer
+{
+    int slot;
+    bool isUsable;
+    bool mayBecomeUsable;
+    std::string text; ///< card status in words
+};
+
+/// Asks for the card in a slot. Blocks on the modem.
+CardAnswer AskForCard(int slot);
+
 /// CP names of the modems, by slot. Ends the verb when the device has none.
 std::vector<std::string> RequireCpNames();
 

@@ -2,8 +2,6 @@
 #include "SimCard.h"
 #include "Verbs.h"
 
-#include <DASystem.h>
-
 #include <algorithm>
 #include <chrono>
 #include <thread>
@@ -13,32 +11,10 @@ namespace
 
 using Clock = std::chrono::steady_clock;
 
-/// The card of one slot, as one question found it.
-struct Answer
-{
-    int slot;
-    bool isUsable;
-    bool mayBecomeUsable;
-    std::string text;
-};
-
-Answer Ask(int slot)
-{
-    constexpr auto kUnread = static_cast<TelSimCardStatus_t>(-1);
-    DASystem* const system = DASystem::GetInstance();
-    TelSimCardStatus_t status = kUnread;
-    const bool isUsable = system->IsAvaliableState(slot, &status);
-    if (status == kUnread)
-        return {slot, false, true, "modem does not answer"};
-    // A card without power is waited for, as the library's own poll does.
-    const bool mayBecomeUsable = system->IsWaittingSimCheck(status) || status == TAPI_SIM_STATUS_CARD_POWEROFF;
-    return {slot, isUsable, mayBecomeUsable, CardStatusWord(status)};
-}
-
-std::string Tell(const std::vector<Answer>& answers)
+std::string Tell(const std::vector<CardAnswer>& answers)
 {
     std::string text;
-    for (const Answer& answer : answers)
+    for (const CardAnswer& answer : answers)
         text += (text.empty() ? "slot " : "; slot ") + std::to_string(answer.slot) + ": " + answer.text;
     return text;
 }
@@ -54,9 +30,9 @@ Exit WaitForSim(const SimOptions& options, const Command& command)
     const Progress progress;
     for (;;)
     {
-        std::vector<Answer> answers;
-        std::transform(slots.begin(), slots.end(), std::back_inserter(answers), Ask);
-        const auto usable = std::find_if(answers.begin(), answers.end(), [](const Answer& answer) { return answer.isUsable; });
+        std::vector<CardAnswer> answers;
+        std::transform(slots.begin(), slots.end(), std::back_inserter(answers), AskForCard);
+        const auto usable = std::find_if(answers.begin(), answers.end(), [](const CardAnswer& answer) { return answer.isUsable; });
         if (usable != answers.end())
         {
             progress.Show("");
@@ -64,7 +40,7 @@ Exit WaitForSim(const SimOptions& options, const Command& command)
                 command.form);
             return Exit::Done;
         }
-        if (std::none_of(answers.begin(), answers.end(), [](const Answer& answer) { return answer.mayBecomeUsable; }))
+        if (std::none_of(answers.begin(), answers.end(), [](const CardAnswer& answer) { return answer.mayBecomeUsable; }))
             throw Failure(Exit::No, "waiting makes no SIM usable: " + Tell(answers));
         if (options.timeout && waited() >= *options.timeout)
             throw Failure(Exit::TimeUp, "no SIM is usable after " + seconds() + ": " + Tell(answers));

@@ -124,7 +124,9 @@ Exit Subscribe(const SubscribeOptions& options, const Command& command)
         subscribed.back().append(":").append(key);
     }
     PrintLine({{"event", "ready"}, {"bus_name", party.Name()}, {"subscribed", subscribed}}, command.form);
-    if (signals.IterateWhile([&party] { return party.IsConnected(); }))
+    const bool wasStopped = signals.IterateWhile([&party] { return party.IsConnected(); });
+    EndStream();
+    if (wasStopped)
         return Exit::Done;
     throw Failure(Exit::NoBus, "the bus went away");
 }

@@ -1,12 +1,32 @@
 #include "StoreOutcome.h"
 #include "Verbs.h"
 
+#include <algorithm>
+#include <iterator>
+
 namespace
 {
 
 DASubscription Subscription(const SubscriptionOptions& options)
 {
     return {options.kind, options.key, {options.busName, options.objectPath, options.interface}};
+}
+
+Record ToRecord(const DASubscription& subscription)
+{
+    const _SubscriberInfo& who = subscription.subscriber;
+    return {{"kind", subscription.kind}, {"key", subscription.key}, {"bus_name", who.busname}, {"object_path", who.objectpath},
+        {"interface", who.interface}};
+}
+
+/// Prints what became of a subscription; text has the exit code for that.
+void PrintResult(const char* result, const DASubscription& subscription, const Form& form)
+{
+    if (form.notation != Form::Notation::Json)
+        return;
+    Record record = ToRecord(subscription);
+    record.insert(record.begin(), {"result", result});
+    Print(record, form);
 }
 
 } // namespace
@@ -25,30 +45,27 @@ Exit ListSubscribers(const Command& command)
     std::string reason;
     RequireStored(DASubscriberStore().List(subscriptions, reason), reason);
 
+    RequireFields(ToRecord({}), command.form);
     std::vector<Record> records;
-    for (const DASubscription& subscription : subscriptions)
-    {
-        const _SubscriberInfo& who = subscription.subscriber;
-        records.push_back({{"kind", subscription.kind}, {"key", subscription.key}, {"bus_name", who.busname},
-            {"object_path", who.objectpath}, {"interface", who.interface}});
-    }
+    std::transform(subscriptions.begin(), subscriptions.end(), std::back_inserter(records), ToRecord);
     PrintTable(records, command.form);
     if (records.empty())
         Note("nobody has subscribed to anything in " + DASubscriberStore::Path());
     return Exit::Done;
 }
 
-Exit AddSubscriber(const SubscriptionOptions& options, const Command&)
+Exit AddSubscriber(const SubscriptionOptions& options, const Command& command)
 {
     std::string reason;
     const auto outcome = DASubscriberStore().Add(Subscription(options), reason);
     RequireStored(outcome, reason);
     if (outcome == DASubscriberStore::Outcome::Unchanged)
         Note("was subscribed before");
+    PrintResult(outcome == DASubscriberStore::Outcome::Done ? "added" : "unchanged", Subscription(options), command.form);
     return Exit::Done;
 }
 
-Exit RemoveSubscriber(const SubscriptionOptions& options, const Command&)
+Exit RemoveSubscriber(const SubscriptionOptions& options, const Command& command)
 {
     std::string reason;
     const auto outcome = DASubscriberStore().Remove(Subscription(options), reason);
@@ -56,5 +73,6 @@ Exit RemoveSubscriber(const SubscriptionOptions& options, const Command&)
     if (outcome == DASubscriberStore::Outcome::Unchanged)
         throw Failure(
             Exit::No, "there is no such subscription; all five fields must be those that \"kivctl subscribers list\" shows");
+    PrintResult("removed", Subscription(options), command.form);
     return Exit::Done;
 }

@@ -77,6 +77,7 @@ struct NotifyOptions
     std::string imsi;               ///< empty for that of the first SIM that answers
     std::vector<int> services;
     std::vector<std::string> texts;
+    std::optional<double> timeout; ///< seconds
 };
 std::vector<std::string> NotificationTypes();
 Exit Notify(const NotifyOptions& options, const Command& command);

@@ -1,8 +1,11 @@
+#include "SimCard.h"
 #include "Verbs.h"
 
 #include <DASystem.h>
 #include <StopSignals.h>
+#include <glib.h>
 
+#include <algorithm>
 #include <utility>
 
 namespace
@@ -12,7 +15,7 @@ namespace
 class Printer : public IDAConnectionStateListener
 {
 public:
-    explicit Printer(Form form) : form_(form) {}
+    explicit Printer(Form form) : form_(std::move(form)) {}
 
     void OnWifiDeviceStateChanged(wifi_device_state_e state, void*) override
     {
@@ -38,6 +41,54 @@ private:
     const Form form_;
 };
 
+/// Asks for the card statuses once a second, in the default main context, and prints what changed: the platform does not notify of
+/// it.
+class CardWatch
+{
+public:
+    explicit CardWatch(const Form& form) : form_(form), cards_(Ask()), timer_(g_timeout_add_seconds(1, Look, this)) {}
+    CardWatch(const CardWatch&) = delete;
+    CardWatch& operator=(const CardWatch&) = delete;
+    ~CardWatch() { g_source_remove(timer_); }
+
+private:
+    /// Card statuses by slot; none of a device without modems.
+    static std::vector<std::string> Ask()
+    {
+        g_auto(GStrv) names = DASystem::GetInstance()->GetCpNameList();
+        std::vector<std::string> cards;
+        for (int slot = 0; names != nullptr && names[slot] != nullptr; ++slot)
+            cards.push_back(AskForCard(slot).text);
+        return cards;
+    }
+
+    static gboolean Look(gpointer self)
+    {
+        static_cast<CardWatch*>(self)->PrintChanges();
+        return G_SOURCE_CONTINUE;
+    }
+
+    void PrintChanges()
+    {
+        std::vector<std::string> now = Ask();
+        const auto card = [](const char* name, const std::vector<std::string>& cards, size_t slot) {
+            return slot < cards.size() ? Field{name, cards[slot]} : Missing(name, "no such slot");
+        };
+        for (size_t slot = 0; slot < std::max(cards_.size(), now.size()); ++slot)
+        {
+            Field before = card("old", cards_, slot), after = card("new", now, slot);
+            if (before.value != after.value)
+                PrintLine(
+                    {{"event", "card"}, {"slot", static_cast<std::int64_t>(slot)}, std::move(before), std::move(after)}, form_);
+        }
+        cards_ = std::move(now);
+    }
+
+    const Form& form_;
+    std::vector<std::string> cards_;
+    const guint timer_;
+};
+
 } // namespace
 
 Exit Watch(const Command& command)
@@ -51,7 +102,9 @@ Exit Watch(const Command& command)
     static Printer* const printer = new Printer(command.form);
     kiv::StopSignals signals;
     DASystem::GetInstance()->SetConnectionEventListener(printer, nullptr);
+    const CardWatch cards(command.form);
     PrintLine({{"event", "ready"}}, command.form);
     signals.IterateWhile([] { return true; });
+    EndStream();
     return Exit::Done;
 }

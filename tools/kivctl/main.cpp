@@ -1,6 +1,7 @@
 #include "CommandLine.h"
 
 #include <BusParty.h>
+#include <glib.h>
 
 #include <exception>
 
@@ -18,9 +19,18 @@ Exit Run(int argc, char** argv)
     return command.verb();
 }
 
-Exit Report(Exit exit, const char* text)
+/// The exit code once everything is written.
+Exit Finish(Exit exit)
 {
-    Note(text);
+    const int error = WriteError();
+    if (error == 0)
+        return exit;
+    throw Failure(Exit::NotWritten, std::string("cannot write to standard output: ") + g_strerror(error));
+}
+
+Exit Report(Exit exit, const char* text, const std::vector<std::string>& details = {})
+{
+    Note(text, details);
     return exit;
 }
 
@@ -31,11 +41,11 @@ int main(int argc, char** argv)
     Exit exit = Exit::No;
     try
     {
-        exit = Run(argc, argv);
+        exit = Finish(Run(argc, argv));
     }
     catch (const Failure& failure)
     {
-        exit = Report(failure.exit, failure.what());
+        exit = Report(failure.exit, failure.what(), failure.details);
     }
     catch (const kiv::BusError& error)
     {

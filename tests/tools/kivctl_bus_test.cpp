@@ -1,0 +1,182 @@
+#include "tools/KivctlTest.h"
+
+namespace kiv::test
+{
+namespace
+{
+
+TEST_F(KivctlTest, CarriesEveryNotificationToItsReceivers)
+{
+    const Service services(KIVCTL " services --serial S1");
+    const Service all(KIVCTL " subscribe --name a.all --key 7 --kind policy --kind status --kind auth --kind activated"
+                             " --kind number_changed --push mail");
+    const Service other(KIVCTL " subscribe --kind status --key 8");
+    EXPECT_EQ("device id  S1\n", Kivctl("device id").out);
+
+    const std::pair<std::string, const char*> cases[] = {
+        {"activated", "activated imsi='1' active=1\n"},
+        {"auth", "auth imsi='1' success=1\n"},
+        {"auth-fail", "auth imsi='1' success=0\n"},
+        {"auth-success", "auth imsi='1' success=1\n"},
+        {"deactivated", "activated imsi='1' active=0\n"},
+        {"number-changed --texts w x y z", "number_changed imsi='1' text1='w' text2='x' text3='y' text4='z'\n"},
+        {"number_changed --texts a b c d", "number_changed imsi='1' text1='a' text2='b' text3='c' text4='d'\n"},
+        {"off --service 7", "status imsi='1' service_id=7 status='off'\n"},
+        {"on --service 7", "status imsi='1' service_id=7 status='on'\n"},
+        {"policy --service 7 --texts w x y z",
+            "policy imsi='1' service_id=7 service_status='w' policy_feature='x' policy_version='y' policy_doc_url='z'\n"},
+        {"status --service 7", "status imsi='1' service_id=7 status='on'\n"},
+    };
+    std::string types = "right are";
+    for (const auto& [arguments, call] : cases)
+    {
+        const std::string type = arguments.substr(0, arguments.find(' '));
+        types += type == "number_changed" ? "" : ' ' + type + ','; // another spelling
+        const Outcome told = Kivctl("notify --imsi 1 " + arguments);
+        EXPECT_EQ("sent subscribers=1 delivered=1\n", told.out) << arguments << "\n" << told.err;
+        all.Await(call);
+        const bool isRefused = Kivctl("notify --to manager --imsi 1 " + arguments).exit == 4;
+        EXPECT_EQ(arguments.find("number") == 0, isRefused) << arguments;
+        if (!isRefused)
+            services.Await(call);
+    }
+    types.back() = ';';
+    EXPECT_THAT(Kivctl("notify nothing").err, HasSubstr(types));
+    EXPECT_EQ("sent subscribers=2 delivered=2\n", Kivctl("notify --imsi 1 on off --service 8 --service 7").out);
+    other.Await("status imsi='1' service_id=8 status='on'\n");
+
+    for (const char* what : {"status 7", "push mail"})
+        ASSERT_EQ(0, Kivctl(std::string("subscribers add ") + what + " org.gone.Away /a a.b").exit);
+    for (const std::string arguments :
+        {"notify --imsi 1 on --service 7", "push mail --data '{\"a\":1}' --message 'two words' --time -5000000000"})
+    {
+        const Outcome told = Kivctl(arguments);
+        EXPECT_EQ(1, told.exit) << arguments;
+        EXPECT_EQ("sent subscribers=2 delivered=1\n", told.out) << arguments;
+        const std::string kind = arguments[0] == 'p' ? "push mail" : "status 7";
+        EXPECT_THAT(told.err, HasSubstr("remove its record: kivctl subscribers remove " + kind + " org.gone.Away /a a.b\n"));
+    }
+    all.Await("push service_id='mail' data='{\"a\":1}' message='two words' time=-5000000000\n");
+    Kivctl("push mail --data d --message now");
+    EXPECT_THAT(Steady(all.Out()), testing::ContainsRegex("message='now' time=[0-9]{10}\n")); // in seconds
+}
+
+TEST_F(KivctlTest, ServicesHoldTheirNamesAndSubscriptionsUntilTheyEnd)
+{
+    const std::pair<int, std::string> services[] = {
+        {SIGINT, KIVCTL " subscribe --name a.b --kind auth"}, {SIGTERM, KIV_BOARD_DAEMON}, {SIGHUP, KIV_SERVICE_MANAGER}};
+    for (const auto& [signal, command] : services)
+    {
+        Service service(command);
+        const Outcome second(command);
+        EXPECT_EQ(1, second.exit);
+        EXPECT_THAT(second.err, HasSubstr("is taken"));
+        EXPECT_EQ(0, service.End(signal));
+        EXPECT_EQ("", Kivctl("subscribers list").out);
+    }
+    Service board(KIV_BOARD_DAEMON), client(KIVCTL " subscribe --kind auth");
+    bus.Stop();
+    EXPECT_EQ(1, board.End());
+    EXPECT_EQ(8, client.End());
+}
+
+TEST_F(KivctlTest, InstalledServicesAnswerAndPrintWhatTheyReceive)
+{
+    const Service board(KIV_BOARD_DAEMON " --serial S2"), manager(KIV_SERVICE_MANAGER);
+    EXPECT_EQ("ready bus_names=org.tizen.system.deviced\n", board.Out());
+    EXPECT_EQ("S2\n", Kivctl("device id -t").out);
+    EXPECT_EQ(0, Kivctl("notify activated --imsi \"'1\xe2\x80\xa8\" --to manager").exit);
+    EXPECT_EQ("ready bus_names=org.tizen.servicemanager.service\nactivated imsi=\"'1\\u2028\" active=1\n", manager.Out());
+}
+
+TEST_F(KivctlTest, WaitsForAStuckServiceNoLongerThanAsked)
+{
+    Service board(KIV_BOARD_DAEMON), manager(KIV_SERVICE_MANAGER), client(KIVCTL " subscribe --kind auth --name a.b");
+    for (Service* stuck : {&board, &manager, &client})
+        g_subprocess_send_signal(stuck->process.get(), SIGSTOP);
+    const Program examined(KIVCTL " doctor --fields check,finding"); // whose own time limits are far below GDBus's
+    for (const auto& [receiver, trouble] : std::map<std::string, const char*>{
+             {"subscribers", "kivctl: not delivered to a.b: no answer in time\n"}, {"manager", "did not answer in time"}})
+    {
+        const Outcome told = Kivctl("notify auth --timeout 0.2 --to " + receiver);
+        EXPECT_EQ(3, told.exit) << receiver;
+        EXPECT_THAT(told.err, HasSubstr(trouble));
+    }
+    examined.Await("org.tizen.servicemanager.service does not answer");
+    for (Service* stuck : {&board, &manager, &client})
+        g_subprocess_send_signal(stuck->process.get(), SIGCONT);
+}
+
+TEST_F(KivctlTest, WatchNamesEachChange)
+{
+    Kivctl("device set -p ./watched runtime.flight-mode=false");
+    const Service watch(KIVCTL " watch -p ./watched");
+    const std::pair<const char*, const char*> changes[] = {
+        {"runtime.flight-mode=true", "flight_mode value=yes\n"},
+        {"runtime.packet-data=false", "packet_data value=no\n"},
+        {"runtime.wifi-status=2", "wifi_connected value=yes\n"},
+        {"network.wifi-device=0", "wifi_device value='off'\n"},
+        {"network.wifi-device=1", "wifi_device value='on'\n"},
+        {"network.wifi-connection=-1", "wifi_connection value='failure'\n"},
+        {"network.wifi-connection=1", "wifi_connection value='associating'\n"},
+        {"network.wifi-connection=2", "wifi_connection value='configuring'\n"},
+        {"network.wifi-connection=3", "wifi_connection value='connected'\n"},
+        {"network.wifi-connection=0", "wifi_connection value='disconnected'\n"},
+        {"sim1.card-status=4", "card slot=1 old='ready' new='PIN required'\n"},
+    };
+    for (const auto& [change, line] : changes)
+    {
+        EXPECT_EQ(0, Kivctl(std::string("device set -p ./watched ") + change).exit);
+        watch.Await(line);
+    }
+}
+
+TEST_F(KivctlTest, SubscribesByTheServiceAsItDoesInTheFile)
+{
+    Service service("env KIV_SUBSCRIBERS=" + directory + "/served.db " KIV_SUBSCRIPTION_SERVICE);
+    const std::string file = "env KIV_SUBSCRIBERS=served.db " KIVCTL " subscribers list";
+    {
+        Service client(KIVCTL " subscribe --name a.b --kind auth");
+        EXPECT_EQ("", Kivctl("subscribers list").out);
+        EXPECT_THAT(Outcome(file).out, HasSubstr("a.b"));
+        EXPECT_EQ(0, client.End(SIGINT));
+        EXPECT_EQ("", Outcome(file).out);
+    }
+    const auto compare = [](const std::string& command, int exit)
+    {
+        const Outcome byService = Kivctl(command), inFile = Kivctl(command + " --store served.db");
+        EXPECT_EQ(exit, byService.exit) << command;
+        EXPECT_EQ(exit, inFile.exit) << command;
+        EXPECT_EQ(inFile.err, byService.err);
+    };
+    compare("subscribe --push '' --name a.b", 4);
+    std::ofstream("served.db") << std::string(4096, 'x');
+    compare("subscribe --push a --name a.b", 6);
+}
+
+TEST_F(KivctlTest, TellsAMissingBusFromABrokenStore)
+{
+    std::ofstream("subscribers.db") << std::string(4096, 'x');
+    for (const char* arguments :
+        {"subscribers list", "notify --imsi 1 auth-fail", "push mail --data d --message m", "subscribe --push a"})
+        EXPECT_EQ(6, Kivctl(arguments).exit) << arguments;
+    const Outcome examined = Kivctl("doctor");
+    EXPECT_EQ(1, examined.exit);
+    EXPECT_THAT(Steady(examined.out),
+        AllOf(HasSubstr("bus yes"), HasSubstr("deviced is not on the bus start it: kiv-board-daemon"),
+            testing::ContainsRegex("subscriber store no .*: file is not a database the file is damaged: move it away"),
+            HasSubstr("library yes")));
+    std::filesystem::copy_file(KIV_SYSTEM_LIBRARY, "libkiv_system.so.9.9.9");
+    std::filesystem::create_symlink("libkiv_system.so.9.9.9", "libkiv_system.so.1");
+    EXPECT_THAT(Outcome("env LD_LIBRARY_PATH=. " KIVCTL " doctor").out, HasSubstr("libkiv_system.so.9.9.9 is of version 9.9.9"));
+    bus.Stop();
+    EXPECT_THAT(Steady(Kivctl("doctor --profile nosuch").out), AllOf(HasSubstr("bus no"), HasSubstr("device no")));
+    for (const char* arguments : {"device id", "notify --imsi 1 auth-fail", "notify --imsi 1 auth-fail --to manager",
+             "push mail --data d --message m", "subscribe --push a", "services"})
+        EXPECT_EQ(8, Kivctl(arguments).exit) << arguments;
+    // The library tells a bus that is too slow by the word in the reason, which names an unknown transport.
+    EXPECT_EQ(9, Outcome("env DBUS_SYSTEM_BUS_ADDRESS=Time: " KIVCTL " device id").exit);
+}
+
+} // namespace
+} // namespace kiv::test

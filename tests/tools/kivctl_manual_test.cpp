@@ -1,0 +1,128 @@
+#include "tools/KivctlTest.h"
+
+namespace kiv::test
+{
+namespace
+{
+
+using Words = std::set<std::string>;
+
+/// What the pattern's group holds at every place where the pattern fits.
+Words All(const char* pattern, const std::string& text)
+{
+    const std::regex regex(pattern);
+    return {std::sregex_token_iterator(text.begin(), text.end(), regex, 1), std::sregex_token_iterator()};
+}
+
+/// What a shell is offered, a line each, for the last of those words, which a shell reads.
+std::string Complete(const std::string& words)
+{
+    return Kivctl("complete-words " + words).out;
+}
+
+TEST_F(KivctlTest, PrintsWhatThePagesShow)
+{
+    std::map<std::string, Service> beside; // by what each is to print
+    const std::string pages = Contents(KIV_DOCS "/profiles.md") + Contents(KIV_DOCS "/kivctl.md");
+    g_auto(GStrv) examples = g_strsplit(pages.c_str(), "\n$ kivctl ", -1);
+    EXPECT_LT(42U, g_strv_length(examples));
+    for (char** rest = examples + 1; *rest != nullptr; ++rest)
+    {
+        const std::string text = *rest, example = text.substr(0, text.find("\n```")) + '\n';
+        const std::string arguments = example.substr(0, example.find('\n'));
+        const std::string printed = example.substr(arguments.size() + 1);
+        if (arguments.back() == '&')
+        {
+            beside.try_emplace(printed, KIVCTL " " + arguments.substr(0, arguments.size() - 2));
+            continue;
+        }
+        const Outcome outcome = Kivctl(arguments);
+        const std::string end = outcome.exit ? "(exit code " + std::to_string(outcome.exit) + ")\n" : "";
+        EXPECT_EQ(Steady(printed), Steady(outcome.out + outcome.err + end)) << arguments;
+    }
+    for (const auto& [printed, program] : beside)
+    {
+        program.Await(printed);
+        EXPECT_EQ(printed, program.Out());
+    }
+
+    const Words rows = All("\n(\\| `kivctl [^`]*` \\| (?:object|array) \\| .*) \\|", pages); // of the fields in JSON
+    EXPECT_EQ(15U, rows.size());
+    for (const std::string& row : rows)
+    {
+        const std::string out = Kivctl("--json --profile single " + *All("`kivctl (.*?)`", row).begin()).out;
+        Words names = All("\"(\\w+)\": ?", out);
+        names.erase("notes");
+        EXPECT_EQ(All("`(\\w+)`", row), names) << row;
+        EXPECT_EQ(row.find("| array |") != row.npos, out.front() == '[') << row;
+    }
+}
+
+TEST_F(KivctlTest, PagesAndCompletionListAllThatTheHelpLists)
+{
+    const std::string man = std::regex_replace(Kivctl("print-man-page").out, std::regex(R"(\\([-:]))"), "$1");
+    const std::string general = Kivctl("--help").out, page = Contents(KIV_DOCS "/kivctl.md");
+    const char* const inHelp = "(?:\n  |,)(--?[a-z-]+)";
+    const Words everywhere = All(inHelp, general);
+    EXPECT_THAT(everywhere, testing::Contains("--json"));
+    std::vector<std::string> verbs{""};
+    for (size_t i = 0; i < verbs.size(); ++i)
+    {
+        const std::string verb = verbs[i], help = Kivctl(verb + " --help").out;
+        Words words = All("\n  ([a-z]+)  ", help);
+        for (const std::string& name : words)
+            verbs.push_back(verb + (verb.empty() ? "" : " ") + name);
+        words.merge(All(inHelp, help));
+        words.insert(everywhere.begin(), everywhere.end());
+        EXPECT_THAT(All("([^\t\n]+)(?:\t[^\n]*)?\n", Complete(verb + " ''") + Complete(verb + " -")), testing::IsSupersetOf(words))
+            << verb;
+
+        const std::string below = man.substr(man.find(verb.empty() ? ".SH OPTIONS" : ".SS \"" + verb + " ["));
+        Words described = All(R"((?:\\fB|, )(--?[a-z-]+))", below.substr(0, below.find("\n.S")));
+        described.insert({"-h", "--help"}); // told once for all verbs
+        EXPECT_THAT(described, testing::IsSupersetOf(All(inHelp, help))) << verb;
+    }
+    EXPECT_EQ(21U, verbs.size());
+
+    const Words variables = All("\n  ([A-Z_]{6,})  ", general);
+    EXPECT_EQ(5U, variables.size());
+    for (const std::string& variable : variables)
+        EXPECT_THAT(man, HasSubstr("\n\\fB" + variable + "\\fR\n"));
+
+    const Words codes = All("\n +([0-9]+  .*)", general);
+    EXPECT_EQ(11U, codes.size());
+    for (const std::string& code : codes)
+    {
+        EXPECT_THAT(page, HasSubstr("| " + std::regex_replace(code, std::regex("  "), " | ") + " |\n"));
+        EXPECT_THAT(man, HasSubstr("\\fB" + std::regex_replace(code, std::regex("  "), "\\fR\n")));
+    }
+}
+
+TEST_F(KivctlTest, CompletesWhatFitsTheWordsBefore)
+{
+    for (const char* record : {"status 7 org.a.B /x a.b", "auth all org.c.D /y c.d", "push mail org.a.B /x a.b"})
+        Kivctl(std::string("subscribers add ") + record);
+    const std::pair<const char*, const char*> cases[] = {
+        {"device set runtime.fl", "runtime.flight-mode=\twhether flight mode is on\n"},
+        {"device set runtime.flight-mode=t", "runtime.flight-mode=true\n"},
+        {"device set -p ./x network.wifi-device=", "network.wifi-device=0\toff\nnetwork.wifi-device=1\ton\n"},
+        {"device set sim1.sms", "sim1.sms-status=\t1 when ready for text messages\n"},
+        {"network --profile=ro", "--profile=roaming\tone slot, its SIM in a foreign network with data allowed\n:files\n"},
+        {"-p nothing", ":files\n"},
+        {"notify on --to ''", "subscribers\nmanager\n"},
+        {"notify on --service 7 po", "policy\n"},
+        {"--color=a", "--color=auto\n--color=always\n"},
+        {"sim w", "wait\tWait until a SIM is usable, asking once a second\n"},
+        {"sim --sl", "--slot\tOnly this slot, counted from 0\n"},
+        {"subscribers remove ''", "auth\npush\nstatus\n"},
+        {"subscribers remove status ''", "7\n"},
+        {"subscribers remove push mail ''", "org.a.B\n"},
+        {"subscribers add status ''", "7\nall\n"},
+        {"completion ''", "bash\nzsh\nfish\n"},
+    };
+    for (const auto& [words, offered] : cases)
+        EXPECT_EQ(offered, Complete(words)) << words;
+}
+
+} // namespace
+} // namespace kiv::test

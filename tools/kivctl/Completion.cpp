@@ -1,0 +1,247 @@
+#include "Completion.h"
+
+#include "Kivctl.h"
+
+#include <DASubscriberStore.h>
+#include <DeviceControl.h>
+#include <SourceControl.h>
+
+#include <algorithm>
+#include <array>
+#include <set>
+
+namespace
+{
+
+struct Candidate
+{
+    std::string word;
+    std::string description = {};
+};
+using Candidates = std::vector<Candidate>;
+
+constexpr char kFiles[] = ":files";
+
+bool IsOption(const std::string& word)
+{
+    return word.size() > 1 && word.front() == '-';
+}
+
+const OptionManual* FindOption(const VerbManual& verb, const std::string& name)
+{
+    for (const OptionManual& option : verb.options)
+    {
+        if (std::find(option.names.begin(), option.names.end(), name) != option.names.end())
+            return &option;
+    }
+    return nullptr;
+}
+
+/// Where the last word of a command line is: the verb, its operands before that word, and the option whose value it is.
+struct Place
+{
+    const VerbManual* program;
+    const VerbManual* verb = program;
+    std::vector<std::string> operands = {};
+    const OptionManual* option = nullptr;
+
+    const OptionManual* Find(const std::string& name) const
+    {
+        const OptionManual* const own = FindOption(*verb, name);
+        return own != nullptr ? own : FindOption(*program, name);
+    }
+
+    void Pass(const std::string& word)
+    {
+        if (option != nullptr)
+        {
+            option = nullptr;
+            return;
+        }
+        if (IsOption(word))
+        {
+            const OptionManual* const found = Find(word);
+            option = found != nullptr && !found->value.empty() ? found : nullptr;
+            return;
+        }
+        const auto below = std::find_if(verb->verbs.begin(), verb->verbs.end(),
+            [&word](const VerbManual& candidate) { return candidate.path.substr(candidate.path.rfind(' ') + 1) == word; });
+        if (operands.empty() && below != verb->verbs.end())
+            verb = &*below;
+        else
+            operands.push_back(word);
+    }
+};
+
+/// The recorded values of the operand that follows those of a subscription. For a new one, these are the keys of its kind, and
+/// "all", and then the values of any subscription.
+Candidates Recorded(const std::vector<std::string>& operands, bool isNew)
+{
+    std::vector<DASubscription> subscriptions;
+    std::string reason;
+    DASubscriberStore().List(subscriptions, reason);
+    const size_t index = operands.size();
+    const std::ptrdiff_t compared = isNew && index > 1 ? 0 : static_cast<std::ptrdiff_t>(index);
+    std::set<std::string> words;
+    if (isNew && index == 1)
+        words.insert("all");
+    for (const DASubscription& subscription : subscriptions)
+    {
+        const _SubscriberInfo& who = subscription.subscriber;
+        const std::array<std::string, 5> fields{subscription.kind, subscription.key, who.busname, who.objectpath, who.interface};
+        if (index < fields.size() && std::equal(operands.begin(), operands.begin() + compared, fields.begin()))
+            words.insert(fields.at(index));
+    }
+    Candidates candidates;
+    for (const std::string& word : words)
+        candidates.push_back({word});
+    return candidates;
+}
+
+/// The values of a key of device files that can be listed: those that the descriptions of the key name.
+Candidates ValuesOf(const kiv::platform::FieldInfo& field)
+{
+    if (field.values == "true or false")
+        return {{"true"}, {"false"}};
+    Candidates candidates;
+    const bool isNumber = field.values.rfind("a number", 0) == 0;
+    const std::string text = field.meaning.substr(0, field.meaning.find(';'));
+    for (size_t begin = isNumber ? text.find_first_of("-0123456789") : text.npos; begin != text.npos && begin < text.size();)
+    {
+        const size_t end = std::min(text.find(", ", begin), text.size());
+        const size_t blank = text.find(' ', begin);
+        const std::string number = text.substr(begin, blank - begin);
+        if (blank < end && number.find_first_not_of("-0123456789") == number.npos)
+            candidates.push_back({number, text.substr(blank + 1, end - blank - 1)});
+        begin = end == text.size() ? text.npos : end + 2;
+    }
+    return candidates;
+}
+
+/// "GROUP.KEY=" for every key, or the values behind it.
+Candidates Assignments(const std::string& typed)
+{
+    const std::string key = typed.substr(0, typed.find('='));
+    const bool isOfSlot = key.rfind("sim", 0) == 0 && key.find('.') == 4;
+    Candidates candidates;
+    for (const kiv::platform::FieldInfo& field : kiv::platform::ListFields())
+    {
+        std::string name = field.group + "." + field.key;
+        if (isOfSlot && name.rfind("sim0.", 0) == 0)
+            name[3] = key[3];
+        if (key.size() == typed.size())
+            candidates.push_back({name + "=", field.meaning});
+        else if (name == key)
+            for (const Candidate& value : ValuesOf(field))
+                candidates.push_back({name + "=" + value.word, value.description});
+    }
+    return candidates;
+}
+
+/// What an option's value may be.
+Candidates ValuesOf(const OptionManual& option)
+{
+    Candidates candidates;
+    if (option.names.back() == "--profile")
+    {
+        for (const kiv::platform::Profile& profile : kiv::platform::ListProfiles())
+            candidates.push_back({profile.name, profile.description});
+        const kiv::platform::Profile host = kiv::platform::HostProfile();
+        candidates.push_back({host.name, host.description});
+        candidates.push_back({kFiles});
+    }
+    for (const std::string& word : option.words)
+        candidates.push_back({word});
+    return candidates;
+}
+
+/// What the next operand may be.
+Candidates Operands(const Place& place, const std::string& typed)
+{
+    std::vector<const OptionManual*> operands;
+    for (const OptionManual& option : place.verb->options)
+    {
+        if (!IsOption(option.names.back()))
+            operands.push_back(&option);
+    }
+    const size_t index = place.operands.size();
+    if (operands.empty() || (index >= operands.size() && !operands.back()->isRepeated))
+        return {};
+    const OptionManual& operand = *operands[std::min(index, operands.size() - 1)];
+    if (operand.names.back() == "GROUP.KEY=VALUE")
+        return Assignments(typed);
+    const bool isNew = place.verb->path == "subscribers add";
+    if ((!isNew && place.verb->path != "subscribers remove") || (isNew && index == 0))
+        return ValuesOf(operand);
+    return Recorded(place.operands, isNew);
+}
+
+Candidates Verbs(const Place& place)
+{
+    Candidates candidates;
+    for (const VerbManual& below : place.verb->verbs)
+    {
+        if (place.operands.empty())
+            candidates.push_back({below.path.substr(below.path.rfind(' ') + 1), below.help});
+    }
+    return candidates;
+}
+
+Candidates Options(const Place& place)
+{
+    Candidates candidates;
+    std::set<std::string> named;
+    for (const VerbManual* verb : {place.verb, place.program})
+    {
+        for (const OptionManual& option : verb->options)
+        {
+            for (const std::string& name : option.names)
+            {
+                if (IsOption(name) && named.insert(name).second)
+                    candidates.push_back({name, option.help});
+            }
+        }
+    }
+    return candidates;
+}
+
+Candidates Following(const Place& place, const std::string& typed)
+{
+    if (place.option != nullptr)
+        return ValuesOf(*place.option);
+    const size_t equals = typed.find('=');
+    if (IsOption(typed) && equals != typed.npos)
+    {
+        const OptionManual* const option = place.Find(typed.substr(0, equals));
+        Candidates candidates = option == nullptr ? Candidates() : ValuesOf(*option);
+        for (Candidate& candidate : candidates)
+        {
+            if (candidate.word != kFiles)
+                candidate.word.insert(0, typed, 0, equals + 1);
+        }
+        return candidates;
+    }
+    if (IsOption(typed) || typed == "-")
+        return Options(place);
+    Candidates candidates = Verbs(place);
+    for (Candidate& operand : Operands(place, typed))
+        candidates.push_back(std::move(operand));
+    return candidates.empty() && typed.empty() ? Options(place) : candidates;
+}
+
+} // namespace
+
+std::string Completions(const VerbManual& program, const std::vector<std::string>& words)
+{
+    Place place{&program};
+    const std::string typed = words.empty() ? "" : words.back();
+    for (size_t i = 0; i + 1 < words.size(); ++i)
+        place.Pass(words[i]);
+    std::string text;
+    for (const Candidate& candidate : Following(place, typed))
+    {
+        if (candidate.word == kFiles || candidate.word.rfind(typed, 0) == 0)
+            text += candidate.word + (candidate.description.empty() ? "" : '\t' + candidate.description) + '\n';
+    }
+    return text;
+}

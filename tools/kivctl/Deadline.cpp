@@ -1,0 +1,38 @@
+#include "Deadline.h"
+
+#include <algorithm>
+#include <chrono>
+
+Deadline::Deadline(GDBusConnection* connection, std::optional<double> seconds)
+{
+    constexpr double kYear = 365.0 * 24 * 60 * 60; // longer ones would overflow the clock
+    if (seconds)
+        thread_ = std::thread(&Deadline::Wait, this, connection, std::min(*seconds, kYear));
+}
+
+Deadline::~Deadline()
+{
+    WasMissed();
+}
+
+bool Deadline::WasMissed()
+{
+    {
+        const std::lock_guard<std::mutex> lock(mutex_);
+        isOver_ = true;
+    }
+    change_.notify_one();
+    if (thread_.joinable())
+        thread_.join();
+    return wasMissed_;
+}
+
+void Deadline::Wait(GDBusConnection* connection, double seconds)
+{
+    std::unique_lock<std::mutex> lock(mutex_);
+    if (change_.wait_for(lock, std::chrono::duration<double>(seconds), [this] { return isOver_; }))
+        return;
+    wasMissed_ = true;
+    lock.unlock();
+    g_dbus_connection_close_sync(connection, nullptr, nullptr);
+}
