@@ -6,8 +6,16 @@ add_library(kiv_compile INTERFACE)
 target_compile_options(kiv_compile INTERFACE
   -Wall -Wextra -Wpedantic -Wconversion -Wshadow -Werror
   -fstack-protector-strong
-  "-ffile-prefix-map=${PROJECT_SOURCE_DIR}/=" "-ffile-prefix-map=${PROJECT_BINARY_DIR}=build")
+  "-ffile-prefix-map=${PROJECT_SOURCE_DIR}/=" "-ffile-prefix-map=${PROJECT_BINARY_DIR}=build"
+  "$<$<BOOL:${CMAKE_SYSROOT}>:-ffile-prefix-map=${CMAKE_SYSROOT}=>")
+# Sizes of files and times have 64 bits on processors of 32 bits too, where the C library knows them so.
+target_compile_definitions(kiv_compile INTERFACE _FILE_OFFSET_BITS=64 _TIME_BITS=64)
 target_link_options(kiv_compile INTERFACE -Wl,-z,relro,-z,now -Wl,-z,noexecstack -Wl,--as-needed)
+
+# What GCC 6 did otherwise on ARM concerns nobody here.
+if(CMAKE_SYSTEM_PROCESSOR STREQUAL "arm")
+  target_compile_options(kiv_compile INTERFACE -Wno-psabi)
+endif()
 
 if(KIV_SANITIZE)
   target_compile_options(kiv_compile INTERFACE -fsanitize=${KIV_SANITIZE} -fno-omit-frame-pointer -fno-sanitize-recover=all)

@@ -10,7 +10,7 @@ PLATFORM_BEGIN_DECLS
 struct tm;
 
 /// @param date  receives the broken-down local time; untouched on failure
-/// @return 0, else an error code
+/// @return 0, else an error code, as after 19 January 2038 on a platform whose time_t has 32 bits
 /// Any thread.
 int alarm_get_current_time(struct tm* date);
 

@@ -288,7 +288,7 @@ void AddFacade(Rows& rows)
         .Fails(info, {"-77 before", "E > system_info_get_platform_string failed [-77]"})
         .WithoutMemory({"-12 before"});
     single.Add<int(int*)>(&S::GetFontSize, {}, {"0 1"}).Fails({Call::system_settings_get_value_int}, {"-77"});
-    single.Add<int(tm*)>(&S::GetCurrentTime, {}, {"0 123 10 14 22 13 20 2 317"})
+    single.Add<int(tm*)>(&S::GetCurrentTime, {}, {"0 196 9 2 7 6 40 2 275"})
         .Fails({Call::alarm_get_current_time}, {"-77 0 0 0 0 0 0 0 0*"});
     single.Add<int(Text, char**)>(&S::GetPackageVersion, {"org.example.mail"}, {"0 3.0.17"})
         .Fails({Call::package_info_create}, {"-77 before", "E > package_info_create failed [-77]"})

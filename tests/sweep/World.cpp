@@ -55,7 +55,7 @@ void World::Use(const std::string& profile)
     platform::ChangeDevice(
         [](platform::Device& device)
         {
-            device.currentTime = 1'700'000'000;
+            device.currentTime = 4'000'000'000; // later than 32 bits reach
             device.flightMode = device.dataRoaming = true;
             device.bluetoothState = 2;
         });

@@ -234,7 +234,7 @@ public:
     /// The font size setting; not meaningful on failure.
     int GetFontSize(int* size);
 
-    /// The current local time; all zero when the platform gives none.
+    /// The current local time; all zero when the platform gives none, as after 19 January 2038 where its time_t has 32 bits.
     int GetCurrentTime(tm* now);
 
     /// The platform's name; null when the platform gives none.

@@ -389,7 +389,6 @@ bool DASystem::IsPackageInstalled(char* packageName)
 bool DASystem::IsSystemMemoryAvailable(double requiredMiB)
 {
     struct statvfs stats = {};
-    static_assert(sizeof stats.f_bavail == sizeof(std::uint64_t), "the platform writes the record with 64-bit counts");
     if (storage_get_internal_memory_size64(&stats) < 0)
     {
         KIV_ERROR("Fail to get internal memory size");
