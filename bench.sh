@@ -27,7 +27,7 @@ done
 
 build()
 {
-    .ci/install-missing build bench && cmake --preset release && cmake --build --preset release --target kiv_bench
+    .ci/install-missing build test bench cross && cmake --preset release && cmake --build --preset release --target kiv_bench
 }
 build >&2 || exit 2
 
@@ -37,5 +37,15 @@ build/release/bench/kiv_bench --json "$json" ${only:+--only "$only"} || code=$?
 
 jq --raw-output '.[] | select(.series) | [.series, .subscribers, .library_ns, .bare_ns] | @tsv' "$json" >build/bench.tsv
 gnuplot -e 'data = "build/bench.tsv"; picture = "build/bench.svg"' bench/cost.gnuplot
+# The same library for the other processors, as far as the mirror has what it needs.
+sizes=(build/release)
+for arch in armhf arm64; do
+    .ci/sysroot $arch || continue
+    cmake --preset $arch && cmake --build --preset $arch --target kiv_system || exit 2
+    sizes+=(build/$arch)
+done >&2
+echo
+bench/sizes.sh "${sizes[@]}" || code=1
+
 printf '\n%s\n' "Table: $json" "Picture: $PWD/build/bench.svg"
 exit "$code"
