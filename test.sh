@@ -7,17 +7,22 @@ cd "$(dirname "$(readlink -f "$0")")"
 usage()
 {
     cat <<'TEXT'
-usage: ./test.sh [--all]
+usage: ./test.sh [--all | --arch armhf | --arch arm64]
   Builds into build/ and runs the tests under AddressSanitizer with UBSan, under ThreadSanitizer, and plain.
   --all  the same with clang++ too, clang-format over all sources, clang-tidy over all but the tests, 30 seconds of each fuzz
-         target, and the checks of packages, a device's build, documents and country data
+         target, and the checks of packages, a device's build, documents and country data; then plain for both ARM processors,
+         with the checks of their packages and a device's build
+  --arch  builds for that processor alone, plain, and runs the tests with qemu-user-static
 TEXT
 }
 
-all=
+all= arch=
 case "${1-}" in
     "") ;;
     --all) all=yes ;;
+    --arch)
+        arch=${2-}
+        [[ $arch == armhf || $arch == arm64 ]] || { usage >&2; exit 2; } ;;
     -h | --help) usage; exit 0 ;;
     *) usage >&2; exit 2 ;;
 esac
@@ -60,6 +65,22 @@ run_tests() # preset
     "${fixed_addresses[@]}" ctest --preset "$1" --parallel $((2 * $(nproc)))
 }
 
+# Builds for another processor and runs its tests, as far as the mirror has the libraries.
+test_arch() # arch
+{
+    local arch=$1 code=0
+    say "$arch: libraries"
+    .ci/sysroot "$arch" || code=$?
+    if [[ $code == 77 && $all ]]; then
+        say "$arch: skipped"
+        return
+    fi
+    ((code == 0)) || return "$code"
+    build "$arch"
+    [[ $all ]] && run_tests "check-$arch"
+    run_tests "$arch"
+}
+
 sources()
 {
     git ls-files --cached --others --exclude-standard -- '*.cpp' '*.h'
@@ -77,6 +98,12 @@ check_tidy()
     quietly run-clang-tidy -quiet -p build/clang -j "$(nproc)" "^$PWD/(lib|platform|tools|bench)/"
 }
 
+if [[ $arch ]]; then
+    .ci/install-missing build test cross
+    test_arch "$arch"
+    exit
+fi
+
 if [[ $all ]]; then
     .ci/install-missing
     check_format
@@ -85,6 +112,8 @@ if [[ $all ]]; then
     run_tests clang
     say "fuzz targets"
     ./fuzz.sh 30
+    test_arch armhf
+    test_arch arm64
 else
     .ci/install-missing build test
 fi

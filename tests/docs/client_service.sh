@@ -1,8 +1,8 @@
 #!/usr/bin/env bash
 # Builds a client service as the page about them says, in one of its languages, and has it hear what the page says.
-# usage: client_service.sh BUILD_DIR SOURCE_DIR cpp|python [CXX]
+# usage: client_service.sh BUILD_DIR SOURCE_DIR cpp|python [CXX...]
 set -euo pipefail
-build=$1 sources=$2 language=$3 cxx=${4-}
+build=$1 sources=$2 language=$3 cxx=("${@:4}")
 page=$sources/docs/client-service.md
 if [[ $language == python ]] && ! /usr/bin/python3 -c 'from gi.repository import Gio' 2>/dev/null; then
     echo "skipped: python3-gi or gir1.2-glib-2.0 is not installed"
@@ -44,15 +44,21 @@ start() # name text-that-it-prints command...
 }
 
 cmake --install "$build" --prefix "$scratch/prefix" >install.log
-export PKG_CONFIG_PATH LD_LIBRARY_PATH PATH=$scratch/prefix/bin:$PATH
+# KIV_EMULATOR is the command that runs the programs of a cross build, word by word; else it is empty.
+mkdir bin
+for program in "$scratch"/prefix/bin/*; do
+    printf '#!/bin/sh\nexec %s "%s" "$@"\n' "${KIV_EMULATOR-}" "$program" >"bin/${program##*/}"
+done
+chmod +x bin/*
+export PKG_CONFIG_PATH LD_LIBRARY_PATH PATH=$scratch/bin:$PATH
 PKG_CONFIG_PATH=$(dirname "$(find "$scratch/prefix" -name kiv_system.pc)")
 LD_LIBRARY_PATH=$(dirname "$(find "$scratch/prefix" -name libkiv_system.so)")
 if [[ $language == cpp ]]; then
     block cpp 1 >mail.cpp
     command=$(block sh 1)
     command=${command//\/usr\/share/$scratch/prefix/share}
-    eval "${command/g++/$cxx -Wall -Wextra -Werror}"
-    service=(./mail)
+    eval "${command/g++/${cxx[*]} -Wall -Wextra -Werror}"
+    read -ra service <<<"${KIV_EMULATOR-} ./mail"
 else
     block python 1 >mail.py
     service=(/usr/bin/python3 mail.py)

@@ -7,6 +7,12 @@ string(REGEX REPLACE "\n$" "" exported "${exported}")
 string(REPLACE "\n" ";" exported "${exported}")
 file(STRINGS ${SYMBOLS} listed)
 
+# Offset to top, type information, two destructors: as many words as wide as the addresses in the output.
+string(REGEX MATCH "^[0-9a-f]+" address "${output}")
+string(LENGTH "${address}" digits)
+math(EXPR size "4 * ${digits} / 2" OUTPUT_FORMAT HEXADECIMAL)
+string(REPLACE 0x "" size ${size})
+
 foreach(symbol IN LISTS exported)
   if(NOT symbol IN_LIST listed)
     message(SEND_ERROR "exported and not listed: ${symbol}")
@@ -16,8 +22,7 @@ foreach(symbol IN LISTS listed)
   if(NOT symbol IN_LIST exported)
     message(SEND_ERROR "listed and not exported: ${symbol}")
   elseif(symbol MATCHES "^vtable for ")
-    # Offset to top, type information, two destructors.
-    if(NOT output MATCHES "0000000000000020 [A-Z] ${symbol}\n")
+    if(NOT output MATCHES " 0+${size} [A-Z] ${symbol}\n")
       message(SEND_ERROR "other virtual members than the destructor: ${symbol}")
     endif()
   endif()

@@ -2,15 +2,15 @@
 # Sourced. Builds the agent that the README shows against an installed tree, the way a user would, and runs it.
 
 # With the flags of pkg-config and with CMake's package; both find the tree wherever it stands.
-try_agent() # prefix readme compiler scratch
+try_agent() # prefix readme scratch compiler...
 {
-    local prefix=$1 readme=$2 cxx=$3 scratch=$4 flags
+    local prefix=$1 readme=$2 scratch=$3 cxx=("${@:4}") flags
     awk '/^```cpp$/ { inside = 1; next } /^```$/ { inside = 0 } inside' "$readme" >"$scratch/agent.cpp"
 
     export PKG_CONFIG_PATH LD_LIBRARY_PATH
     PKG_CONFIG_PATH=$(dirname "$(find "$prefix" -name kiv_system.pc)")
     read -ra flags <<<"$(pkg-config --cflags --libs kiv_system)"
-    "$cxx" -std=c++17 -Wall -Wextra -Werror "$scratch/agent.cpp" "${flags[@]}" -o "$scratch/agent"
+    "${cxx[@]}" -std=c++17 -Wall -Wextra -Werror "$scratch/agent.cpp" "${flags[@]}" -o "$scratch/agent"
     LD_LIBRARY_PATH=$(dirname "$(find "$prefix" -name libkiv_system.so)")
     run_agent "$scratch/agent"
     unset LD_LIBRARY_PATH
@@ -23,18 +23,20 @@ find_package(kiv_system 1.0 REQUIRED)
 add_executable(agent ../agent.cpp)
 target_link_libraries(agent kiv::system)
 CMAKE
-    cmake -G Ninja -S "$scratch/with-cmake" -B "$scratch/with-cmake" -DCMAKE_PREFIX_PATH="$prefix" -DCMAKE_CXX_COMPILER="$cxx" \
+    cmake -G Ninja -S "$scratch/with-cmake" -B "$scratch/with-cmake" -DCMAKE_PREFIX_PATH="$prefix" -DCMAKE_CXX_COMPILER="${cxx[0]}" \
+        ${KIV_TOOLCHAIN:+-DCMAKE_TOOLCHAIN_FILE="$KIV_TOOLCHAIN" -DCMAKE_FIND_ROOT_PATH="$prefix"} \
         -DCMAKE_CXX_STANDARD=17 >"$scratch/cmake.log"
     cmake --build "$scratch/with-cmake" >>"$scratch/cmake.log"
     run_agent "$scratch/with-cmake/agent"
 }
 
+# KIV_EMULATOR is the command that runs the programs of a cross build, word by word; else it is empty.
 run_agent() # agent
 {
     export DBUS_SYSTEM_BUS_ADDRESS="unix:path=$scratch/no-bus" KIV_SUBSCRIBERS="$scratch/subscribers.db"
     local single none
-    single=$(KIV_PROFILE=single "$1")
-    none=$(KIV_PROFILE=no-telephony "$1") && exit 1
+    single=$(KIV_PROFILE=single ${KIV_EMULATOR-} "$1")
+    none=$(KIV_PROFILE=no-telephony ${KIV_EMULATOR-} "$1") && exit 1
     printf '%s\n%s\n' "$single" "$none"
     [[ $single == "SIM of "*", network "* && $none == "no SIM answers" ]]
 }

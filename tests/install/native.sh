@@ -1,9 +1,9 @@
 #!/usr/bin/env bash
 # Builds the library for a device: from its own sources alone, on libraries and headers that it finds by the names that pkg-config
 # knows on a device. The simulated device is installed under these names, each header where its .pc file alone leads to.
-# usage: native.sh BUILD_DIR SOURCE_DIR CXX
+# usage: native.sh BUILD_DIR SOURCE_DIR CXX...
 set -euo pipefail
-build=$1 sources=$2 cxx=$3
+build=$1 sources=$2 cxx=("${@:3}")
 
 scratch=$(mktemp -d)
 trap 'rm -rf "$scratch"' EXIT
@@ -49,8 +49,8 @@ cp -r "$sources/lib/DASystem" "$scratch/tree/lib"
 export PKG_CONFIG_PATH=$device/lib/pkgconfig
 configure() # option...
 {
-    cmake -G Ninja -S "$scratch/tree" -B "$scratch/build" -DKIV_PLATFORM=native -DCMAKE_BUILD_TYPE=Debug -DCMAKE_CXX_COMPILER="$cxx" \
-        "$@" >"$scratch/log" 2>&1
+    cmake -G Ninja -S "$scratch/tree" -B "$scratch/build" -DKIV_PLATFORM=native -DCMAKE_BUILD_TYPE=Debug -DCMAKE_CXX_COMPILER="${cxx[0]}" \
+        ${KIV_TOOLCHAIN:+-DCMAKE_TOOLCHAIN_FILE="$KIV_TOOLCHAIN" -DCMAKE_FIND_ROOT_PATH="$device"} "$@" >"$scratch/log" 2>&1
 }
 if configure || ! grep --quiet "None of the required 'dlog' found" "$scratch/log"; then
     echo "configured without the platform log, or refused for another reason:"
@@ -65,10 +65,11 @@ made=$(find "$scratch/prefix" -name '*.so*' -o -name '*.h' | sed 's|.*/||; s|[.]
 expected=$({ ls "$sources/lib/DASystem/include"; echo libkiv_system.so; } | sort | tr '\n' ' ')
 [[ $made == "$expected" ]] || { echo "installed: $made"; exit 1; }
 library=$(find "$scratch/prefix" -name libkiv_system.so)
-cmake -DNM=nm -DLIBRARY="$library" -DSYMBOLS="$sources/lib/DASystem/exported_symbols.txt" \
+nm=$(sed --quiet 's/^CMAKE_NM:FILEPATH=//p' "$build/CMakeCache.txt")
+cmake -DNM="$nm" -DLIBRARY="$library" -DSYMBOLS="$sources/lib/DASystem/exported_symbols.txt" \
     -P "$sources/tests/frame/exported_symbols.cmake"
 PKG_CONFIG_PATH=$PKG_CONFIG_PATH:$(dirname "$(find "$scratch/prefix" -name kiv_system.pc)")
 read -ra flags <<<"$(pkg-config --cflags kiv_system)"
 for header in DASystem DASimManager DADBusManager DAConnectionManager; do
     echo "#include <$header.h>"
-done | "$cxx" -std=c++17 -fsyntax-only -Wall -Wextra -Werror -x c++ - "${flags[@]}"
+done | "${cxx[@]}" -std=c++17 -fsyntax-only -Wall -Wextra -Werror -x c++ - "${flags[@]}"

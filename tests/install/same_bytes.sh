@@ -11,7 +11,7 @@ trap 'rm -rf "$scratch"' EXIT
 copy=$scratch/a/copy/of/the/sources
 mkdir -p "$copy" "$scratch"/{first,second}
 cp -r "$sources"/{CMakeLists.txt,LICENSE,cmake,dbus,lib,platform,tools} "$copy"
-mapfile -t settings < <(grep -E '^CMAKE_(BUILD_TYPE|UNITY_BUILD|CXX_COMPILER|CXX_FLAGS(_[A-Z]+)?|INSTALL_PREFIX):' "$build/CMakeCache.txt")
+mapfile -t settings < <(grep -E '^CMAKE_(TOOLCHAIN_FILE|BUILD_TYPE|UNITY_BUILD|CXX_COMPILER|CXX_FLAGS(_[A-Z]+)?|INSTALL_(PREFIX|LIBDIR)):' "$build/CMakeCache.txt")
 generator=$(sed -n 's/^CMAKE_GENERATOR:INTERNAL=//p' "$build/CMakeCache.txt") # whose working directories stand in debug information
 cmake -S "$copy" -B "$scratch/b" -G "$generator" "${settings[@]/#/-D}" -DKIV_BUILD_TESTS=OFF >"$scratch/log" 2>&1 &&
     cmake --build "$scratch/b" --parallel 2 --target $target >>"$scratch/log" 2>&1 ||

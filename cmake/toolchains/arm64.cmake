@@ -1,0 +1,5 @@
+# ARM with 64 bits.
+set(CMAKE_SYSTEM_PROCESSOR aarch64)
+set(CMAKE_LIBRARY_ARCHITECTURE aarch64-linux-gnu)
+set(CPACK_DEBIAN_PACKAGE_ARCHITECTURE arm64)
+include(${CMAKE_CURRENT_LIST_DIR}/debian.cmake)
