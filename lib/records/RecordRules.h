@@ -19,8 +19,8 @@ enum class RecordFlaw
     ReservedInterface
 };
 
-/// The rules for records, for those who write them and for those who call the subscriber. GDBus does not report a malformed record
-/// as such, and the bus disconnects whoever calls the reserved path or interface, or one that begins with its letters.
+/// Checks a record before it is written and before its subscriber is called. GDBus does not report a malformed record, and the bus
+/// disconnects a caller of the reserved path or interface, or of one that begins with the same letters.
 inline RecordFlaw FlawOf(const std::string& busName, const std::string& objectPath, const std::string& interface)
 {
     const auto isWhole = [](const std::string& text) { return text.find('\0') == std::string::npos; };

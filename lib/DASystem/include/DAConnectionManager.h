@@ -6,52 +6,53 @@
 
 #include <runtime_info.h>
 
-/// The state of the device's connections, and the listener that hears of their changes.
+/// Reads the state of the device's connections, and notifies one listener of changes.
 class KIV_SYSTEM_API DAConnectionManager
 {
 public:
-    /// The one instance, made on first use, never deleted; null when there is no memory for it, and the next call tries again.
-    /// Any thread; holds a lock of its own.
+    /// Returns the one instance, made on first use and never deleted; null when there is no memory for it, and the next call tries
+    /// again. Any thread; holds a lock of its own.
     static DAConnectionManager* GetInstance();
 
-    DAConnectionManager();          ///< holds nothing; GetInstance() gives the one to ask
+    DAConnectionManager();          ///< holds nothing; use GetInstance() instead
     virtual ~DAConnectionManager(); ///< releases nothing
 
-    /// Registers the one listener of the process in place of the one before; null unregisters.
-    /// @param listener  borrowed until another takes its place
-    /// @param userData  handed to the listener with every change
-    /// Blocks on the platform; what that answers to the registration is not looked at. Call it in the thread that receives the
-    /// changes, or while none is being delivered: the listener is exchanged without a lock.
+    /// Registers a listener, which replaces the previous one; null unregisters.
+    /// @param listener  borrowed until it is replaced
+    /// @param userData  passed to the listener with every change
+    /// Blocks on the platform and ignores its reply. Call it in the thread that receives the changes, or while none is being
+    /// delivered: the listener is replaced without a lock.
     void SetConnectionEventListener(IDAConnectionStateListener* listener, void* userData);
 
-    /// @return a connection_cellular_state_e; KIV_CONNECTION_STATE_UNKNOWN, which is -1, when it cannot be read. Blocks on the
-    /// platform. Any thread.
+    /// @return a connection_cellular_state_e, or KIV_CONNECTION_STATE_UNKNOWN (-1) when it cannot be read
+    /// Blocks on the platform. Any thread.
     int GetCellularNetworkState();
 
-    /// @return a connection_wifi_state_e; KIV_CONNECTION_STATE_UNKNOWN, which is -1, when it cannot be read. Blocks on the
-    /// platform. Any thread.
+    /// @return a connection_wifi_state_e, or KIV_CONNECTION_STATE_UNKNOWN (-1) when it cannot be read
+    /// Blocks on the platform. Any thread.
     int GetWifiNetworkState();
 
-    /// @return a connection_bt_state_e; KIV_CONNECTION_STATE_UNKNOWN, which is -1, when it cannot be read. Blocks on the platform.
-    /// Any thread.
+    /// @return a connection_bt_state_e, or KIV_CONNECTION_STATE_UNKNOWN (-1) when it cannot be read
+    /// Blocks on the platform. Any thread.
     int GetBTNetworkState();
 
-    /// Asks for the cellular connection, and for the others that are selected, each with a query of its own.
-    /// @return whether at least one of them is up; a query that fails counts as down. Blocks on the platform. Any thread.
+    /// Queries the cellular connection and the selected others, one by one.
+    /// @return whether at least one of them is up; a failed query counts as down
+    /// Blocks on the platform. Any thread.
     bool IsNetworkConnected(bool checkWifi, bool checkBT);
 
-    /// The platform's entry for a changed Wi-Fi device state.
+    /// The platform calls it when the Wi-Fi device state changed.
     static void wifi_device_state_changed(wifi_device_state_e state, void* userData);
 
-    /// The platform's entry for a changed Wi-Fi connection state.
+    /// The platform calls it when the Wi-Fi connection state changed.
     static void wifi_connection_state_changed(wifi_connection_state_e state, void* ap, void* userData);
 
-    /// The platform's entry for a changed runtime value: reads the value and tells the listener; a value that can not be read
-    /// is not told.
+    /// The platform calls it when a runtime value changed. It reads the value and notifies the listener; if the read fails, the
+    /// listener is not notified.
     static void OnConnectionStateChanged(runtime_info_key_e key, void* userData);
 
-    static DAConnectionManager* __pInstance;        ///< the instance, null until it is made
-    static IDAConnectionStateListener* __pListener; ///< the registered listener, null when there is none
+    static DAConnectionManager* __pInstance;        ///< the instance; null until it is made
+    static IDAConnectionStateListener* __pListener; ///< the registered listener; null when there is none
 };
 
 #endif

@@ -12,38 +12,38 @@
 
 #include <string>
 
-/// Telephony handles, SIM state and identity, subscriptions, and the lookups over the country tables.
+/// Reads SIM state, identity and subscriptions, opens telephony handles, and searches the country tables.
 ///
-/// A slot is a 0-based index, the same in the handle list and in the list of modem (CP) names. One that either list does not
-/// have is a failed read. Every operation blocks on the modem unless it says otherwise, and may be called from any thread: SIM
-/// access is serialised by the named lock "CORE_MUTEX_NAME_SIM_ACCESS", held for the whole operation or around one read as told.
+/// A slot is a 0-based index, the same in the handle list and in the list of modem (CP) names. Reading a slot that either list
+/// lacks fails. Every operation blocks on the modem unless documented otherwise, and may be called from any thread: the named lock
+/// "CORE_MUTEX_NAME_SIM_ACCESS" serialises SIM access. Each operation documents whether it holds the lock throughout or per read.
 class KIV_SYSTEM_API DASimManager
 {
 public:
-    /// The one instance, made on first use, never deleted; null when there is no memory for it, and the next call tries again.
-    /// Any thread; holds a lock of its own.
+    /// Returns the one instance, made on first use and never deleted; null when there is no memory for it, and the next call tries
+    /// again. Any thread; holds a lock of its own.
     static DASimManager* GetInstance();
 
-    DASimManager();          ///< holds nothing; GetInstance() gives the one to ask
+    DASimManager();          ///< holds nothing; use GetInstance() instead
     virtual ~DASimManager(); ///< releases nothing
 
     /// @name Telephony handles
     /// @{
 
     /// Opens the telephony handles of all slots.
-    /// @param list  receives one handle a slot, at least one, released with DeleteTelephonyHandle(); untouched on failure
-    /// @return whether it was opened. Takes no lock.
+    /// @param list  receives one handle per slot, at least one, released with DeleteTelephonyHandle(); unchanged on failure
+    /// @return whether they were opened. Takes no lock.
     bool SuccessToInitTelephonyHandle(telephony_handle_list_s* list);
 
     /// Closes what SuccessToInitTelephonyHandle() opened. Takes no lock.
     void DeleteTelephonyHandle(telephony_handle_list_s list);
 
     /// Opens the telephony handles of all slots, closed with DeinitHandleList().
-    /// @return whether the platform did so. Holds the lock.
+    /// @return whether the platform opened them. Holds the lock.
     bool InitHandleList(telephony_handle_list_s* list);
 
     /// Closes what InitHandleList() opened.
-    /// @return whether the platform did so. Holds the lock.
+    /// @return whether the platform closed them. Holds the lock.
     bool DeinitHandleList(telephony_handle_list_s* list);
 
     /// @return the names of the modems, null-terminated, released with g_strfreev(); null when there are none. Holds the lock.
@@ -53,7 +53,7 @@ public:
     /// @name SIM state
     /// @{
 
-    /// Reads the SIM state behind one handle.
+    /// Reads the SIM state by handle.
     /// @return whether it was read. Holds the lock.
     bool GetSimState(telephony_data** handle, telephony_sim_state_e* state);
 
@@ -62,68 +62,68 @@ public:
 
     /// @param list  open handle list; borrowed, stays open
     /// @param slot  0-based
-    /// @return whether the SIM of that slot is available. Holds the lock around the one read.
+    /// @return whether the SIM of that slot is available. Holds the lock during the read.
     bool IsSimAvailable(telephony_handle_list_s list, int slot);
 
     /// Reads the card status of a slot.
     /// @param slot    0-based
-    /// @param status  receives the status when it was read
+    /// @param status  receives the status on success
     /// @return whether the card's initialisation is completed. Holds the lock.
     bool IsAvaliableState(int slot, TelSimCardStatus_t* status);
 
-    /// Waits until the card of a slot is usable or never will be, asking once a second.
+    /// Reads the card status of a slot once per second until the card is usable or never will be.
     /// @param slot    0-based
     /// @param status  receives the last status read
-    /// @return whether the card's initialisation is completed; false also when no modem answered 100 attempts to open it
-    /// Has no bound once the modem answers: a card that waits for its PIN is waited for. A slot that is none is attempted 100 times
-    /// as well. The second argument is not read. Takes no lock.
+    /// @return whether the card's initialisation is completed; false also when 100 attempts to open the modem failed
+    /// Waits without a time limit once the modem is open, for example for a card's PIN. A slot that does not exist takes 100
+    /// attempts as well. The second argument is ignored. Takes no lock.
     bool IsAvaliableSimStateOnPolling(int slot, int, TelSimCardStatus_t* status);
 
-    /// @return whether a card of that status may become usable by waiting. Does not block; takes no lock.
+    /// @return whether a card with that status may become usable later. Does not block; takes no lock.
     bool IsWaittingSimCheck(TelSimCardStatus_t status);
     /// @}
 
     /// @name SIM identity
-    /// Of one slot of an open handle list, which is borrowed and stays open. The texts are copies released with free(); null on
-    /// failure. Each holds the lock around each of its reads, not between them.
+    /// Each reads one slot of an open handle list, which is borrowed and stays open. The texts are copies, released with free();
+    /// null on failure. Each holds the lock during each of its reads, not between them.
     /// @{
 
     /// Reads the mobile country code.
-    /// @return 0, or 4 when the slot has no usable SIM or the modem does not tell
+    /// @return 0, or 4 when the slot has no usable SIM or the read fails
     int GetMCCFromSim(telephony_handle_list_s list, int slot, const char** mcc);
 
     /// Reads the mobile network code, of 2 or 3 digits.
-    /// @return 0, or 4 when the slot has no usable SIM or the modem does not tell
+    /// @return 0, or 4 when the slot has no usable SIM or the read fails
     int GetMNCFromSim(telephony_handle_list_s list, int slot, char** mnc);
 
     /// Reads the IMSI: MCC, MNC and MSIN joined.
-    /// @return 0, or 4 when the slot has no usable SIM or the modem does not tell
+    /// @return 0, or 4 when the slot has no usable SIM or the read fails
     int GetIMSIFromSim(telephony_handle_list_s list, int slot, char** imsi);
 
     /// Reads the subscriber number, possibly an empty text.
-    /// @return 0, or TELEPHONY_ERROR_SIM_NOT_AVAILABLE when the slot has no usable SIM or the modem gives no number
+    /// @return 0, or TELEPHONY_ERROR_SIM_NOT_AVAILABLE when the slot has no usable SIM or the modem returns no number
     int GetPhoneNumberFromSim(telephony_handle_list_s list, int slot, char** number);
     /// @}
 
-    /// Reads the subscriber number behind one handle.
+    /// Reads the subscriber number by handle.
     /// @param handle  one of an open handle list; borrowed, stays open
-    /// @param number  receives the platform's text, released with free(), possibly null
+    /// @param number  receives the platform's text, possibly null, released with free()
     /// @return whether the platform answered. Holds the lock.
     bool GetPhoneNumber(telephony_data** handle, char** number);
 
-    /// Reads the parts of the IMSI by modem name; the three texts are untouched on failure.
+    /// Reads the parts of the IMSI by modem name; the three texts are unchanged on failure.
     /// @return whether they were read. Holds the lock.
     bool GetSimInfo(const char* cpName, std::string* mcc, std::string* mnc, std::string* msin);
 
     /// Reads whether the device is roaming on a slot that is in service.
     /// @param slot     0-based
     /// @param roaming  written on success only
-    /// @return whether it was read; false also out of service, and for a null pointer. Holds the lock.
+    /// @return whether it was read; false also without service and for a null pointer. Holds the lock.
     bool GetRoamingStatus(int slot, bool* roaming);
 
     /// @name Subscriptions and SMS readiness
-    /// Of a modem by its CP name. The value is the platform's and goes through unread. Each gives whether it was read, and holds
-    /// the lock.
+    /// Each reads one value of a modem by its CP name, and passes the platform's value on unchanged. Each returns whether it was
+    /// read, and holds the lock.
     /// @{
 
     /// Reads which SIM is the default one for the network.
@@ -139,24 +139,24 @@ public:
     bool CheckSmsEnabled(char* cpName, int* status);
     /// @}
 
-    /// Tells whether an SMS can be sent on a slot.
+    /// Checks whether an SMS can be sent on a slot.
     /// @param slot         0-based
-    /// @param status       receives the card status, which is not judged
+    /// @param status       receives the card status, which does not affect the result
     /// @param serviceType  receives the network service type: 0 unknown, 1 none, 2 emergency only, 3 searching, 4 and above real
     /// @return whether the card status was read and the service type is above 3. Holds the lock.
     bool IsAvaliableSendSMS(int slot, TelSimCardStatus_t* status, int* serviceType);
 
     /// @name Country lookups
-    /// Keys and results are texts as the tables hold them: MCC of three digits (ITU-T E.212), alpha-2 code in lower case and
-    /// alpha-3 code in upper case (ISO 3166-1), calling code as bare digits (ITU-T E.164), service country code as "en_GB". A key
-    /// matches to the letter; the first of several matching rows answers. The result is a copy released with free(), null when
-    /// nothing matches (logged, also for a null key) or there is no memory. None of them blocks.
+    /// Forms of keys and results: MCC of three digits (ITU-T E.212), alpha-2 code in lower case and alpha-3 code in upper case
+    /// (ISO 3166-1), calling code as digits without a prefix (ITU-T E.164), service country code such as "en_GB". A key must match
+    /// exactly; if several rows match, the first is used. The result is a copy, released with free(); null when nothing matches
+    /// (logged, also for a null key) or there is no memory. None of them blocks.
     /// @{
 
-    /// @return whether the MCC is one of a country; logged when not
+    /// @return whether the MCC belongs to a country; logged when not
     bool IsValidMcc(char* mcc);
 
-    /// @return whether the MCC is one of those that support mobile-originated messages; never logged
+    /// @return whether the country with that MCC supports mobile-originated messages; never logged
     bool IsMoSupportMcc(const char* mcc);
 
     /// MCC to alpha-2 code.
@@ -184,7 +184,7 @@ public:
     void GetAlpha3CountryCodeFromMcc(const char* mcc, char** alpha3CountryCode);
     /// @}
 
-    static DASimManager* __pInstance; ///< the instance, null until it is made
+    static DASimManager* __pInstance; ///< the instance; null until it is made
 };
 
 #endif

@@ -16,44 +16,43 @@
 #include <string>
 #include <vector>
 
-/// The facade of the library: what the agent asks about device, SIMs, countries and network, and what it has to tell.
+/// The facade of the library: answers the agent's queries about device, SIMs, countries and network, and sends its notifications.
 ///
-/// It keeps no state: nothing is remembered from one call to the next. Results are copies that the caller releases with free()
-/// unless a member says otherwise. Any thread may call any member, SetConnectionEventListener() as told there. When a manager
-/// behind the facade can not be made for want of memory, a member gives its failure result: false, null, a code of 4, a connection
-/// state of 0; what always returns 0 still does.
+/// It keeps no state between calls. Results are copies, released with free(), unless documented otherwise. Any thread may call any
+/// member; SetConnectionEventListener() has restrictions. When there is no memory for a manager behind the facade, a member returns
+/// its failure result: false, null, code 4 or KIV_CONNECTION_STATE_UNKNOWN. A member that always returns 0 still does.
 class KIV_SYSTEM_API DASystem
 {
 public:
-    /// The one instance, made on first use, never deleted; null when there is no memory for it, and the next call tries again.
-    /// Any thread; holds a lock of its own.
+    /// Returns the one instance, made on first use and never deleted; null when there is no memory for it, and the next call tries
+    /// again. Any thread; holds a lock of its own.
     static DASystem* GetInstance();
 
-    DASystem();          ///< holds nothing; GetInstance() gives the one to ask
+    DASystem();          ///< holds nothing; use GetInstance() instead
     virtual ~DASystem(); ///< releases nothing
 
     /// @name Connection state
-    /// As DAConnectionManager tells of the members of the same names.
+    /// See the members of the same name in DAConnectionManager.
     /// @{
 
     /// Registers the listener of connection changes; null unregisters.
     void SetConnectionEventListener(IDAConnectionStateListener* listener, void* userData);
 
-    /// @return a connection_cellular_state_e; KIV_CONNECTION_STATE_UNKNOWN, which is -1, when it cannot be read
+    /// @return a connection_cellular_state_e, or KIV_CONNECTION_STATE_UNKNOWN (-1) when it cannot be read
     int GetCellularNetworkState();
 
-    /// @return a connection_wifi_state_e; KIV_CONNECTION_STATE_UNKNOWN when it cannot be read
+    /// @return a connection_wifi_state_e, or KIV_CONNECTION_STATE_UNKNOWN (-1) when it cannot be read
     int GetWifiNetworkState();
 
-    /// @return a connection_bt_state_e; KIV_CONNECTION_STATE_UNKNOWN when it cannot be read
+    /// @return a connection_bt_state_e, or KIV_CONNECTION_STATE_UNKNOWN (-1) when it cannot be read
     int GetBTNetworkState();
 
-    /// @return whether the cellular connection or another selected one is up
+    /// @return whether the cellular connection or a selected other one is up
     bool IsNetworkConnected(bool checkWifi, bool checkBT);
     /// @}
 
     /// @name Telephony and SIM by slot or modem
-    /// As DASimManager tells of the members of the same names.
+    /// See the members of the same name in DASimManager.
     /// @{
 
     /// Reads whether the device is roaming on a slot that is in service. @return whether it was read; false for a null pointer
@@ -74,11 +73,11 @@ public:
     /// @return whether an SMS can be sent on a slot
     bool IsAvaliableSendSMS(int slot, TelSimCardStatus_t* status, int* serviceType);
 
-    /// Waits until a card is usable or never will be, without a bound once its modem is open; the second argument is not read.
+    /// Waits until a card is usable or never will be, without a time limit once its modem is open. Ignores the second argument.
     /// @return whether it is usable
     bool IsAvaliableSimStateOnPolling(int slot, int, TelSimCardStatus_t* status);
 
-    /// @return whether a card of that status may become usable by waiting
+    /// @return whether a card with that status may become usable later
     bool IsWaittingSimCheck(TelSimCardStatus_t status);
 
     /// Reads which SIM is the default one for the network.
@@ -96,7 +95,7 @@ public:
     /// Reads the parts of the IMSI by modem name.
     bool GetSimInfo(const char* cpName, std::string* mcc, std::string* mnc, std::string* msin);
 
-    /// Reads the subscriber number behind one handle.
+    /// Reads the subscriber number by handle.
     bool GetPhoneNumber(telephony_data** handle, char** number);
 
     /// @return whether the SIM of at least one slot is available
@@ -104,58 +103,58 @@ public:
     /// @}
 
     /// @name SIM queries over all slots
-    /// Each opens the handles itself, asks the slots in ascending order and closes them again. Blocks on the modems.
+    /// Each opens the telephony handles, queries the slots in ascending order, and closes the handles. Each blocks on the modems.
     /// @{
 
-    /// @return whether the SIM of some slot is available
+    /// @return whether the SIM of at least one slot is available
     bool IsSimAvailable();
 
-    /// @return whether the device has two slots at least and the SIMs of slots 0 and 1 are available
+    /// @return whether the SIMs of slots 0 and 1 are both available
     bool IsDualSimAvailable();
 
-    /// The MCC of the first SIM that answers.
-    /// @return 0; 4 when no SIM answers, telephony can not be opened or there is no memory for the copy, and the out-parameter is
-    ///         untouched
+    /// Reads the MCC of the first SIM that answers.
+    /// @return 0, or 4 when no SIM answers, telephony cannot be opened or there is no memory for the copy; then the out-parameter
+    ///         is unchanged
     int GetMCCFromSim(char** mcc);
 
-    /// The MNC of the first SIM that answers. @return as GetMCCFromSim()
+    /// Reads the MNC of the first SIM that answers. @return as GetMCCFromSim()
     int GetMNCFromSim(char** mnc);
 
-    /// The IMSI of the first SIM that answers. @return as GetMCCFromSim()
+    /// Reads the IMSI of the first SIM that answers. @return as GetMCCFromSim()
     int GetIMSIFromSim(char** imsi);
 
-    /// The subscriber number of the first SIM that answers.
-    /// @return 0; 4 when telephony can not be opened or there is no memory for the copy, TELEPHONY_ERROR_SIM_NOT_AVAILABLE when no
-    ///         SIM answers, and the out-parameter is untouched
+    /// Reads the subscriber number of the first SIM that answers.
+    /// @return 0; TELEPHONY_ERROR_SIM_NOT_AVAILABLE when no SIM answers; 4 when telephony cannot be opened or there is no memory
+    ///         for the copy. On failure the out-parameter is unchanged.
     int GetPhoneNumberFromSim(char** number);
 
-    /// Appends the MCC of every SIM that answers; a SIM that does not leaves no gap.
-    /// @param values  each text appended is released with free()
-    /// @param count   receives the number appended by this call; like the vector untouched when telephony can not be opened
+    /// Appends the MCC of every SIM that answers, and nothing for the others.
+    /// @param values  release each appended text with free()
+    /// @param count   receives the number of appended texts; unchanged, like the vector, when telephony cannot be opened
     void GetMCCFromSim(std::vector<char*>* values, int* count);
 
-    /// Appends the MNC of every SIM that answers, as the MCC one does.
+    /// Appends the MNC of every SIM that answers. See GetMCCFromSim().
     void GetMNCFromSim(std::vector<char*>* values, int* count);
 
-    /// Appends the IMSI of every SIM that answers, as the MCC one does.
+    /// Appends the IMSI of every SIM that answers. See GetMCCFromSim().
     void GetIMSIFromSim(std::vector<char*>* values, int* count);
 
-    /// Appends the subscriber number of every SIM that answers, as the MCC one does.
+    /// Appends the subscriber number of every SIM that answers. See GetMCCFromSim().
     void GetPhoneNumberFromSim(std::vector<char*>* values, int* count);
     /// @}
 
     /// @name Country lookups
-    /// As DASimManager tells of the members of the same names, with a guard: a null or empty key is logged, gives false, and
-    /// leaves the out-parameter as it was.
+    /// See the members of the same name in DASimManager. In addition, a null or empty key is logged and refused: the result is
+    /// false or the out-parameter is unchanged.
     /// @{
 
-    /// @return whether the MCC is one of a country
+    /// @return whether the MCC belongs to a country
     bool IsValidMcc(char* mcc);
 
-    /// @return whether the MCC is one of a country
+    /// @return whether the MCC belongs to a country
     bool IsValidMcc(const char* mcc);
 
-    /// @return whether the MCC is one of those that support mobile-originated messages
+    /// @return whether the country with that MCC supports mobile-originated messages
     bool IsMoSupportMcc(const char* mcc);
 
     /// MCC to alpha-2 code.
@@ -182,128 +181,129 @@ public:
     /// Calling code to MCC.
     void GetMccFromCountryCallingCode(const char* countryCallingCode, char** mcc);
 
-    /// Calling code to English country name; the out-parameter is untouched when no country has that calling code.
+    /// Calling code to English country name; the out-parameter is unchanged when no country has that calling code.
     void GetCountryNameFromCountryCallingCode(const char* countryCallingCode, char** countryName);
 
-    /// Calling code to alpha-2 code, despite the name; the out-parameter is untouched when no country has that calling code.
-    /// @param countryCallingCode  bare digits
-    /// @param countryCode         receives constant text of the library, which the caller neither frees nor changes
+    /// Calling code to alpha-2 code, despite the name; the out-parameter is unchanged when no country has that calling code.
+    /// @param countryCallingCode  digits without a prefix
+    /// @param countryCode         receives constant text of the library; do not free or change it
     void GetCountryNameAlpha2FromCountryCallingCode(const char* countryCallingCode, char** countryCode);
     /// @}
 
     /// @name Bus
     /// @{
 
-    /// Asks for the device unique ID, the board serial number, afresh on each call.
-    /// @param id  receives a text released with g_free(), or null; written in every case
-    /// @return a result code of DADBusManager. Blocks on the bus, 25 seconds at most once connected.
+    /// Requests the device unique ID, which is the board serial number. Nothing is cached.
+    /// @param id  always written: receives a text, released with g_free(), or null
+    /// @return a result code of DADBusManager
+    /// Blocks on the bus, once connected at most 25 seconds.
     int GetDeviceUniqueID(const char** id);
 
-    /// Tells every client service that subscribed to the event, one after the other. The service manager is told with the member
-    /// of DADBusManager of the same name.
-    /// @param type        what it is about
+    /// Notifies every client service that subscribed to the event, one after the other. To notify the service manager, call the
+    /// member of the same name in DADBusManager.
+    /// @param type        the event
     /// @param imsi        subscriber identity of the SIM concerned
-    /// @param service_id  of types 3, 4 and 5
-    /// @param ServiceStatus,PolicyFeature,PolicyVersion,PolicyDocURL  texts of types 5 and 8, all four required
-    /// @return 0 once dispatched, whatever became of the calls; 4 when the type is unknown or a text of type 5 is null
-    /// Blocks until the last subscriber answered or left the bus, without a time limit.
+    /// @param service_id  for types 3, 4 and 5
+    /// @param ServiceStatus,PolicyFeature,PolicyVersion,PolicyDocURL  for types 5 and 8, which require all four
+    /// @return 0, even if calls failed; 4 when the type is unknown or a text of type 5 is null
+    /// Blocks until the last subscriber has answered or left the bus, without a time limit.
     int SendNotiToServiceManager(_KIV_NOTI_TYPE_E type, const char* imsi, int service_id, const char* ServiceStatus,
         const char* PolicyFeature, const char* PolicyVersion, const char* PolicyDocURL);
 
-    /// Sends one status notification an entry, in order.
+    /// Sends one status notification per entry, in order.
     /// @param imsi         subscriber identity of the SIM concerned
-    /// @param count        number of entries of both arrays, at least 1
-    /// @param service_ids  one service a notification
-    /// @param statuses     one status text a notification
+    /// @param count        number of entries in each array, at least 1
+    /// @param service_ids  one service per notification
+    /// @param statuses     one status text per notification
     /// @return 0
-    /// Blocks as SendNotiToServiceManager() does.
+    /// Blocks like SendNotiToServiceManager().
     int SendMultiOnOffNotiToServiceManager(const char* imsi, int count, int* service_ids, char** statuses);
     /// @}
 
     /// @name Device and platform
-    /// An int result is the platform's own code, 0 on success; -ENOMEM when there is no memory for a copy. A platform that succeeds
-    /// without a text gives null. Texts are released with free(). Each blocks on the platform.
+    /// An int result is the platform's own code, 0 on success, or -ENOMEM when there is no memory for a copy. When the platform
+    /// succeeds without a text, the out-parameter receives null. Texts are released with free(). Each blocks on the platform.
     /// @{
 
-    /// The device's name; null when the platform gives none.
+    /// Reads the device's name; null when the platform returns none.
     int GetDeviceName(char** name);
 
-    /// The platform's device ID; untouched on failure.
+    /// Reads the platform's device ID; unchanged on failure.
     int GetTizenIdN(char** id);
 
-    /// The font size setting; not meaningful on failure.
+    /// Reads the font size setting; not meaningful on failure.
     int GetFontSize(int* size);
 
-    /// The current local time; all zero when the platform gives none, as after 19 January 2038 where its time_t has 32 bits.
+    /// Reads the current local time; all zero when the platform returns none, as after 19 January 2038 with a time_t of 32 bits.
     int GetCurrentTime(tm* now);
 
-    /// The platform's name; null when the platform gives none.
+    /// Reads the platform's name; null when the platform returns none.
     int GetPlatformName(char** name);
 
-    /// The platform's version; null when the platform gives none.
+    /// Reads the platform's version; null when the platform returns none.
     int GetSWVersion(char** version);
 
-    /// The device's model name; null when the platform gives none.
+    /// Reads the device's model name; null when the platform returns none.
     int GetModelName(char** model);
 
-    /// The version of an installed package; untouched on failure, null when the platform succeeds without one.
+    /// Reads the version of an installed package; unchanged on failure, null when the platform succeeds without one.
     int GetPackageVersion(const char* packageId, char** version);
 
-    /// The IMEI of the first modem that answers; when none does, a text of 15 characters at least that is made of the local
-    /// time's offset from UTC in seconds, followed by zeros; null when there is no memory for it. That text does not identify the
-    /// device: all devices in a time zone have the same one, and it starts with a minus sign west of Greenwich.
+    /// Reads the IMEI of the first modem that answers. When none does, returns a text of at least 15 characters: the local time's
+    /// offset from UTC in seconds, followed by zeros; null when there is no memory for it. That text does not identify the device:
+    /// all devices in a time zone have the same one, and west of Greenwich it starts with a minus sign.
     /// @return 0
     int GetIMEI(char** imei);
 
-    /// @return whether flight mode is on; false when the platform does not tell
+    /// @return whether flight mode is on; false also when the query fails
     bool IsFlightMode();
 
-    /// @return whether data roaming is on; false when the platform does not tell
+    /// @return whether data roaming is on; false also when the query fails
     bool IsDataRoamingEnabled();
 
-    /// @return whether mobile data is on; false when the platform does not tell
+    /// @return whether mobile data is on; false also when the query fails
     bool IsMobileData();
 
-    /// @return whether a package of that name is installed; false for a null or empty name, and when the platform does not tell
+    /// @return whether a package of that name is installed; false also for a null or empty name, and when the query fails
     bool IsPackageInstalled(char* packageName);
 
     /// @param requiredMiB  in mebibytes of 1,048,576 bytes
-    /// @return whether more than that is free in the internal storage; false when the platform does not tell
+    /// @return whether more than that is free in the internal storage; false also when the query fails
     bool IsSystemMemoryAvailable(double requiredMiB);
 
-    /// @return the sales code; null when it can not be read
+    /// @return the sales code; null when it cannot be read
     char* GetCSC();
     /// @}
 
     /// @name Device language
-    /// None blocks but the first.
+    /// Only the first one blocks.
     /// @{
 
-    /// The language that the device is set to; "en_us" stands in for a setting that can not be read.
-    /// @param languageCode  receives a copy released with free(); untouched when the language has no ISO 639-2 code here, or there
-    ///                      is no memory
+    /// Reads the language setting of the device; uses "en_us" if it cannot be read.
+    /// @param languageCode  receives a copy, released with free(); unchanged when the language has no known ISO 639-2 code, or
+    ///                      when there is no memory
     /// @param isISO639      true for the ISO 639-2 code ("eng"), false for the language part of the setting in upper case ("EN")
-    /// @return the platform's code of reading the setting. Blocks on the platform.
+    /// @return the platform's code for reading the setting. Blocks on the platform.
     int GetDeviceLanguageCode(char** languageCode, bool isISO639);
 
     /// ISO 639-1 code in upper case to ISO 639-2 code.
     /// @param deviceLang      ISO 639-1, upper case
-    /// @param iso639LangCode  receives constant text of the library, which the caller must not free; null when there is none
+    /// @param iso639LangCode  receives constant text of the library, or null; do not free or change it
     void GetISO639LangCodeFromDeviceLang(std::string deviceLang, char** iso639LangCode);
 
-    /// @return the index of the first place where the whole of tag stands in source; -1 when there is none
+    /// @return the index at which tag first occurs in source; -1 when it does not
     int GetTagStartPosition(std::string source, std::string tag);
 
-    /// @return the part of source between the two positions, both included; to its end when the end stands further before the
-    ///         start than by one
-    /// Throws std::out_of_range when the start lies beyond the end of source or is negative: the one member that may throw.
+    /// @return the part of source from startPosition to endPosition, both included; empty when endPosition is startPosition - 1,
+    ///         and up to the end of source when it is even lower
+    /// Throws std::out_of_range when startPosition is negative or beyond the end of source. No other member throws.
     std::string GetValueFromPosition(std::string source, int startPosition, int endPosition);
 
-    /// @return the capital of a lower-case ASCII letter, any other byte unchanged
+    /// @return the capital of a lower-case ASCII letter; any other byte unchanged
     char To_Capital(char ch);
     /// @}
 
-    static DASystem* __pInstance; ///< the instance, null until it is made
+    static DASystem* __pInstance; ///< the instance; null until it is made
 };
 
 #endif

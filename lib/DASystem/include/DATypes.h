@@ -6,7 +6,7 @@
 /// Marks what the library exports.
 #define KIV_SYSTEM_API __attribute__((visibility("default")))
 
-/// What a notification is about. Other values are refused where a type is taken.
+/// The event that a notification reports. Members refuse other values.
 enum _KIV_NOTI_TYPE_E : int
 {
     KIV_NOTI_TYPE_AUTH_SUCCESS = 1,  ///< authentication succeeded

@@ -5,12 +5,11 @@
 
 #include <wifi.h>
 
-/// Hears of changes of the connection situation; implemented by the agent, registered with
-/// DASystem::SetConnectionEventListener().
+/// Is notified of connection changes. The agent implements it and registers it with DASystem::SetConnectionEventListener().
 ///
-/// Every operation runs in the thread in which the platform delivers the change, and gets the context pointer of the
-/// registration. None may let an exception out: the platform's C code stands above it. What the library calls are the first
-/// five virtual operations, in this order.
+/// Every operation runs in the thread in which the platform delivers the change, and receives the userData of the registration.
+/// None may throw, since the platform's C code calls it. The library calls the first five virtual functions of the class; their
+/// order is fixed.
 class KIV_SYSTEM_API IDAConnectionStateListener
 {
 public:
@@ -20,7 +19,7 @@ public:
     /// The Wi-Fi connection state changed.
     /// @param state     the new one
     /// @param ap        the platform's access point handle; borrowed for the call
-    /// @param userData  as of the registration
+    /// @param userData  from the registration
     virtual void OnWifiConnectionStateChanged(wifi_connection_state_e state, void* ap, void* userData) = 0;
 
     /// Flight mode was switched.

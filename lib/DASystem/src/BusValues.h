@@ -1,5 +1,5 @@
 /// @file
-/// The values of a call's body, and what may go on the bus.
+/// The values of a call's body, and checks of what may be sent on the bus.
 #ifndef KIV_BUSVALUES_H
 #define KIV_BUSVALUES_H
 
@@ -40,7 +40,7 @@ inline bool HaveTexts(const Place& here, Values values)
     return true;
 }
 
-/// Whether every text that is there is valid UTF-8; logs the first that is not. GLib would put a text of its own in its place.
+/// Whether every text is null or valid UTF-8; logs the first that is not. GLib would replace such a text by another.
 inline bool AreUtf8(const Place& here, Values values)
 {
     for (const Value& value : values)
@@ -54,7 +54,7 @@ inline bool AreUtf8(const Place& here, Values values)
     return true;
 }
 
-/// The values as a tuple, floating.
+/// Returns the values as a tuple, floating.
 inline GVariant* Tuple(Values values)
 {
     GVariantBuilder builder;
@@ -71,14 +71,14 @@ inline GVariant* Tuple(Values values)
     return g_variant_builder_end(&builder);
 }
 
-/// The values as the one structure argument that subscribers take, floating.
+/// Returns the values as the one structure argument of the subscribers' methods, floating.
 inline GVariant* StructureArgument(Values values)
 {
     GVariant* const structure = Tuple(values);
     return g_variant_new_tuple(&structure, 1);
 }
 
-/// The reason of a failure in words. GDBus fails without a GError when a name, path or interface cannot be one.
+/// Returns the reason of a failure in words. GDBus sets no GError when a name, path or interface is malformed.
 inline const char* Reason(const GError* error)
 {
     return error == nullptr || error->message == nullptr ? "no reason given" : error->message;

@@ -1,5 +1,5 @@
 /// @file
-/// How a card status is judged, and what a SIM state is called in the log.
+/// What a card status means, and the names of SIM states in the log.
 #ifndef KIV_CARDSTATUS_H
 #define KIV_CARDSTATUS_H
 
@@ -16,13 +16,13 @@ enum class OnPolling
     Usable
 };
 
-/// How a card status is judged.
+/// What a card status means.
 struct CardStatus
 {
     int status;
     OnPolling onPolling;
     bool isUsable;  ///< now
-    bool isWaiting; ///< may become usable
+    bool isWaiting; ///< may become usable later
 };
 
 // clang-format off
@@ -47,7 +47,7 @@ inline constexpr CardStatus CardStatusTable[] = {
 };
 // clang-format on
 
-/// The row of a status; one that the platform does not name is a definite failure.
+/// Returns the row of a status; an unknown status counts as a definite failure.
 inline CardStatus Judge(TelSimCardStatus_t status)
 {
     for (const CardStatus& row : CardStatusTable)
@@ -58,7 +58,7 @@ inline CardStatus Judge(TelSimCardStatus_t status)
     return {status, OnPolling::Stop, false, false};
 }
 
-/// A SIM state that is not a usable one, as the log tells it.
+/// Returns the name of an unusable SIM state, for the log.
 inline const char* NameOf(telephony_sim_state_e state)
 {
     switch (state)

@@ -1,5 +1,5 @@
 /// @file
-/// The constant tables of countries and languages. Of several rows with one key a lookup answers from the first, unless it says
+/// The constant tables of countries and languages. If several rows have the same key, a lookup uses the first unless documented
 /// otherwise.
 #ifndef KIV_COUNTRYTABLES_H
 #define KIV_COUNTRYTABLES_H
@@ -9,7 +9,7 @@
 namespace kiv
 {
 
-/// The rows as they are listed. Only the compiler reads them; the library contains the columns below.
+/// The rows as written. Only the compiler reads them; the library contains the columns below.
 namespace listed
 {
 
@@ -23,7 +23,7 @@ struct CountryInfo
 struct ServiceCountryCode
 {
     const char* mcc;
-    const char* serviceCountryCode; ///< as "en_GB"
+    const char* serviceCountryCode; ///< such as "en_GB"
 };
 
 struct CountryCallingCode
@@ -92,7 +92,7 @@ static_assert(std::size(kISO639LangCode) == 160);
 
 } // namespace listed
 
-/// Of DASimManager and DASystem.
+/// DASimManager and DASystem search it.
 struct CountryInfoTable
 {
     static constexpr KeyColumn<listed::kCountryInfo, &listed::CountryInfo::mcc> mcc{};
@@ -100,7 +100,7 @@ struct CountryInfoTable
     static constexpr TextColumn<listed::kCountryInfo, &listed::CountryInfo::countryName> countryName{};
 };
 
-/// The countries whose operators support messages from the mobile. Only their MCCs are ever read.
+/// The countries whose operators support mobile-originated messages. Only the MCCs are read.
 struct MoSupportMccTable
 {
     static constexpr KeyColumn<listed::kMoSupportMcc, &listed::CountryInfo::mcc> mcc{};

@@ -12,7 +12,7 @@ IDAConnectionStateListener* DAConnectionManager::__pListener = nullptr;
 namespace
 {
 
-/// Asks for one state over a connection handle of its own; KIV_CONNECTION_STATE_UNKNOWN when it cannot be read.
+/// Reads one state with a connection handle of its own; KIV_CONNECTION_STATE_UNKNOWN when it cannot be read.
 template <class State>
 int ReadState(int (*read)(connection_h, State*))
 {
@@ -37,7 +37,7 @@ DAConnectionManager::~DAConnectionManager() = default;
 
 void DAConnectionManager::SetConnectionEventListener(IDAConnectionStateListener* listener, void* userData)
 {
-    __pListener = listener; // first, so that a change that arrives during the registration meets it
+    __pListener = listener; // first, so that it receives changes during the registration
     wifi_initialize();
 
     if (__pListener == nullptr)

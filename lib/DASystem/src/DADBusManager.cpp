@@ -116,7 +116,7 @@ int DADBusManager::GetDeviceUniqueID(const char*& uniqueId)
 namespace
 {
 
-/// What a type says to the service manager, floating; null for a type that says nothing to it.
+/// Returns the body of a type's call to the service manager, floating; null for a type that only subscribers receive.
 GVariant* ManagerBody(const kiv::NotificationType& row, const char* imsi, int serviceId, Values policy)
 {
     switch (row.body)
@@ -181,7 +181,7 @@ int DADBusManager::SendNotiToServiceManager(_KIV_NOTI_TYPE_E type, const char* i
         return KIV_RESULT_INVALID_ARGUMENT;
     }
 
-    g_autoptr(GVariant) body = g_variant_ref_sink(values); // GDBus drops a floating one when the service manager does not run
+    g_autoptr(GVariant) body = g_variant_ref_sink(values); // GDBus frees a floating one when the service manager is not running
     g_autoptr(GVariant) reply =
         g_dbus_proxy_call_sync(proxy, row->event.method, body, G_DBUS_CALL_FLAGS_NONE, G_MAXINT, nullptr, &error);
     if (reply == nullptr)
@@ -235,7 +235,7 @@ void free_user_data(GList* list)
     KIV_INFO("end");
 }
 
-/// What travels with one delivery through its callbacks: copies of service id, data and message, and the time, in this order.
+/// The data of one delivery's callbacks: copies of service id, data and message, and the time, in this order.
 using Delivery = kiv::Owned<GList, free_user_data>;
 
 Delivery MakeDelivery(const char* service_id, const char* noti_data, const char* noti_msg, gint64 noti_time)
@@ -251,7 +251,7 @@ void proxy_call_cb(GObject* source, GAsyncResult* result, gpointer user_data)
     KIV_INFO("begin");
     {
         const Delivery delivery(static_cast<GList*>(user_data));
-        g_autoptr(GDBusProxy) proxy = G_DBUS_PROXY(source); // the reference that proxy_new_cb() got
+        g_autoptr(GDBusProxy) proxy = G_DBUS_PROXY(source); // the reference from proxy_new_cb()
         g_autoptr(GError) error = nullptr;
         g_autoptr(GVariant) reply = g_dbus_proxy_call_finish(proxy, result, &error);
         if (reply == nullptr)
@@ -262,7 +262,7 @@ void proxy_call_cb(GObject* source, GAsyncResult* result, gpointer user_data)
     KIV_INFO("end");
 }
 
-/// @param source  the proxy to finish; null when there was no connection to make one on
+/// @param source  the proxy to finish; null when there was no connection for one
 void proxy_new_cb(GObject* source, GAsyncResult* result, gpointer user_data)
 {
     KIV_INFO("begin");
@@ -289,7 +289,7 @@ void proxy_new_cb(GObject* source, GAsyncResult* result, gpointer user_data)
     KIV_INFO("end");
 }
 
-/// One delivery that waits for the connection.
+/// A delivery that waits for the connection.
 struct Start
 {
     _SubscriberInfo subscriber;
@@ -297,7 +297,7 @@ struct Start
 };
 using Push = std::vector<Start>;
 
-/// Starts every delivery of a push, on the connection that was requested for it.
+/// Starts every delivery of a push on the requested connection.
 void connection_cb(GObject*, GAsyncResult* result, gpointer push)
 {
     g_autoptr(GError) error = nullptr;
@@ -305,7 +305,7 @@ void connection_cb(GObject*, GAsyncResult* result, gpointer push)
     const std::unique_ptr<Push> starts(static_cast<Push*>(push));
     for (Start& start : *starts)
     {
-        if (connection != nullptr && g_dbus_connection_is_closed(connection)) // over which GDBus would print messages
+        if (connection != nullptr && g_dbus_connection_is_closed(connection)) // GDBus would print messages about it
         {
             g_set_error_literal(&error, G_IO_ERROR, G_IO_ERROR_CLOSED, "The connection is closed");
             g_clear_object(&connection);
@@ -337,7 +337,7 @@ int DADBusManager::DeliverPushMessage(const char* service_id, const char* noti_d
             store.GetSubscriber("push", service_id, subscribers);
 
             auto push = std::make_unique<Push>();
-            push->reserve(subscribers.size()); // from here on nothing runs out of memory
+            push->reserve(subscribers.size()); // from here on no allocation can throw
             for (_SubscriberInfo& subscriber : subscribers)
             {
                 kiv::LogRecord(here, subscriber);

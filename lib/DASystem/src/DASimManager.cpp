@@ -29,7 +29,7 @@ DASimManager* DASimManager::__pInstance = nullptr;
 namespace
 {
 
-/// A copy of the cell beside the first one with this key; null, and the error line, when there is none.
+/// Copies the result cell of the first row with this key; null, and logs, when there is none.
 template <class Keys, class Cells>
 char* Lookup(const Keys& keys, const char* key, const Cells& cells, const Place& here, const char* failure)
 {
@@ -150,7 +150,7 @@ char** DASimManager::GetCpNameList()
 namespace
 {
 
-/// Opens a modem that may still be starting; null after 100 attempts a second apart.
+/// Opens a modem that may still be starting; null after 100 attempts, one per second.
 Tapi WaitForModem(const Place& here, int slot)
 {
     constexpr int kAttempts = 100;
@@ -218,7 +218,7 @@ bool DASimManager::IsAvaliableState(int slot, TelSimCardStatus_t* status)
 bool DASimManager::IsAvaliableSimStateOnPolling(int slot, int, TelSimCardStatus_t* status)
 {
     const Tapi modem = WaitForModem(KIV_HERE, slot);
-    if (!modem)
+    if (modem == nullptr)
         return false;
 
     int pauses = 0;
@@ -257,8 +257,8 @@ bool ReadImsiRecord(int slot, TelSimImsiInfo_t& record)
     return modem && kiv::UnderSimAccess([&] { return tel_get_sim_imsi(modem.get(), &record); }) == 0;
 }
 
-/// Reads a text made of the IMSI record of a slot.
-/// @param text  makes the text of a record, with strdup()
+/// Reads a text from the IMSI record of a slot.
+/// @param text  makes the text from a record, with strdup()
 template <class Char, class Text>
 int ReadImsiText(DASimManager& manager, const telephony_handle_list_s& list, int slot, Char** out, Text text, const Place& here,
     const char* failure)
@@ -338,7 +338,7 @@ bool DASimManager::GetSimInfo(const char* cpName, std::string* mcc, std::string*
         return false;
 
     const Tapi modem(tel_init(cpName));
-    if (!modem)
+    if (modem == nullptr)
     {
         KIV_ERROR("tel_init error");
         return false;
@@ -350,7 +350,7 @@ bool DASimManager::GetSimInfo(const char* cpName, std::string* mcc, std::string*
         KIV_ERROR("tel_get_sim_imsi errno [%d]", code);
         return false;
     }
-    // Made first, then moved in: a text that finds no memory leaves all three of the caller's as they were.
+    // Copied first, then moved: when there is no memory for a text, all three of the caller's stay unchanged.
     return kiv::NoThrow(false,
         [&]
         {
@@ -421,13 +421,13 @@ bool DASimManager::CheckSmsEnabled(char* cpName, int* status)
 
 bool DASimManager::IsAvaliableSendSMS(int slot, TelSimCardStatus_t* status, int* serviceType)
 {
-    constexpr int kSearching = 3; // the service types above it are real service
+    constexpr int kSearching = 3; // higher service types mean service
     const SimAccess access;
     if (!access)
         return false;
 
     const Tapi modem = kiv::CpNames().Open(slot);
-    if (!modem)
+    if (modem == nullptr)
         return false;
     const int code = kiv::ReadCardStatus(modem, status);
     if (code != 0)

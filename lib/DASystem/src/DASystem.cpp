@@ -172,7 +172,7 @@ void DASystem::GetMccFromCountryCallingCode(const char* countryCallingCode, char
 void DASystem::GetCountryNameFromCountryCallingCode(const char* countryCallingCode, char** countryName)
 {
     const CString mcc = MccOfCallingCode(countryCallingCode, KIV_HERE);
-    if (!mcc)
+    if (mcc == nullptr)
         return;
     char* found = nullptr;
     Ask(&DASimManager::GetCountryNameFromMcc, mcc.get(), &found);
@@ -182,9 +182,9 @@ void DASystem::GetCountryNameFromCountryCallingCode(const char* countryCallingCo
 void DASystem::GetCountryNameAlpha2FromCountryCallingCode(const char* countryCallingCode, char** countryCode)
 {
     const CString mcc = MccOfCallingCode(countryCallingCode, KIV_HERE);
-    if (!mcc)
+    if (mcc == nullptr)
         return;
-    // An MCC that two countries share is answered by the last of them.
+    // Of two countries that share an MCC, the last is the answer.
     const std::size_t row = kiv::CountryInfoTable::mcc.LastRow(mcc.get());
     *countryCode = row == kiv::kNoRow ? nullptr : const_cast<char*>(kiv::CountryInfoTable::countryCode[row]);
 }
@@ -224,7 +224,7 @@ int DASystem::SendNotiToServiceManager(_KIV_NOTI_TYPE_E type, const char* imsi, 
             PolicyDocURL);
         break;
     }
-    return sent == kNoManager ? KIV_RESULT_INVALID_ARGUMENT : KIV_RESULT_SUCCESS; // what became of the calls is not told
+    return sent == kNoManager ? KIV_RESULT_INVALID_ARGUMENT : KIV_RESULT_SUCCESS; // even if calls failed
 }
 
 int DASystem::SendMultiOnOffNotiToServiceManager(const char* imsi, int count, int* service_ids, char** statuses)
@@ -244,7 +244,7 @@ int DASystem::SendMultiOnOffNotiToServiceManager(const char* imsi, int count, in
 namespace
 {
 
-/// The IMEI of the first modem that answers, the platform's own text.
+/// Reads the IMEI of the first modem that answers, the platform's own text.
 /// @return whether one answered
 bool FirstImei(const Place& here, char** imei)
 {
@@ -265,7 +265,7 @@ bool FirstImei(const Place& here, char** imei)
     return false;
 }
 
-/// What stands in for an IMEI: the offset from UTC in seconds, filled up with zeros to the length of one.
+/// Returns a substitute for the IMEI: the offset from UTC in seconds, padded with zeros to the same length.
 char* FallbackImei()
 {
     return kiv::NoThrow<char*>(nullptr,

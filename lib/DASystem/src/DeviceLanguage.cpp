@@ -1,4 +1,4 @@
-// The facade's members on the device language. They log nothing.
+// The facade's members for the device language. They log nothing.
 #include "DASystem.h"
 
 #include "CountryTables.h"
@@ -49,7 +49,7 @@ int DASystem::GetTagStartPosition(std::string source, std::string tag)
 
 std::string DASystem::GetValueFromPosition(std::string source, int startPosition, int endPosition)
 {
-    // Widened first: a negative length becomes one that reaches to the end.
+    // Computed in a wider type: converted, a negative length reaches to the end.
     const long long length = static_cast<long long>(endPosition) - startPosition + 1;
     return source.substr(static_cast<std::size_t>(startPosition), static_cast<std::size_t>(length));
 }

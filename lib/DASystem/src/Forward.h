@@ -8,8 +8,8 @@
 namespace kiv
 {
 
-/// Calls a member of a manager with these arguments: what every forward of the facade does.
-/// @param failure  the result when the manager can not be made
+/// Calls a member of a manager with these arguments. Every forward of the facade does this.
+/// @param failure  the result when the manager cannot be made
 template <class Manager, class Result, class... Parameters, class... Arguments>
 Result Ask(Result failure, Result (Manager::*member)(Parameters...), Arguments&&... arguments)
 {

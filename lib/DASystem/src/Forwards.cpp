@@ -1,4 +1,4 @@
-// Members of the facade that only forward. They log nothing of their own, so the name of this file is in no log line.
+// Members of the facade that only forward. They log nothing themselves, so no log line contains this file's name.
 #include "DASystem.h"
 
 #include "DAConnectionManager.h"

@@ -1,5 +1,5 @@
 /// @file
-/// The facade's country lookups behind their guard. All of it logs for the member whose place it is given.
+/// The facade's country lookups with their check of the key. The functions log in the name of the member at `here`.
 #ifndef KIV_GUARDEDLOOKUP_H
 #define KIV_GUARDEDLOOKUP_H
 
@@ -13,7 +13,7 @@
 namespace kiv
 {
 
-/// Whether there is a key to look up; logs that there is none.
+/// Whether the key is neither null nor empty; logs if not.
 inline bool HasKey(const char* key, const char* keyName, const Place& here)
 {
     if (key != nullptr && *key != '\0')
@@ -24,7 +24,7 @@ inline bool HasKey(const char* key, const char* keyName, const Place& here)
 
 using StringLookup = void (DASimManager::*)(const char*, char**);
 
-/// A string lookup of the manager behind the guard.
+/// Calls a string lookup of the manager if there is a key.
 inline void GuardedLookup(StringLookup lookup, const char* key, char** out, const char* keyName, const Place& here)
 {
     if (!HasKey(key, keyName, here))
@@ -34,7 +34,7 @@ inline void GuardedLookup(StringLookup lookup, const char* key, char** out, cons
     *out = found;
 }
 
-/// The MCC of a calling code behind the guard; null, and logged, when there is none.
+/// Returns the MCC of a calling code; null, and logs, when the code is empty or has none.
 inline CString MccOfCallingCode(const char* countryCallingCode, const Place& here)
 {
     if (!HasKey(countryCallingCode, "countryCallingCode", here))

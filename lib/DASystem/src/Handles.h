@@ -1,5 +1,5 @@
 /// @file
-/// Owners for what the platform's C interfaces hand out.
+/// Owners for handles and texts of the platform's C interfaces.
 #ifndef KIV_HANDLES_H
 #define KIV_HANDLES_H
 
@@ -9,7 +9,7 @@
 namespace kiv
 {
 
-/// Releases with a plain C function.
+/// Calls a C function to release an object.
 template <auto Release>
 struct ReleasedBy
 {
@@ -23,7 +23,7 @@ struct ReleasedBy
 template <class T, auto Release>
 using Owned = std::unique_ptr<T, ReleasedBy<Release>>;
 
-/// A text of strdup() or of the platform.
+/// A text from strdup() or from the platform.
 using CString = Owned<char, std::free>;
 
 } // namespace kiv

@@ -1,5 +1,5 @@
 /// @file
-/// Lines for the platform log, each told with the file, the member and the line that it belongs to.
+/// Writes lines to the platform log, each with a file, a member and a source line.
 #ifndef KIV_LOG_H
 #define KIV_LOG_H
 
@@ -8,7 +8,7 @@
 namespace kiv
 {
 
-/// Where a line belongs. A function that works for a member takes the member's place, and logs in its name.
+/// The origin of a log line. A function that works for a member receives the member's place and logs in its name.
 struct Place
 {
     const char* file;     ///< base name of the source file
@@ -18,16 +18,16 @@ struct Place
 
 } // namespace kiv
 
-/// The place where it stands; the base name is found when it is compiled.
+/// The place of this very line; the compiler finds the base name.
 #define KIV_HERE (::kiv::Place{__builtin_strrchr("/" __FILE__, '/') + 1, __func__, __LINE__})
 
-/// An error line or an information line: a printf format without the line's end, and what it prints, five values at most.
+/// Logs an error or information line: a printf format without the final newline, and at most five values.
 #define KIV_ERROR(...) KIV_LOG(DLOG_ERROR, "Error", KIV_HERE, __VA_ARGS__)
 #define KIV_INFO(...) KIV_LOG(DLOG_INFO, "Info", KIV_HERE, __VA_ARGS__)
 #define KIV_ERROR_AT(place, ...) KIV_LOG(DLOG_ERROR, "Error", place, __VA_ARGS__)
 #define KIV_INFO_AT(place, ...) KIV_LOG(DLOG_INFO, "Info", place, __VA_ARGS__)
 
-// A format without values and one with values differ by a comma, which standard C++17 can not leave out: pick by their number.
+// Standard C++17 cannot drop the comma after a format without values, so the number of arguments selects the macro.
 #define KIV_LOG(priority, label, place, ...)                                                                                       \
     KIV_PICK(__VA_ARGS__, KIV_LOG_VALUES, KIV_LOG_VALUES, KIV_LOG_VALUES, KIV_LOG_VALUES, KIV_LOG_VALUES, KIV_LOG_TEXT, 0)         \
     (priority, label, place, __VA_ARGS__)

@@ -1,8 +1,8 @@
 /// @file
-/// The columns of constant tables, and one linear pass over a column.
+/// The columns of constant tables, and a linear search in a column.
 ///
-/// A table is written as rows of pointers to texts, which exist only while it is compiled. The library holds columns that contain
-/// the texts themselves: they need no relocation, so no process has to write to their pages.
+/// A table is written as rows of pointers to texts, which exist only during compilation. The library contains columns with the
+/// texts themselves. These need no relocation, so no process writes to their pages.
 #ifndef KIV_LOOKUP_H
 #define KIV_LOOKUP_H
 
@@ -34,14 +34,14 @@ constexpr Word Pack(const char* text)
     return 0;
 }
 
-/// What a pass returns when no cell holds the key.
+/// The result of a search when no cell contains the key.
 constexpr std::size_t kNoRow = SIZE_MAX;
 
-/// A pass looks at blocks of so many cells at once, which the compiler turns into vector instructions, and then finds the row in
-/// its block.
+/// A search first compares blocks of this many cells, for which the compiler uses vector instructions, and then finds the row in
+/// the block.
 constexpr std::size_t kBlock = 8;
 
-/// Whether one of the cells in the block from a row on is the wanted one.
+/// Whether one of the cells of a block equals the wanted one.
 template <class Word>
 bool BlockHolds(const Word* block, Word wanted)
 {
@@ -51,13 +51,13 @@ bool BlockHolds(const Word* block, Word wanted)
     return found != 0;
 }
 
-/// A column of texts of 1 to 7 bytes, each in place in a cell as wide as an integer, so that a pass compares it at once.
+/// A column of texts of 1 to 7 bytes. Each is stored in a cell as wide as an integer, so that one comparison suffices.
 template <const auto& Rows, auto Cell>
 class KeyColumn
 {
     static constexpr std::size_t kRows = std::size(Rows);
 
-    /// Whether every text fits into such an integer, and its end too.
+    /// Whether every text fits into such an integer together with its terminating zero.
     template <class Word>
     static constexpr bool Fits()
     {
@@ -84,10 +84,10 @@ class KeyColumn
     alignas(16) std::array<Word, std::size(Rows)> cells_ = Packed();
 
 public:
-    /// The text of a row, which lives as long as the process.
+    /// Returns the text of a row, which lives as long as the process.
     const char* operator[](std::size_t row) const { return reinterpret_cast<const char*>(&cells_[row]); }
 
-    /// The first row that holds this text to the letter; kNoRow when there is none, as for null.
+    /// Returns the first row that contains exactly this text; kNoRow for none or null.
     std::size_t FirstRow(const char* key) const
     {
         const Word wanted = Pack<Word>(key);
@@ -103,7 +103,7 @@ public:
         return kNoRow;
     }
 
-    /// The last row that holds this text; the same otherwise.
+    /// Like FirstRow(), but the last match.
     std::size_t LastRow(const char* key) const
     {
         const Word wanted = Pack<Word>(key);
@@ -120,7 +120,7 @@ public:
     }
 };
 
-/// A column of texts of any length, one behind the other. It has no keys.
+/// A column of texts of any length, one after the other. It cannot be searched.
 template <const auto& Rows, auto Cell>
 class TextColumn
 {
@@ -147,11 +147,11 @@ public:
             starts_[row] = static_cast<Start>(end);
             for (const char ch : std::string_view(Rows[row].*Cell))
                 texts_[end++] = ch;
-            ++end; // past the text's end, which is there already
+            ++end; // skips the terminating zero, which is already there
         }
     }
 
-    /// The text of a row, which lives as long as the process.
+    /// Returns the text of a row, which lives as long as the process.
     const char* operator[](std::size_t row) const { return &texts_[starts_[row]]; }
 };
 

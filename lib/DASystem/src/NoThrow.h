@@ -7,8 +7,8 @@
 namespace kiv
 {
 
-/// Runs an operation whose means may throw (a lock that can not be recorded, a container that can not grow): nothing but its
-/// result leaves the library, and what it owned is released on the way out. A thread that is cancelled inside is not held up.
+/// Runs an operation and returns its result, or `failure` if it throws, for example because a lock or a container gets no memory.
+/// Lets the cancellation of a thread through.
 template <class Result, class Body>
 Result NoThrow(Result failure, Body&& body)
 {

@@ -1,6 +1,6 @@
 /// @file
-/// The notifications: one row per event and one per type. Both ways of sending them, to subscribers and to the service manager, go
-/// by these rows.
+/// The notifications: one row per event and one per type. Notifications to subscribers and to the service manager both use these
+/// rows.
 #ifndef KIV_NOTIFICATIONS_H
 #define KIV_NOTIFICATIONS_H
 
@@ -9,11 +9,11 @@
 namespace kiv
 {
 
-/// One kind of event: what the store is asked for, and what is called.
+/// One kind of event: its kind and key in the subscriber store, and the method to call.
 struct Notification
 {
     char kind[16];
-    char key[4]; ///< empty: the service id
+    char key[4]; ///< empty for the service id
     char method[16];
 };
 
@@ -26,24 +26,24 @@ inline constexpr Notification kActivated     {"activated",      "all",   "activa
 inline constexpr Notification kNumberChanged {"number_changed", "all",   "number_change"};
 // clang-format on
 
-/// What goes with the IMSI.
+/// The values sent besides the IMSI.
 enum class Body
 {
     Flag,   ///< a number
     Status, ///< the service id and a text
     Policy, ///< the service id and the four texts of a policy
-    Number  ///< four texts; to subscribers alone
+    Number  ///< four texts; only to subscribers
 };
 
-/// What a type says.
+/// The event and the values of a notification type.
 struct NotificationType
 {
     _KIV_NOTI_TYPE_E type;
     Body body;
     const Notification& event;
     int (DADBusManager::*sendFlag)(char*, int); ///< the member that sends a Body::Flag to subscribers
-    int flag;                                   ///< of Body::Flag
-    char status[4];                             ///< of Body::Status
+    int flag;                                   ///< for Body::Flag
+    char status[4];                             ///< for Body::Status
 };
 
 // clang-format off
@@ -60,7 +60,7 @@ inline constexpr NotificationType kNotificationTypes[] = {
 };
 // clang-format on
 
-/// The row of a type; null when there is none.
+/// Returns the row of a type; null when there is none.
 inline const NotificationType* FindType(_KIV_NOTI_TYPE_E type)
 {
     for (const NotificationType& row : kNotificationTypes)

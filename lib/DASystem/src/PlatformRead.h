@@ -1,5 +1,5 @@
 /// @file
-/// How the facade reads values of the platform's services, and hands out their texts.
+/// Reads values from the platform's services, and copies their texts for the caller.
 #ifndef KIV_PLATFORMREAD_H
 #define KIV_PLATFORMREAD_H
 
@@ -9,7 +9,7 @@
 namespace kiv
 {
 
-/// Reads one value of a platform service: stored in every case, zero or null when the service wrote none.
+/// Reads one value from a platform service. Always writes to `out`: zero or null when the service wrote nothing.
 template <class Key, class Value>
 int Read(int (*read)(Key, Value*), Key key, Value* out)
 {
@@ -19,7 +19,7 @@ int Read(int (*read)(Key, Value*), Key key, Value* out)
     return code;
 }
 
-/// Reads a switch of a platform service; off when the service wrote none.
+/// Reads a switch from a platform service; off when the service wrote nothing.
 template <class Key>
 bool ReadSwitch(int (*read)(Key, bool*), Key key)
 {
@@ -28,7 +28,7 @@ bool ReadSwitch(int (*read)(Key, bool*), Key key)
     return isOn;
 }
 
-/// Hands out a copy of a platform's text; a service that succeeds without one gives null.
+/// Copies a platform's text for the caller; null stays null.
 inline int CopyOut(const char* text, char** out)
 {
     char* const copy = text == nullptr ? nullptr : strdup(text);

@@ -6,7 +6,7 @@
 namespace kiv
 {
 
-/// Whether all four texts of a policy are there; logs all four when not.
+/// Whether none of a policy's four texts is null; logs all four otherwise.
 inline bool HavePolicyTexts(
     const Place& here, const char* ServiceStatus, const char* PolicyFeature, const char* PolicyVersion, const char* PolicyDocURL)
 {

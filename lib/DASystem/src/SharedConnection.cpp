@@ -9,11 +9,11 @@ namespace
 constexpr auto kBusClient = static_cast<GDBusConnectionFlags>(
     G_DBUS_CONNECTION_FLAGS_AUTHENTICATION_CLIENT | G_DBUS_CONNECTION_FLAGS_MESSAGE_BUS_CONNECTION);
 
-/// How many connections are being taken.
+/// The number of connections being taken.
 std::atomic<int> takers{0};
 
-/// Runs before anything else that a closed connection does. GDBus makes the shared one such that its end ends the process, and it
-/// may close before whoever takes it can change that.
+/// Runs before all other handlers of "closed". GDBus makes the shared connection so that it ends the process when it closes, and it
+/// may close before its taker can change that.
 gboolean OutliveBus(GSignalInvocationHint*, guint, const GValue* values, gpointer)
 {
     if (takers > 0)
@@ -23,14 +23,14 @@ gboolean OutliveBus(GSignalInvocationHint*, guint, const GValue* values, gpointe
 
 void BeginTaking()
 {
-    static const auto type = static_cast<GTypeClass*>(g_type_class_ref(G_TYPE_DBUS_CONNECTION)); // brings its signals into being
+    static const auto type = static_cast<GTypeClass*>(g_type_class_ref(G_TYPE_DBUS_CONNECTION)); // registers its signals
     static const gulong hook =
         g_signal_add_emission_hook(g_signal_lookup("closed", G_TYPE_FROM_CLASS(type)), 0, OutliveBus, nullptr, nullptr);
     static_cast<void>(hook);
     ++takers;
 }
 
-/// Whether GDBus has no thread here, because a parent of this process took the connection.
+/// Whether GDBus lacks its thread here, because a parent of this process took a connection.
 bool IsForked(GError** error)
 {
     static std::atomic<pid_t> user{0};
@@ -42,8 +42,8 @@ bool IsForked(GError** error)
     return true;
 }
 
-/// Makes a shared connection outlive its bus.
-/// @return whether there is nothing to connect for: it is alive, or connecting took too long, or nobody knows why there is none
+/// Keeps a shared connection from ending the process when it closes.
+/// @return whether not to try a private one: the shared one is alive, or timed out, or failed without a reason
 bool IsSettled(GDBusConnection* shared, const GError* error)
 {
     if (shared == nullptr)
@@ -54,7 +54,7 @@ bool IsSettled(GDBusConnection* shared, const GError* error)
 
 char* BusAddress()
 {
-    return g_dbus_address_get_for_bus_sync(G_BUS_TYPE_SYSTEM, nullptr, nullptr); // which always has one
+    return g_dbus_address_get_for_bus_sync(G_BUS_TYPE_SYSTEM, nullptr, nullptr); // never null for the system bus
 }
 
 void EndRequest(GTask* task, GDBusConnection* connection, GError* error)

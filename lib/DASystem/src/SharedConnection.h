@@ -1,6 +1,6 @@
 /// @file
-/// The one place that takes the connection to the system bus. GDBus shares a connection within the process, and goes on sharing one
-/// that died until the main context in which it was made has been iterated, as long as anybody holds it.
+/// The one place that takes the connection to the system bus. GDBus shares a connection within the process. As long as anybody
+/// holds a dead one, GDBus keeps sharing it until the main context in which it was made is iterated.
 #ifndef KIV_SHAREDCONNECTION_H
 #define KIV_SHAREDCONNECTION_H
 
@@ -11,29 +11,29 @@
 namespace kiv
 {
 
-/// Takes a connection that is alive: the shared one, or where that is dead, one for the caller alone.
-/// @param error  null before; receives why there is none, from the shared connection if that failed
+/// Takes a live connection: the shared one, or if that is dead, a private one for the caller.
+/// @param error  points to null; receives the reason on failure, that of the shared connection if it failed
 /// @return a new reference, or null
 ///
-/// - Once taken, no connection ends the process when it ends, whoever made it.
+/// - Once taken, a connection no longer ends the process when it closes, whoever made it.
 /// - Nothing is kept between calls, and no lock is held.
 /// - A child made by fork, in which GDBus has no thread, fails at once if its parent took a connection.
 ///
-/// Blocks while connecting: 25 seconds at most, but without a time limit on a bus that accepts connections and says nothing. Any
-/// thread. What is connected belongs to the caller's thread-default main context.
+/// Blocks while connecting: at most 25 seconds, but without a time limit on a bus that accepts connections and never answers. Any
+/// thread. A new connection belongs to the caller's thread-default main context.
 GDBusConnection* TakeConnection(GError** error);
 
-/// Starts the same and returns. The callback runs in the caller's thread-default main context and gets the outcome from
-/// FinishConnection(). Until then, no connection in the process ends the process when it ends.
+/// Starts to take a connection and returns. The callback runs in the caller's thread-default main context and calls
+/// FinishConnection(). Until then, no connection that closes ends the process.
 void RequestConnection(GAsyncReadyCallback callback, gpointer data);
 
-/// The outcome of a request, once each; after it, the callback sees what was written before the request.
-/// @param error  receives why there is none, from the last try
+/// Returns the outcome of a request; call it once per request. Afterwards the callback sees what was written before the request.
+/// @param error  receives the reason of the last attempt on failure
 /// @return a new reference, or null
 GDBusConnection* FinishConnection(GAsyncResult* result, GError** error);
 
-/// A main context for the proxies of one scope, in which it is the thread's default: what they leave behind ends with it, and the
-/// caller's context, which may never be iterated, sees nothing of it. No connection is to be taken within it.
+/// Makes a main context the thread's default for one scope. Proxies made in the scope leave nothing behind in the caller's context,
+/// which may never be iterated. Take no connection within the scope.
 class ProxyScope
 {
 public:

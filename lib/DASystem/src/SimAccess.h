@@ -20,7 +20,7 @@ namespace kiv
 
 inline constexpr char kSimAccess[] = "CORE_MUTEX_NAME_SIM_ACCESS";
 
-/// Holds the SIM-access lock for the rest of an operation; false when the lock can not be had for want of memory.
+/// Holds the SIM-access lock for the rest of an operation; false when there is no memory for the lock.
 class SimAccess
 {
 public:
@@ -41,7 +41,7 @@ private:
 };
 
 /// One platform call under the SIM-access lock.
-/// @return the call's code; an error too when the lock can not be had
+/// @return the call's code, or -ENOMEM when there is no memory for the lock
 template <class Call>
 int UnderSimAccess(Call&& call)
 {
@@ -67,7 +67,7 @@ class CpNames
 public:
     CpNames() : names_(tel_get_cp_name_list()) {}
 
-    /// The name of a slot's modem; null when there is none.
+    /// Returns the name of a slot's modem; null when there is none.
     const char* Of(int slot) const
     {
         const guint count = names_ == nullptr ? 0 : g_strv_length(names_.get());
@@ -98,7 +98,7 @@ public:
             telephony_deinit(&list_);
     }
 
-    /// None when it could not be opened.
+    /// Returns the number of slots; 0 when telephony could not be opened.
     int Count() const { return isOpen_ ? static_cast<int>(list_.count) : 0; }
 
     bool Has(int slot) const { return slot >= 0 && slot < Count(); }
@@ -115,7 +115,7 @@ inline bool HasSlot(const telephony_handle_list_s& list, int slot)
     return slot >= 0 && static_cast<unsigned>(slot) < list.count;
 }
 
-/// Reads a card status; the flag that it changed is of no use here.
+/// Reads a card status, without the flag that it changed.
 inline int ReadCardStatus(const Tapi& modem, TelSimCardStatus_t* status)
 {
     int cardChanged = 0;

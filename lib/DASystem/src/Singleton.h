@@ -12,14 +12,14 @@
 namespace kiv
 {
 
-/// The creation frame of the four classes: makes the instance on first use, under the lock named "FILE::FUNCTION" after the place.
-/// @param failure  the error line when there is no memory for the instance or for its lock's name
+/// Makes the instance of one of the four classes on first use, under a lock named "FILE::FUNCTION" after the place.
+/// @param failure  error line when there is no memory for the instance or the lock's name
 /// @return the instance; null without memory, and the next call tries again
 template <class Class>
 Class* Singleton(Class*& instance, const Place& here, const char* failure)
 {
     char name[128];
-    stpcpy(stpcpy(stpcpy(name, here.file), "::"), here.function); // "%s::%s" of constants, which the compiler writes out
+    stpcpy(stpcpy(stpcpy(name, here.file), "::"), here.function); // "%s::%s" of constants; the compiler does the work
 
     Class* const made = NoThrow<Class*>(nullptr,
         [&]

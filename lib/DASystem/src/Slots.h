@@ -30,7 +30,7 @@ public:
 
     explicit operator bool() const { return isOpen_; }
 
-    /// None when they could not be opened.
+    /// Returns the number of slots; 0 when telephony could not be opened.
     int Count() const { return isOpen_ ? static_cast<int>(list_.count) : 0; }
 
     bool IsAvailable(int slot) const { return Ask(false, &DASimManager::IsSimAvailable, list_, slot); }
@@ -38,13 +38,13 @@ public:
     telephony_h Handle(int slot) const { return list_.handle[slot]; }
 
     /// Reads a text of one slot.
-    /// @return the reader's code; 0 with a text
+    /// @return the reader's code, 0 with a text
     template <class Char>
     int Read(int (DASimManager::*reader)(telephony_handle_list_s, int, Char**), int slot, CString& text) const
     {
         Char* value = nullptr;
         const int code = Ask<DASimManager, int>(KIV_RESULT_INVALID_ARGUMENT, reader, list_, slot, &value);
-        text.reset(const_cast<char*>(value)); // const in the reader of the MCC alone, and the caller's to release there too
+        text.reset(const_cast<char*>(value)); // the MCC's reader returns const, which the caller releases as well
         return code;
     }
 
@@ -53,7 +53,7 @@ private:
     bool isOpen_;
 };
 
-/// A copy of the text of the first slot that answers; the out-parameter is untouched when none does.
+/// Copies the text of the first slot that answers; the out-parameter is unchanged when none does.
 template <class Reader>
 int FirstAnswer(Reader reader, char** out)
 {
@@ -74,12 +74,12 @@ int FirstAnswer(Reader reader, char** out)
     return code;
 }
 
-/// Appends a text, and owns it until then.
-/// @return how many were appended: none when there was no memory for the text
+/// Appends a text and passes its ownership to the vector.
+/// @return the number of appended texts: 0 for null, else 1
 inline int Append(char* text, std::vector<char*>& values)
 {
     CString owner(text);
-    if (!owner)
+    if (owner == nullptr)
         return 0;
     values.push_back(text);
     static_cast<void>(owner.release());

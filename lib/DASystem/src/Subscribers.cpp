@@ -14,7 +14,7 @@ using namespace kiv;
 namespace
 {
 
-/// Makes sure that there is a connection: the walk's one, as long as that is alive.
+/// Takes a new connection unless the present one is alive.
 bool IsConnected(GDBusConnection*& connection, GError** error)
 {
     if (connection != nullptr && g_dbus_connection_is_closed(connection))
@@ -32,7 +32,7 @@ bool IsCallable(const _SubscriberInfo& subscriber, GError** error)
     return flaw == nullptr;
 }
 
-/// Calls every subscriber, in order; none stops the walk.
+/// Calls every subscriber in order, and goes on after failures.
 void CallEach(const Place& here, const std::list<_SubscriberInfo>& subscribers, const char* method, GVariant* body)
 {
     g_autoptr(GDBusConnection) connection = nullptr;
@@ -105,7 +105,7 @@ int kiv::Notify(const Place& here, const Notification& notification, int service
         {
             DASubscribeDataManager store;
             std::list<_SubscriberInfo> subscribers;
-            char serviceKey[10] = {}; // as wide as the store's keys: what is longer is asked for by its first nine characters
+            char serviceKey[10] = {}; // keys of the store have at most nine characters
             g_snprintf(serviceKey, sizeof serviceKey, "%d", serviceId);
             store.GetSubscriber(notification.kind, notification.key[0] == '\0' ? serviceKey : notification.key, subscribers);
 

@@ -5,17 +5,17 @@
 
 #include <list>
 
-/// Who takes push messages of a service.
+/// Finds the subscribers of a service's push messages.
 class __attribute__((visibility("default"))) DADatabaseManager
 {
 public:
     DADatabaseManager();
     ~DADatabaseManager();
 
-    /// Appends the subscribers of one service's pushes in the order in which they subscribed.
+    /// Appends the subscribers of one service's pushes, in the order in which they subscribed.
     /// @param kind  "push"
     /// @param key   service id
-    /// @return whether the store could be asked; one error line in the platform log when not, and nothing is appended
+    /// @return whether the store could be read; if not, logs one error line and appends nothing
     /// Any thread; blocks on the store's file.
     bool GetSubscriber(const char* kind, const char* key, std::list<_SubscriberInfo>& subscribers);
 };

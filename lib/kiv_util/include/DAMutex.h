@@ -1,13 +1,13 @@
 #ifndef DAMUTEX_H
 #define DAMUTEX_H
 
-/// A lock that is known by its name: every object made with an equal name text, in whatever thread and whether it is a
-/// DAMutex or a DAMutexLock, refers to one and the same lock of the process. Not recursive. Other processes are not excluded.
+/// A lock with a name: all DAMutex and DAMutexLock objects of the process with an equal name use the same lock, in any thread. It
+/// is not recursive and does not exclude other processes.
 class __attribute__((visibility("default"))) DAMutex
 {
 public:
     /// @param name  borrowed for the call
-    /// Throws std::bad_alloc when a name that is new to the process cannot be recorded.
+    /// Throws std::bad_alloc when there is no memory for a new name.
     explicit DAMutex(const char* name);
     DAMutex(const DAMutex&) = delete;
     DAMutex& operator=(const DAMutex&) = delete;
@@ -29,7 +29,7 @@ class __attribute__((visibility("default"))) DAMutexLock
 public:
     /// Blocks until the caller holds the lock.
     /// @param name  borrowed for the call
-    /// Throws std::bad_alloc when a name that is new to the process cannot be recorded; the lock is not held then.
+    /// Throws std::bad_alloc when there is no memory for a new name; then the lock is not held.
     explicit DAMutexLock(const char* name);
     DAMutexLock(const DAMutexLock&) = delete;
     DAMutexLock& operator=(const DAMutexLock&) = delete;

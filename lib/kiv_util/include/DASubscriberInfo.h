@@ -3,12 +3,12 @@
 
 #include <string>
 
-/// One client service that subscribed to an event: where on the system bus to call it.
+/// The address on the system bus of one client service that subscribed to an event.
 struct _SubscriberInfo
 {
     std::string busname;    ///< unique or well-known bus name
     std::string objectpath; ///< object to call
-    std::string interface;  ///< interface that carries the notification methods
+    std::string interface;  ///< interface with the notification methods
 };
 
 #endif

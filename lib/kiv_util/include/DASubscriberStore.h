@@ -7,65 +7,65 @@
 #include <string>
 #include <vector>
 
-/// One line of the store: who hears of which event.
+/// One record of the store: an event and a subscriber of it.
 struct DASubscription
 {
     std::string kind;           ///< one of DASubscriberStore::Kinds()
-    std::string key;            ///< decimal service ID for "policy" and "status", service name for "push", else "all"
-    _SubscriberInfo subscriber; ///< where to call
+    std::string key;            ///< decimal service ID for "policy" and "status", service name for "push", otherwise "all"
+    _SubscriberInfo subscriber; ///< the address to call
 };
 
 /// The subscriptions of the device: one SQLite file that several processes read and write at the same time.
 ///
-/// The file is $KIV_SUBSCRIBERS if that is set, else kiv/subscribers.db in the user's state directory; a program with more rights
-/// than its caller ignores the variable. The path is looked up on each call. The first Add makes the file and its directory, for
-/// the user alone. A file that is damaged or has another schema is left as it is, and reported.
+/// The file is $KIV_SUBSCRIBERS if that is set, otherwise kiv/subscribers.db in the user's state directory. A program with more
+/// rights than its caller ignores the variable. Each call looks the path up again. The first Add() makes the file and its directory
+/// with access for the user only. A damaged file, or one with another schema, is reported and left unchanged.
 ///
-/// Every change is written to the file before the call returns, and a change that was interrupted, also by SIGKILL, is undone by
-/// the next call. Another file may be moved over the store at any time; if a process was killed during a change, remove the journal
-/// beside the store first (its name ends in -journal). Whoever changes the store locks its directory with flock() meanwhile.
+/// Every change is in the file before the call returns. The next call undoes a change that was interrupted, even by SIGKILL.
+/// Another file may be moved over the store at any time; if a process was killed during a change, first remove the journal next to
+/// the store (its name ends in -journal). Each change locks the store's directory with flock() while it runs.
 ///
-/// To read, a process needs the right to read the file, and no room on the disk. Only what is left to undo, or to fold from a log
-/// of version 1.0.0, needs the right to write the file and its directory. The first change converts a store of that version, unless
-/// a process of that version has it open.
+/// To read, a process needs only the right to read the file, and no disk space. It also needs the right to write the file and its
+/// directory if a change has to be undone or a log of version 1.0.0 has to be folded in. The first change converts a store of that
+/// version, unless a process of that version has it open.
 ///
-/// A process that reads keeps the file open from call to call; a child made by fork inherits no descriptor of it, and can use the
-/// store. Any thread, one call at a time. Each call blocks on the file, at most a few seconds when other processes keep it busy. A
-/// reason is set only where an outcome says so. std::bad_alloc may leave.
+/// A reading process keeps the file open between calls. A child made by fork inherits no descriptor of it and can use the store.
+/// Any thread; one call runs at a time. Each call blocks on the file, at most a few seconds if other processes keep it busy. A
+/// reason is set only for the outcomes that mention one. std::bad_alloc may be thrown.
 class __attribute__((visibility("default"))) DASubscriberStore
 {
 public:
     enum class Outcome
     {
         Done,
-        Unchanged, ///< added before, or not there to remove
-        Refused,   ///< the subscription is not possible: the reason names the field, the value and what would be right
+        Unchanged, ///< already added, or not there to remove
+        Refused,   ///< the subscription is invalid: the reason names the field, its value and what is valid
         Failed     ///< the file cannot be used: the reason is "FILE: TROUBLE; ADVICE", with no "; " in the advice
     };
 
-    /// The kinds of events that there are; "push" is that of push messages.
+    /// Returns the kinds of events, with "push" for push messages.
     static std::vector<std::string> Kinds();
 
-    /// Where the store is, or would be made: an absolute path.
+    /// Returns the absolute path of the store, which need not exist.
     static std::string Path();
 
-    /// Records a subscription behind those that are there. Refused are
+    /// Adds a subscription after the existing ones. Refuses
     /// - a kind that is not one of Kinds();
-    /// - a key that is empty, longer than 255 bytes, not UTF-8, or has control characters, invisible formatting characters (such as
-    ///   U+202E) or line separators (such as U+2028);
-    /// - a key for "policy" or "status" that the agent never looks up: it writes the service ID in decimal and takes the first nine
-    ///   characters, so 0 is possible and every number of up to nine digits, or eight behind a minus sign, that begins with 1 to 9;
-    /// - a bus name, an object path or an interface that is none, or that the bus reserves, and a path of more than 1024 bytes.
+    /// - a key that is empty, longer than 255 bytes, not UTF-8, or contains control characters, invisible formatting characters
+    ///   (such as U+202E) or line separators (such as U+2028);
+    /// - a key for "policy" or "status" that the agent never looks up. It looks up the first nine characters of the decimal service
+    ///   ID, so valid keys are 0 and numbers of up to nine digits, or eight after a minus sign, without leading zeros;
+    /// - an invalid or reserved bus name, object path or interface, and a path of more than 1024 bytes.
     Outcome Add(const DASubscription& subscription, std::string& reason);
 
-    /// Takes a subscription out; all five fields must be equal.
+    /// Removes a subscription; all five fields must be equal.
     Outcome Remove(const DASubscription& subscription, std::string& reason);
 
-    /// Appends all subscriptions in the order in which they were added. A store that was never made is an empty one.
+    /// Appends all subscriptions, in the order in which they were added. A store that does not exist counts as empty.
     Outcome List(std::vector<DASubscription>& subscriptions, std::string& reason);
 
-    /// Appends the subscribers recorded under kind and key, in the order in which they were added; null finds nothing. Takes
-    /// microseconds, however many others are recorded.
+    /// Appends the subscribers with that kind and key, in the order in which they were added; null finds nothing. Takes
+    /// microseconds even in a store with many others.
     Outcome Find(const char* kind, const char* key, std::list<_SubscriberInfo>& subscribers, std::string& reason);
 };
 

@@ -3,14 +3,14 @@
 
 #include <string>
 
-/// Small text functions.
+/// Text functions.
 class __attribute__((visibility("default"))) DAUtil
 {
 public:
-    /// The one instance; never null, lives as long as the process. Any thread.
+    /// Returns the one instance, never null, which lives as long as the process. Any thread.
     static DAUtil* GetInstance();
 
-    /// The decimal form: a minus sign where negative, then the digits, no padding.
+    /// Returns the decimal form: a minus sign if negative, then the digits without padding.
     std::string intToStr(int value);
 };
 

@@ -12,20 +12,20 @@
 namespace
 {
 
-/// Never destroyed, so that code which runs while the process ends can still take it.
+/// Never destroyed, so that it can still be taken while the process ends.
 struct NamedLock
 {
     const std::string name;
     const std::size_t hash;
     NamedLock* next;
-    alignas(64) std::mutex mutex; // on a cache line of its own: who looks for a lock does not wait for who holds it
+    alignas(64) std::mutex mutex; // on its own cache line, so that searches do not slow down its holder
 };
 
-std::array<std::atomic<NamedLock*>, 256> buckets; // lists that grow at the head and never lose an element
-std::array<std::atomic<NamedLock*>, 64> recent;   // the lock found last among the names that begin alike
+std::array<std::atomic<NamedLock*>, 256> buckets; // lists that grow at the head and never shrink
+std::array<std::atomic<NamedLock*>, 64> recent;   // the lock found last for each group of similar names
 
-/// The place of a name in `recent`. The first bytes decide: the name often comes from a buffer that was filled a moment ago, and
-/// to read such a text whole takes longer than all the rest.
+/// Returns the place of a name in `recent`, from its first bytes only. The name often comes from a buffer that was just filled, and
+/// reading all of it would take longer than all the rest.
 std::size_t PlaceOf(const char* name)
 {
     std::size_t sum = 0;

@@ -20,7 +20,7 @@ using kiv::FlawOf;
 using kiv::RecordFlaw;
 using Outcome = DASubscriberStore::Outcome;
 
-/// What the process's callers share, since to open the store takes far longer than to search it.
+/// Shared by all callers in the process, since opening the store takes far longer than a search.
 struct SharedConnection
 {
     std::mutex use;
@@ -32,7 +32,7 @@ SharedConnection& Shared();
 void BeforeFork()
 {
     Shared().use.lock();
-    Shared().connection.reset(); // no child may inherit a connection of SQLite's
+    Shared().connection.reset(); // a child must not inherit a connection of SQLite
 }
 
 void AfterFork()
@@ -40,7 +40,7 @@ void AfterFork()
     Shared().use.unlock();
 }
 
-/// Never destroyed: the store may still be asked while the process ends.
+/// Never destroyed: the store may still be used while the process ends.
 SharedConnection& Shared()
 {
     static SharedConnection* const shared = []
@@ -100,7 +100,7 @@ Outcome Reading(std::string& reason, Read&& read)
         });
 }
 
-/// Runs `change`, and says whether it changed anything. One that went into a file while another took its place is made again there.
+/// Runs `change` and returns whether it changed anything. If the file was replaced meanwhile, repeats the change in the new one.
 template <typename Change>
 Outcome Changing(StoreConnection::Use use, std::string& reason, Change&& change)
 {
@@ -144,7 +144,7 @@ std::string KindWanted()
     return wanted;
 }
 
-/// Whether people can read a text on one line as it is: without control and invisible formatting characters and line separators.
+/// Whether a text has no control characters, invisible formatting characters or line separators.
 bool IsPlain(const std::string& text)
 {
     for (const char* at = text.c_str(); *at != '\0'; at = g_utf8_next_char(at))
@@ -163,7 +163,7 @@ bool IsPlain(const std::string& text)
     return true;
 }
 
-/// Whether the agent can look a service ID up by this text: it writes the ID in decimal and takes the first nine characters.
+/// Whether the agent can look up this text as a service ID: it uses the first nine characters of the decimal ID.
 bool IsServiceId(const std::string& text)
 {
     const std::string digits = text.substr(text.front() == '-' ? 1 : 0);
@@ -171,7 +171,7 @@ bool IsServiceId(const std::string& text)
            (digits.front() != '0' || text == "0");
 }
 
-/// What is wanted instead of the key; null if it is possible.
+/// Returns what a valid key would be; null if the key is valid.
 const char* WantedKey(const DASubscription& subscription)
 {
     const std::string& key = subscription.key;
@@ -191,7 +191,7 @@ std::string Refusal(const char* field, const std::string& value, const std::stri
     return std::string(field) + " \"" + shown + "\": " + wanted;
 }
 
-/// Why a subscription is not possible; empty when it is.
+/// Returns why a subscription is invalid; empty when it is valid.
 std::string Objection(const DASubscription& subscription)
 {
     const auto& [busName, objectPath, interface] = subscription.subscriber;

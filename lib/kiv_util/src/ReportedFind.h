@@ -5,8 +5,8 @@
 
 #include <list>
 
-/// Appends the subscribers recorded under kind and key. A store that can not be asked gives none, false and one error line in the
-/// platform log.
+/// Appends the subscribers with that kind and key. When the store cannot be read, appends none, logs one error line and returns
+/// false.
 bool ReportedFind(const char* kind, const char* key, std::list<_SubscriberInfo>& subscribers);
 
 #endif

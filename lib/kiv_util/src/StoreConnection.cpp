@@ -13,7 +13,7 @@ namespace
 {
 
 constexpr const char* kSchemaVersion = "1";
-constexpr int kPatienceMs = 5000; // with other processes that use the file
+constexpr int kPatienceMs = 5000; // for other processes that use the file
 
 constexpr const char* kPermit = "allow this user to read and write the file and its directory";
 constexpr const char* kTryAgain = "try again when no other process keeps it busy";
@@ -27,7 +27,7 @@ constexpr const char* kSchema =
     "PRAGMA user_version = 1;"
     "COMMIT";
 
-// By that index a search reads the rows that it finds, in their order, and no others.
+// With that index, a search reads only the rows that it returns, in their order.
 constexpr const char* kFind = "SELECT busname, objectpath, interface FROM subscription INDEXED BY subscription_by_event"
                               " WHERE kind = ?1 AND key = ?2 ORDER BY id";
 constexpr const char* kList = "SELECT kind, key, busname, objectpath, interface FROM subscription ORDER BY id";
@@ -47,7 +47,7 @@ _SubscriberInfo Subscriber(sqlite3_stmt* row, int column)
     return {Text(row, column), Text(row, column + 1), Text(row, column + 2)};
 }
 
-/// What to do about a failure of SQLite's.
+/// Returns advice about a failure of SQLite.
 const char* Advice(int code, int cause)
 {
     if (code == SQLITE_CORRUPT || code == SQLITE_NOTADB)
@@ -61,7 +61,7 @@ const char* Advice(int code, int cause)
     return "check the disk and its file system";
 }
 
-/// Whether a store is in the form of version 1.0.0, with nothing in its log.
+/// Whether a store has the format of version 1.0.0 and an empty log.
 bool HasFoldedLog(const std::string& path)
 {
     constexpr int kFormPosition = 18;
@@ -71,7 +71,7 @@ bool HasFoldedLog(const std::string& path)
     return file.seekg(kFormPosition).get() == kLogForm && (stat((path + "-wal").c_str(), &log) != 0 || log.st_size == 0);
 }
 
-/// Makes an empty file, which is a database without tables, unless there is one. Called with the directory's lock held.
+/// Makes an empty file, which is a database without tables, unless a file exists. The caller holds the directory's lock.
 void MakeFile(const std::string& path)
 {
     const int file = open(path.c_str(), O_RDONLY | O_CREAT | O_EXCL | O_CLOEXEC, 0600);
@@ -129,7 +129,7 @@ StoreConnection::StoreConnection(std::string path, Use use) : path_(std::move(pa
     if (use == Use::Make)
         MakeFile(path_);
 
-    // Before the file is opened: if it is replaced in between, IsInPlace() and IsUpToDate() notice.
+    // Before the file is opened, so that IsInPlace() and IsUpToDate() notice if it is replaced in between.
     if (stat(path_.c_str(), &file_) != 0)
         throw StoreTrouble(path_, g_strerror(errno), errno == EACCES ? kPermit : kNameAnother);
     if (!S_ISREG(file_.st_mode))
@@ -146,7 +146,7 @@ StoreConnection::StoreConnection(std::string path, Use use) : path_(std::move(pa
     sqlite3_busy_timeout(db, kPatienceMs);
 }
 
-/// Whether what is in the log can be found; that takes a file beside the store, which SQLite has to write.
+/// Whether the log can be read. For that, SQLite must be able to write a file next to the store.
 bool StoreConnection::CanUseLog()
 {
     return sqlite3_exec(db_.get(), "PRAGMA user_version", nullptr, nullptr, nullptr) == SQLITE_OK;
@@ -165,8 +165,8 @@ bool StoreConnection::IsUpToDate(const std::string& path) const
            file.st_ctim.tv_sec == file_.st_ctim.tv_sec && file.st_ctim.tv_nsec == file_.st_ctim.tv_nsec;
 }
 
-/// Whether the store is still to be made. Tables and version come into being together, so in this order the two questions are
-/// safe against a process that makes them right now.
+/// Whether the tables must still be made. Another process may make tables and version at this moment, but always both at once, so
+/// asking for the tables first is safe.
 bool StoreConnection::IsBlank()
 {
     const bool isEmpty = Value("SELECT count(*) FROM sqlite_schema") == "0";
@@ -189,8 +189,8 @@ bool StoreConnection::Remove(const DASubscription& subscription)
 
 bool StoreConnection::Change(const char* sql, const DASubscription& subscription)
 {
-    // Folds a log of version 1.0.0 into the file. If a process of that version has it open, a later change will; readers of this
-    // version close it soon, but SQLite itself does not wait for them here.
+    // Folds a log of version 1.0.0 into the file. If a process of that version has the store open, a later change folds it. Readers
+    // of this version close the store soon, but SQLite itself does not wait for them here.
     const auto fold = [this] { return sqlite3_exec(db_.get(), "PRAGMA journal_mode = DELETE", nullptr, nullptr, nullptr); };
     for (int tries = 0; fold() == SQLITE_BUSY && tries < kPatienceMs; ++tries)
         g_usleep(1000);
@@ -241,7 +241,7 @@ void StoreConnection::Execute(const char* sql)
         Fail();
 }
 
-/// Runs a statement with these values, and `row` for each row of its result. The values need not outlive the call.
+/// Runs a statement with these values, and calls `row` for each row of its result. The values need not outlive the call.
 template <typename Row>
 void StoreConnection::Run(sqlite3_stmt* statement, std::initializer_list<std::string_view> values, Row&& row)
 {

@@ -23,13 +23,13 @@ struct StoreTrouble : std::runtime_error
     }
 };
 
-/// The store has the journal of a change that was interrupted, or that is under way in a file which had its name before.
+/// The store has a journal: a change was interrupted, or is still running in a file that had the same name before.
 struct JournalTrouble : StoreTrouble
 {
     using StoreTrouble::StoreTrouble;
 };
 
-/// The lock of processes that change a store, on the directory that the store is in. Waits for it a few seconds.
+/// Locks the directory of a store for a change. Waits a few seconds for other processes.
 class DirectoryLock
 {
 public:
@@ -42,34 +42,34 @@ private:
     int directory_;
 };
 
-/// An open subscriber store. One thread at a time; not to be carried across a fork. Every operation throws StoreTrouble when the
-/// file cannot be used, and the connection is of no more use then.
+/// An open subscriber store. One thread at a time; it must not cross a fork. Every operation throws StoreTrouble when the file
+/// cannot be used; the connection is useless afterwards.
 ///
-/// SQLite finds the journal of a change by the name of the store, and a journal that nobody holds is played back into the file that
-/// has that name, even if another process writes it for a file that had the name before. So only connections that can change the
-/// store play a journal back, and the directory's lock lets one of them be open at a time.
+/// SQLite finds a journal by the name of the store. It plays an unlocked journal back into the file with that name, even if another
+/// process is writing the journal for a file that had the name before. So only connections that can change the store play journals
+/// back, and the directory's lock allows only one of them at a time.
 class StoreConnection
 {
 public:
     enum class Use
     {
-        Read,       ///< JournalTrouble where there is a journal
-        ReadFrozen, ///< what the file itself holds, whatever is beside it
+        Read,       ///< throws JournalTrouble if there is a journal
+        ReadFrozen, ///< reads the file alone, without any journal or log
         Change,     ///< holds the directory's lock, and plays a journal back
-        Make        ///< likewise; makes the store first if there is none
+        Make        ///< like Change; makes the store first if there is none
     };
 
-    /// Opens the store at an absolute path; null if none was made there.
+    /// Opens the store at an absolute path; null if there is none.
     static std::unique_ptr<StoreConnection> Open(const std::string& path, Use use);
 
-    /// Whether the file at its path is the one that was opened.
+    /// Whether the opened file is still the one at its path.
     bool IsInPlace() const;
 
-    /// Whether this is the file at that path, and nobody has written to it since it was opened. SQLite notices what other
-    /// connections write, but not another store that was copied into the file.
+    /// Whether the opened file is the one at that path and unchanged since. SQLite notices writes of other connections, but not
+    /// another store that is copied into the file.
     bool IsUpToDate(const std::string& path) const;
 
-    /// Whether it has a write-ahead log, as version 1.0.0 made it; nobody can convert such a store while it is open.
+    /// Whether the store has a write-ahead log, as in version 1.0.0. While it is open, nobody can convert it.
     bool HasLog() const { return hasLog_; }
 
     /// Whether the subscription is new.
@@ -105,9 +105,9 @@ private:
     std::string path_;
     struct stat file_;
     bool hasLog_ = false;
-    std::unique_ptr<DirectoryLock> lock_; // held until the database is closed
+    std::unique_ptr<DirectoryLock> lock_; // released after the database is closed
     Database db_;
-    Statement find_; // kept, since a search goes before every notification
+    Statement find_; // kept, since every notification starts with a search
 };
 
 #endif
