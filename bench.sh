@@ -1,5 +1,5 @@
 #!/bin/bash
-# Installs what is missing, builds what is shipped, measures it, prints the table, and draws what a subscriber costs.
+# Installs missing packages, builds the release, measures it, prints the table, and plots the cost per subscriber.
 set -euo pipefail
 cd "$(dirname "$(readlink -f "$0")")"
 
@@ -7,10 +7,11 @@ usage()
 {
     cat <<'TEXT'
 usage: ./bench.sh [--json FILE] [--only TEXT]
-  Prints a row an item: goal, what was measured, where the middle half of the rounds lies. Takes about four minutes.
-  --json FILE  writes the table there as well (otherwise to build/bench.json)
-  --only TEXT  measures the items whose text holds this, and draws nothing
-  Exit codes: 0 every goal met, 1 one missed, 2 trouble
+  Measure the cost of the library. Print one row per item: goal, result, range of the middle half of the rounds. This takes
+  about four minutes.
+  --json FILE  write the table to FILE (default: build/bench.json)
+  --only TEXT  measure only the items whose text contains TEXT, without a plot
+  Exit codes: 0 all goals met, 1 a goal missed, 2 failure
 TEXT
 }
 

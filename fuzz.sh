@@ -1,6 +1,6 @@
 #!/bin/bash
-# Builds the fuzz targets and runs them, two at a time. What leads somewhere new is kept for the next run; an input that fails
-# is kept and named.
+# Builds the fuzz targets and runs them, two at a time. Keeps inputs that reach new code for the next run. Keeps and names inputs
+# that fail.
 set -euo pipefail
 cd "$(dirname "$(readlink -f "$0")")"
 readonly build=build/fuzz
@@ -9,7 +9,7 @@ usage()
 {
     cat <<'TEXT'
 usage: ./fuzz.sh [SECONDS [TARGET...]]
-  Runs each target that many seconds, 30 by default; without a target, all of them.
+  Run each TARGET for SECONDS (default: 30; all targets).
   To run a kept input again: build/fuzz/tests/fuzz/TARGET INPUT
 TEXT
 }
@@ -30,7 +30,7 @@ build()
     fi
 }
 
-# Runs one target; its words go into a log.
+# Runs one target; its output goes to a log.
 run() # target
 {
     mkdir -p "$build/corpus/$1"

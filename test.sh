@@ -1,6 +1,6 @@
 #!/bin/bash
-# Installs what is missing, then builds and runs the tests: plain, and under the sanitizers. Ends with CTest's summary of the
-# plain run.
+# Installs missing packages, then builds and runs the tests: plain and with sanitizers. Ends with CTest's summary of the plain
+# run.
 set -euo pipefail
 cd "$(dirname "$(readlink -f "$0")")"
 
@@ -8,7 +8,7 @@ usage()
 {
     cat <<'TEXT'
 usage: ./test.sh [--all | --arch armhf | --arch arm64]
-  Builds into build/ and runs the tests under AddressSanitizer with UBSan, under ThreadSanitizer, and plain.
+  Build in build/ and run the tests with AddressSanitizer and UBSan, with ThreadSanitizer, and plain.
   --all  the same with clang++ too, clang-format over all sources, clang-tidy over all but the tests, 30 seconds of each fuzz
          target, and the checks of packages, a device's build, documents and country data; then plain for both ARM processors,
          with the checks of their packages and a device's build
@@ -52,7 +52,7 @@ build() # preset
     quietly cmake --build --preset "$1"
 }
 
-# ThreadSanitizer of this compiler does not know the address space of kernels that randomise it more: none at all where allowed.
+# This compiler's ThreadSanitizer fails on kernels with much address randomisation, so this switches it off where allowed.
 fixed_addresses=()
 if setarch "$(uname -m)" --addr-no-randomize true 2>/dev/null; then
     fixed_addresses=(setarch "$(uname -m)" --addr-no-randomize)
@@ -61,7 +61,7 @@ fi
 run_tests() # preset
 {
     say "$1: tests"
-    # Twice the processors: half of the time a test waits for the programs that it started.
+    # Two tests per processor: half of the time a test waits for programs that it started.
     "${fixed_addresses[@]}" ctest --preset "$1" --parallel $((2 * $(nproc)))
 }
 

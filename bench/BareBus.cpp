@@ -8,7 +8,7 @@ namespace kiv::bench
 namespace
 {
 
-/// A push under way.
+/// A push in progress.
 struct Push
 {
     const char* service;

@@ -4,26 +4,26 @@
 #include <string>
 #include <vector>
 
-/// The same proxies and calls as the library's, by GDBus alone, in the loops that one would write first.
+/// The library's proxies and calls, made with GDBus alone in straightforward loops.
 namespace kiv::bench
 {
 
 constexpr char kImsi[] = "450050123456789";
 constexpr long long kPushTime = 1'700'000'000;
 
-/// Where the client service is; it answers on every path.
+/// The address of the client service, which answers on every path.
 constexpr char kServiceName[] = "org.example.Bench";
 
-/// The paths of that many subscribers, all of the one service.
+/// Returns the object paths of that many subscribers of the service.
 std::vector<std::string> SubscriberPaths(int count);
 
-/// Tells one subscriber after the other of a service's status.
+/// Sends a service's status to one subscriber after the other.
 void NotifyBare(const std::vector<std::string>& paths, int serviceId);
 
-/// Pushes a message to all subscribers and iterates the default main context until the last one answered.
+/// Pushes a message to all subscribers and iterates the default main context until the last one has answered.
 void PushBare(const std::vector<std::string>& paths, const char* service);
 
-/// Dispatches what is ready in the default main context.
+/// Dispatches ready events in the default main context.
 void Drain();
 
 } // namespace kiv::bench

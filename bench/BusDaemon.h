@@ -18,33 +18,33 @@ struct Unref
 using Connection = std::unique_ptr<GDBusConnection, Unref>;
 using Process = std::unique_ptr<GSubprocess, Unref>;
 
-/// Starts a program that prints when it is ready, and waits until it is. The kernel kills it when the thread that called this ends.
-/// Throws std::runtime_error.
+/// Starts a program and waits until it prints that it is ready. The kernel kills it when the calling thread ends. Throws
+/// std::runtime_error.
 Process StartProgram(std::vector<const char*> command);
 
-/// Kills a program, which is gone on return.
+/// Kills a program and waits until it is gone.
 void Kill(GSubprocess* program);
 
-/// A dbus-daemon of this process's own behind an abstract socket, so that nothing remains on disk, which the kernel kills when the
-/// process ends in whatever way.
+/// A private dbus-daemon of this process. The kernel kills it when the process ends in any way. Its socket is abstract, so nothing
+/// remains on disk.
 class BusDaemon
 {
 public:
-    /// Starts the daemon and makes it the system bus of the process. To be made before the first bus call. Throws
+    /// Starts the daemon and makes it the system bus of the process. Construct it before the first bus call. Throws
     /// std::runtime_error.
-    /// @param configuration  its file; that for private buses without it
+    /// @param configuration  configuration file; if empty, the one for private buses
     explicit BusDaemon(std::string configuration = {});
     BusDaemon(const BusDaemon&) = delete;
     BusDaemon& operator=(const BusDaemon&) = delete;
     ~BusDaemon();
 
-    /// Starts it again at the same address. The thread that calls this must live as long as the daemon shall.
+    /// Restarts it at the same address. The calling thread must live as long as the daemon is needed.
     void Start();
 
-    /// Kills it; it is gone on return. Any thread.
+    /// Kills it and waits until it is gone. Any thread.
     void Stop();
 
-    /// A new connection that nobody else uses. Throws std::runtime_error.
+    /// Returns a new private connection. Throws std::runtime_error.
     Connection Connect() const;
 
     /// Null while it is stopped.
@@ -53,7 +53,7 @@ public:
 private:
     std::string address_;
     std::string configuration_;
-    std::mutex mutex_; ///< of what follows
+    std::mutex mutex_; ///< guards daemon_
     Process daemon_;
 };
 

@@ -19,12 +19,12 @@ void MeasureNotifications(Table& table, const PrivateSystemBus& bus);
 void MeasurePushes(Table& table, const PrivateSystemBus& bus);
 void MeasureMemory(Table& table);
 
-/// Starts a push to that many subscribers through the library and iterates the default main context until the last one ended.
+/// Pushes to that many subscribers through the library and iterates the default main context until the last delivery has ended.
 void PushByLibrary(const std::string& service, int count);
 
 constexpr char kGrowth[] = "--growth";
 
-/// Prints the operation of the library that leaves most behind: bytes a call, and its name. For a process of its own.
+/// Prints the bytes per call and the name of the operation that leaves most memory behind. Call it in a separate process.
 int PrintGrowth();
 
 } // namespace kiv::bench

@@ -9,8 +9,8 @@
 namespace kiv::bench
 {
 
-/// Keeps this thread, and every thread and process that it starts from now on, on one processor; the thread may go where it
-/// could before at the end.
+/// Pins this thread, and the threads and processes that it starts, to one processor. The destructor restores the thread's former
+/// choice.
 class OneProcessor
 {
 public:
@@ -23,9 +23,9 @@ private:
     cpu_set_t before_;
 };
 
-/// A bus of the benchmark's own as the system bus, a client service in a process of its own that answers every call, and a place
-/// for the subscriber store. All of it is gone at the end. Program, bus and service share one processor, so that no processor is
-/// idle between a message and its reply.
+/// A private system bus, a client service in a separate process that answers every call, and a folder for the subscriber store. The
+/// destructor removes all of it. Program, bus and service share one processor, so that none is idle between a message and its
+/// reply.
 class PrivateSystemBus
 {
 public:
@@ -34,7 +34,7 @@ public:
     PrivateSystemBus& operator=(const PrivateSystemBus&) = delete;
     ~PrivateSystemBus();
 
-    /// The processor time, in nanoseconds, that program, bus and service have used so far.
+    /// Returns the processor time that program, bus and service have used so far, in nanoseconds.
     double WorkNs() const;
 
 private:
@@ -42,18 +42,18 @@ private:
     TemporaryFolder folder_;
     BusDaemon bus_;
     Process service_;
-    Connection shared_; ///< held, or the bare loops would connect anew for each proxy, and the library for each notification
+    Connection shared_; ///< held, so that neither side has to connect again and again
 };
 
 constexpr char kServe[] = "--serve";
 
-/// The client service: answers every call until it is killed.
+/// Runs the client service, which answers every call until it is killed.
 int Serve();
 
-/// Records that many subscribers of a kind, under their number as the key.
+/// Adds that many subscribers of a kind to the store, with their number as the key.
 void Subscribe(const char* kind, int count);
 
-/// Looks up the subscribers of a kind and a key, as the library does for each event.
+/// Looks up the subscribers of a kind and a key, like the library for each event.
 void Find(const char* kind, const char* key);
 
 } // namespace kiv::bench

@@ -27,7 +27,7 @@ double RunOnce(const Side& side, const Clock& clock)
     return clock() - start;
 }
 
-/// One round. What the machine does meanwhile meets both sides alike, since they take turns every few milliseconds, and neither
+/// Runs one round. Other load on the machine affects both sides alike, since they take turns every few milliseconds and neither
 /// always goes first.
 void Round(benchmark::State& state, const Pair& pair)
 {
@@ -47,7 +47,7 @@ void Round(benchmark::State& state, const Pair& pair)
     state.counters["ratio"] = library / bare;
 }
 
-/// Takes what the benchmark library made of the rounds.
+/// Receives the benchmark library's results of the rounds.
 class Summary : public benchmark::BenchmarkReporter
 {
 public:

@@ -12,18 +12,18 @@
 namespace kiv::bench
 {
 
-/// What the library may cost, told by what the same costs without it: factor times that, and a little on top.
+/// The highest allowed cost of the library: factor times the cost without it, plus some slack.
 struct Goal
 {
     double factor;
     double slackNs = 0;
 };
 
-/// Nanoseconds since whenever.
+/// Returns nanoseconds since an arbitrary moment.
 using Clock = std::function<double()>;
 
-double CpuNs();  ///< processor time of this process, for what it computes
-double WallNs(); ///< for what threads do side by side
+double CpuNs();  ///< processor time of this process, for computations
+double WallNs(); ///< wall-clock time, for threads that run in parallel
 
 /// A few calls in a row, long enough for the clock.
 using Batch = std::function<void()>;
@@ -39,23 +39,23 @@ struct Pair
     std::string item;
     Goal goal;
     Clock clock;
-    double calls; ///< in a batch, by which its time is divided
-    Side library; ///< the library's way
-    Side bare;    ///< the bare or naive way to the same
+    double calls; ///< calls per batch, by which its time is divided
+    Side library; ///< through the library
+    Side bare;    ///< the same, bare or naive
     double roundSeconds = 0.1;
-    std::string series = {}; ///< of the picture, for which this is the point at so many subscribers
+    std::string series = {}; ///< curve of the plot that this is a point of
     int subscribers = 0;
 };
 
 constexpr int kRounds = 11;
 
-/// What so many quarters of the values are not above.
+/// Returns the value that so many quarters of the values do not exceed.
 double Quantile(std::vector<double> values, std::size_t quarters);
 
-/// Runs a pair in rounds, batches of the two sides in turns within each round, and adds the median of the rounds to the table.
+/// Runs a pair in rounds, with batches of the two sides in turns, and adds the median of the rounds to the table.
 void Compare(Table& table, const Pair& pair);
 
-/// A batch of that many calls.
+/// Returns a batch of that many calls.
 template <class Call>
 Batch Times(int count, Call call)
 {

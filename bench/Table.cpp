@@ -24,7 +24,7 @@ const char* Word(Outcome outcome)
 
 Table::Table(std::string only) : only_(std::move(only))
 {
-    std::printf("%-64s %-14s %10s  %-19s %-12s %s\n", "item", "goal", "measured", "middle half", "", "a call");
+    std::printf("%-64s %-14s %10s  %-19s %-12s %s\n", "item", "goal", "measured", "middle half", "", "per call");
 }
 
 void Table::Add(Row row)

@@ -14,34 +14,34 @@ enum class Outcome
     NotMeasured
 };
 
-/// One line of the table.
+/// One row of the table.
 struct Row
 {
     std::string item;
     std::string goal;
     Outcome outcome = Outcome::NotMeasured;
     double measured = 0;
-    double low = 0, high = 0;         ///< between which the middle half of the rounds lies; equal when there is nothing to spread
+    double low = 0, high = 0;         ///< the middle half of the rounds is between them; equal without rounds
     std::string unit = {};            ///< empty for a ratio
-    std::string remark = {};          ///< what the number was made of, or why there is none
-    double libraryNs = 0, bareNs = 0; ///< of which it is the ratio
-    std::string series = {};          ///< of the picture, for which this is the point at so many subscribers
+    std::string remark = {};          ///< what the number was computed from, or why there is none
+    double libraryNs = 0, bareNs = 0; ///< whose ratio it is
+    std::string series = {};          ///< curve of the plot that this is a point of
     int subscribers = 0;
 };
 
-/// What was measured, printed row by row as it comes.
+/// The results, printed row by row as they come.
 class Table
 {
 public:
-    /// @param only  measure the items whose text holds this
+    /// @param only  measure the items whose text contains this
     explicit Table(std::string only);
 
     bool Wants(const std::string& item) const { return item.find(only_) != std::string::npos; }
     void Add(Row row);
 
-    /// @return whether the file could be written
+    /// @return whether the file was written
     bool WriteJson(const std::string& path) const;
-    /// @return whether something was measured, and no goal was missed
+    /// @return whether something was measured and no goal was missed
     bool IsMet() const;
 
 private:

@@ -10,7 +10,7 @@
 namespace kiv::bench
 {
 
-/// A folder of the benchmark's own, gone at the end with what is in it.
+/// A private folder. The destructor removes it with its contents.
 class TemporaryFolder
 {
 public:

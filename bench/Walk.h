@@ -7,17 +7,17 @@
 namespace kiv::bench
 {
 
-/// What is told to a number of subscribers, by the library and by the bare loop.
+/// A notification or push to a number of subscribers, by the library and by the bare loop.
 struct Walk
 {
     std::string name;
-    const char* kind; ///< under which the subscribers stand in the store, their number being the key
+    const char* kind; ///< kind of the subscribers in the store; their number is the key
     int subscribers;
     Goal goal;
     Batch library, bare;
 };
 
-/// Adds to the table what a subscriber costs, against the bare loop after a lookup in the store.
+/// Adds the cost per subscriber to the table, compared with a lookup in the store and the bare loop.
 void CompareWalk(Table& table, const PrivateSystemBus& bus, const Walk& walk);
 
 } // namespace kiv::bench

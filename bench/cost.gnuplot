@@ -1,10 +1,10 @@
-# What a subscriber costs, by the number of subscribers. Needs `data`: lines of series, subscribers, library and bare nanoseconds,
-# and `picture`: the file to draw into.
+# Draws the cost per subscriber over the number of subscribers. Needs `data`, a file with lines of series, subscribers, library
+# and bare nanoseconds, and `picture`, the output file.
 set terminal svg size 900,540 font "sans,14" background "white"
 set output picture
-set title "Cost of a subscriber: processor time of program, bus and client service"
+set title "Cost per subscriber: processor time of program, bus and client service"
 set xlabel "subscribers"
-set ylabel "µs a subscriber"
+set ylabel "µs per subscriber"
 set logscale x
 set yrange [0:*]
 set key bottom left

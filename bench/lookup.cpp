@@ -62,7 +62,7 @@ Batch Instances(int count = kInstances)
     return Times(count, [] { benchmark::DoNotOptimize(Class::GetInstance()); });
 }
 
-/// In two threads at once, so long that to start one does not count.
+/// In two threads at once, long enough to make the start of a thread negligible.
 template <class Class>
 Side InstancesInTwoThreads()
 {
@@ -79,7 +79,7 @@ constexpr const char* kByCallingCode = "facade lookup by calling code, all keys,
 
 #if KIV_HAVE_PHONENUMBER
 
-/// The calling codes of all countries.
+/// Returns the calling codes of all countries.
 std::vector<std::string> CallingCodes()
 {
     std::vector<std::string> codes;
@@ -94,7 +94,7 @@ std::vector<std::string> CallingCodes()
     return codes;
 }
 
-/// Alpha-2 code by alpha-2 code, each from the number or text that the one or the other is asked with.
+/// Compares lookups of alpha-2 codes. The other library takes a calling code as a number.
 void CompareRegions(Table& table)
 {
     DASystem* const facade = DASystem::GetInstance();

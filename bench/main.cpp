@@ -26,7 +26,7 @@ bool MeasureAll(const std::string& only, const std::string& json)
         MeasureMemory(table);
     }
     if (!json.empty() && !table.WriteJson(json))
-        throw std::runtime_error(json + ": can not be written");
+        throw std::runtime_error(json + ": cannot be written");
     return table.IsMet();
 }
 
@@ -35,16 +35,16 @@ int Run(int argc, char** argv)
     g_autofree char *only = nullptr, *json = nullptr;
     gboolean isService = FALSE, isGrowth = FALSE;
     const GOptionEntry entries[] = {
-        {"only", 0, 0, G_OPTION_ARG_STRING, &only, "Only the items whose text holds this", "TEXT"},
-        {"json", 0, 0, G_OPTION_ARG_FILENAME, &json, "Writes the table to a file, too", "FILE"},
+        {"only", 0, 0, G_OPTION_ARG_STRING, &only, "Measure only the items whose text contains this", "TEXT"},
+        {"json", 0, 0, G_OPTION_ARG_FILENAME, &json, "Also write the table to a file", "FILE"},
         {kServe + 2, 0, G_OPTION_FLAG_HIDDEN, G_OPTION_ARG_NONE, &isService, nullptr, nullptr},
         {kGrowth + 2, 0, G_OPTION_FLAG_HIDDEN, G_OPTION_ARG_NONE, &isGrowth, nullptr, nullptr},
         {},
     };
     g_autoptr(GOptionContext) options = g_option_context_new(nullptr);
     g_option_context_set_summary(
-        options, "Measures what the library costs, as ratios to the same done without it, and against its goals.");
-    g_option_context_set_description(options, "Exit codes: 0 every goal met, 1 one missed, 2 trouble.");
+        options, "Measure the cost of the library as ratios to the same work without it, and compare them with the goals.");
+    g_option_context_set_description(options, "Exit codes: 0 all goals met, 1 a goal missed, 2 failure.");
     g_option_context_add_main_entries(options, entries, nullptr);
     g_autoptr(GError) error = nullptr;
     if (!g_option_context_parse(options, &argc, &argv, &error))

@@ -21,14 +21,14 @@ namespace kiv::bench
 namespace
 {
 
-/// Runs a program to its end, pinned as this one is.
-/// @return what it printed
+/// Runs a program to its end, pinned like this one.
+/// @return its output
 std::string OutputOf(const std::vector<const char*>& command)
 {
     std::vector<const char*> arguments = command;
     arguments.push_back(nullptr);
     const std::unique_ptr<GSubprocessLauncher, Unref> launcher(g_subprocess_launcher_new(G_SUBPROCESS_FLAGS_STDOUT_PIPE));
-    // The allocator's cache of each thread would look like growth; it can only be switched off from outside.
+    // The allocator's per-thread cache would look like growth. It can only be switched off from outside the process.
     g_subprocess_launcher_setenv(launcher.get(), "GLIBC_TUNABLES", "glibc.malloc.tcache_count=0", TRUE);
     g_autoptr(GError) error = nullptr;
     const std::unique_ptr<GSubprocess, Unref> program(g_subprocess_launcher_spawnv(launcher.get(), arguments.data(), &error));
@@ -81,12 +81,12 @@ constexpr Operation kOperations[] = {
         }},
     {"SendNotiToServiceManager", [](DASystem& system)
         { system.SendNotiToServiceManager(KIV_NOTI_TYPE_STATUS_ON, kImsi, 1, nullptr, nullptr, nullptr, nullptr); }},
-    {"DeliverPushMessage", [](DASystem&) { PushByLibrary("1", 1); }}, // the one that needs the main context
+    {"DeliverPushMessage", [](DASystem&) { PushByLibrary("1", 1); }}, // needs the main context
 };
 
 double GrowthOf(const Operation& operation)
 {
-    constexpr int kFirst = 200, kCalls = 5000; // the first ones make what stays: the connection, GLib's types
+    constexpr int kFirst = 200, kCalls = 5000; // the first calls make what stays: the connection, GLib's types
     std::size_t before = 0;
     for (int i = -kFirst; i < kCalls; ++i)
     {
@@ -99,14 +99,14 @@ double GrowthOf(const Operation& operation)
 
 void MeasureGrowth(Table& table)
 {
-    const std::string item = "growth of memory a call, no loop running";
+    const std::string item = "memory growth per call, without a main loop";
     if (!table.Wants(item))
         return;
     std::istringstream output(OutputOf({"/proc/self/exe", kGrowth}));
     double bytes = 0;
     std::string worst;
     output >> bytes >> worst;
-    table.Add({item, "< 64 B", bytes < 64 ? Outcome::Met : Outcome::Missed, bytes, bytes, bytes, " B", "the most, by " + worst});
+    table.Add({item, "< 64 B", bytes < 64 ? Outcome::Met : Outcome::Missed, bytes, bytes, bytes, " B", "highest: " + worst});
 }
 
 // Size, pages and peak ---------------------------------------------------------------------------------------------------------
@@ -134,7 +134,7 @@ double StrippedKib(const char* library)
     return static_cast<double>(std::filesystem::file_size(stripped)) / 1024;
 }
 
-/// How many words of the library the loader has to fill in with their own address, as the dynamic section counts them.
+/// Returns the number of relative relocations from the dynamic section: words that the loader has to fill in with an address.
 double RelativeRelocations(const link_map& library)
 {
     double count = 0;
@@ -146,7 +146,7 @@ double RelativeRelocations(const link_map& library)
     return count;
 }
 
-/// What of a file's pages this process wrote to, as the kernel counts it.
+/// Returns the kernel's count of a file's memory that this process wrote to, in KiB.
 double PrivateDirtyKib(const std::string& file)
 {
     std::ifstream maps("/proc/self/smaps");

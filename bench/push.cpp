@@ -15,7 +15,7 @@ int endedDeliveries = 0;
 
 } // namespace
 
-/// The log, in front of the platform's. The library tells nobody when a delivery has ended, but its last callback ends with a line.
+/// Replaces the platform's log. The library does not report the end of a delivery, but its last callback ends with a log line.
 int __dlog_print(log_id_t, int, const char*, const char* fmt, ...)
 {
     std::va_list values;

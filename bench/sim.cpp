@@ -14,7 +14,7 @@ int copies = 0;
 
 } // namespace
 
-/// In front of the C library's, to count the texts that the library copies.
+/// Replaces the C library's function, to count the library's copies.
 extern "C" char* strdup(const char* text) noexcept
 {
     ++copies;
@@ -29,7 +29,7 @@ namespace kiv::bench
 namespace
 {
 
-/// The platform calls of one IMSI query over two slots, in its order.
+/// Makes the platform calls of one IMSI query over two slots, in the same order.
 void ImsiCallsBare()
 {
     telephony_handle_list_s list = {};
@@ -49,8 +49,8 @@ void ImsiCallsBare()
     telephony_deinit(&list);
 }
 
-/// One query as the library makes it.
-/// @return how many answers it gave
+/// Makes one query through the library.
+/// @return the number of answers
 int ImsiQuery(std::vector<char*>& imsis)
 {
     int count = 0;
@@ -68,12 +68,12 @@ void MeasureSimQueries(Table& table)
     constexpr int kQueries = 100;
     std::vector<char*> imsis;
     imsis.reserve(2);
-    ImsiQuery(imsis); // what is made once is made
+    ImsiQuery(imsis); // makes what is made only once
     copies = 0;
     const int answers = ImsiQuery(imsis);
-    if (const char* const item = "copies that an IMSI query over two slots makes"; table.Wants(item))
+    if (const char* const item = "copies made by an IMSI query over two slots"; table.Wants(item))
     {
-        // The reader's and the one handed out, for each slot.
+        // Per slot, the reader's copy and the caller's.
         const Outcome outcome = answers != 2 ? Outcome::NotMeasured : copies <= 4 ? Outcome::Met : Outcome::Missed;
         table.Add({item, "<= 4", outcome, static_cast<double>(copies), 0, 0, " texts",
             answers == 2 ? "" : "the device must have two SIMs that answer"});

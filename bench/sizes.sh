@@ -1,7 +1,7 @@
 #!/bin/bash
-# Prints how large the stripped library is, a column per processor, and holds it to its goals.
+# Prints the size of the stripped library, with a column per processor, and compares it with the goals.
 # usage: bench/sizes.sh BUILD_DIR...   each with a library of the build type Release
-# Exit codes: 0 every goal met, 1 one missed
+# Exit codes: 0 all goals met, 1 a goal missed
 set -euo pipefail
 declare -A goals=([amd64]=130 [armhf]=110)
 
@@ -23,7 +23,7 @@ for build in "$@"; do
     arch=$([[ $toolchain ]] && basename "$toolchain" .cmake || dpkg --print-architecture)
     "$(cached "$build" CMAKE_STRIP)" -o "$stripped" "$build/lib/DASystem/libkiv_system.so"
     file=$(stat --format=%s "$stripped")
-    # What the sections hold; between them the file is filled up to whole pages.
+    # The size of the sections, without the padding between them.
     content=0
     while read -r _ type _ _ size _; do
         [[ $type == NOBITS ]] || ((content += 16#$size))

@@ -19,8 +19,8 @@ void Check(bool isDone, const std::string& what)
         throw std::runtime_error("subscriber store: " + what);
 }
 
-/// Fills a store with that many subscribers of one event and, up to `stored` of them, of others. The library makes the store; one
-/// transaction then puts in at once what it would take one a record.
+/// Fills a store with that many subscribers of one event, and with others up to `stored` records. The library makes the store and
+/// its first record; one transaction then inserts the others, which is faster.
 void Fill(const std::string& path, int wanted, int stored)
 {
     g_setenv("KIV_SUBSCRIBERS", path.c_str(), TRUE);
@@ -43,7 +43,7 @@ void Fill(const std::string& path, int wanted, int stored)
     Check(sqlite3_exec(opened, sql.c_str(), nullptr, nullptr, nullptr) == SQLITE_OK, sqlite3_errmsg(opened));
 }
 
-/// Finds the wanted ones in a store again and again.
+/// Finds the wanted subscribers in a store repeatedly.
 Side Finds(const std::string& path, int wanted, int times)
 {
     const auto find = [wanted]
@@ -56,7 +56,7 @@ Side Finds(const std::string& path, int wanted, int times)
     const auto open = [path, find]
     {
         g_setenv("KIV_SUBSCRIBERS", path.c_str(), TRUE);
-        find(); // opens it
+        find(); // opens the store
     };
     return {Times(times, find), open};
 }

@@ -1,5 +1,5 @@
-# What every target of the project is compiled and linked with. Nothing of it depends on where the sources and the build stand, so
-# that two builds give the same bytes.
+# The compiler and linker options of every target. They do not depend on the paths of sources and build, so that two builds produce
+# the same bytes.
 set(CMAKE_BUILD_RPATH_USE_ORIGIN ON)
 
 add_library(kiv_compile INTERFACE)
@@ -8,11 +8,11 @@ target_compile_options(kiv_compile INTERFACE
   -fstack-protector-strong
   "-ffile-prefix-map=${PROJECT_SOURCE_DIR}/=" "-ffile-prefix-map=${PROJECT_BINARY_DIR}=build"
   "$<$<BOOL:${CMAKE_SYSROOT}>:-ffile-prefix-map=${CMAKE_SYSROOT}=>")
-# Sizes of files and times have 64 bits on processors of 32 bits too, where the C library knows them so.
+# File sizes and times have 64 bits on 32-bit processors too, if the C library supports it.
 target_compile_definitions(kiv_compile INTERFACE _FILE_OFFSET_BITS=64 _TIME_BITS=64)
 target_link_options(kiv_compile INTERFACE -Wl,-z,relro,-z,now -Wl,-z,noexecstack -Wl,--as-needed)
 
-# What GCC 6 did otherwise on ARM concerns nobody here.
+# GCC notes on ARM that GCC 6 passed arguments differently, which is irrelevant here.
 if(CMAKE_SYSTEM_PROCESSOR STREQUAL "arm")
   target_compile_options(kiv_compile INTERFACE -Wno-psabi)
 endif()
@@ -22,11 +22,11 @@ if(KIV_SANITIZE)
   target_link_options(kiv_compile INTERFACE -fsanitize=${KIV_SANITIZE})
 else()
   target_link_options(kiv_compile INTERFACE -Wl,--no-undefined)
-  # _FORTIFY_SOURCE needs an optimising build, and sanitizers watch the same calls better.
+  # _FORTIFY_SOURCE needs optimisation; sanitizers check the same calls better.
   set(fortified $<NOT:$<OR:$<CONFIG:Debug>,$<BOOL:$<TARGET_PROPERTY:KIV_UNOPTIMIZED>>>>)
   target_compile_options(kiv_compile INTERFACE $<${fortified}:-U_FORTIFY_SOURCE$<SEMICOLON>-D_FORTIFY_SOURCE=2>)
 endif()
-# Tests are compiled more often than they run, and half of that time would go into watching the tests' own arithmetic.
+# Tests are compiled more often than they run, and checks of the tests' own arithmetic would take half of the compile time.
 set(unoptimized -O0 -g1)
 if(KIV_SANITIZE MATCHES undefined)
   list(APPEND unoptimized -fno-sanitize=undefined)
@@ -45,7 +45,7 @@ function(kiv_shared_library target)
     INSTALL_RPATH "$ORIGIN")
 endfunction()
 
-# Installs a shared library as a part of that component; kiv_system is kiv::system to whoever finds the package.
+# Installs a shared library as a part of that component. find_package() provides kiv_system as kiv::system.
 function(kiv_install_library target component)
   string(REPLACE kiv_ "" name ${target})
   set_property(TARGET ${target} PROPERTY EXPORT_NAME ${name})
@@ -54,7 +54,7 @@ function(kiv_install_library target component)
     INCLUDES DESTINATION ${CMAKE_INSTALL_INCLUDEDIR}/kiv_system)
 endfunction()
 
-# Programs find the libraries in the prefix that they stand in, whichever that is.
+# Programs find the libraries relative to their own place, in any prefix.
 function(kiv_program target)
   add_executable(${target} ${ARGN})
   target_link_libraries(${target} PRIVATE kiv_compile)

@@ -1,5 +1,5 @@
-# A device's own libraries in the place of platform/ and lib/kiv_util, under the names that pkg-config knows them by. Every name is
-# a cache variable; of several, the first that is there is taken.
+# Uses a device's own libraries instead of platform/ and lib/kiv_util, by their pkg-config names. Every name is a cache variable; of
+# several names, the first one found is used.
 add_library(kiv_platform INTERFACE)
 add_library(kiv_util INTERFACE)
 set_target_properties(kiv_platform PROPERTIES EXPORT_NAME platform)
@@ -7,7 +7,7 @@ set_target_properties(kiv_util PROPERTIES EXPORT_NAME util)
 install(TARGETS kiv_platform kiv_util EXPORT kiv_system)
 
 macro(kiv_native_library target subject names)
-  set(KIV_PC_${subject} "${names}" CACHE STRING "pkg-config's name, or names, of what the device has for this")
+  set(KIV_PC_${subject} "${names}" CACHE STRING "pkg-config names of the device's library")
   pkg_search_module(KIV_${subject} REQUIRED IMPORTED_TARGET ${KIV_PC_${subject}})
   target_link_libraries(${target} INTERFACE PkgConfig::KIV_${subject})
   list(APPEND KIV_PC_REQUIRES ${subject}=${KIV_${subject}_MODULE_NAME})

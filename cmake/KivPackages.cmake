@@ -1,11 +1,11 @@
-# The Debian packages, one a component: "cmake --build BUILD --target package". Packages for a system have the prefix /usr.
+# Makes the Debian packages, one per component: "cmake --build BUILD --target package". System packages have the prefix /usr.
 set(package_of_system libkiv-system${PROJECT_VERSION_MAJOR})
 set(package_of_platform libkiv-platform${PROJECT_VERSION_MAJOR})
 set(package_of_dev libkiv-system-dev)
 set(package_of_client libkiv-client-dev)
 set(package_of_kivctl kivctl)
 
-# What each package has beside its component: copyright and changelog.
+# Each package contains its component, the copyright and a changelog.
 configure_file(cmake/debian/changelog.in debian/changelog @ONLY)
 file(READ LICENSE license)
 string(REGEX REPLACE "^MIT License\n\n" "" license "${license}")
@@ -36,7 +36,7 @@ set(CPACK_DEBIAN_PACKAGE_PRIORITY optional)
 set(CPACK_DEBIAN_PACKAGE_CONTROL_STRICT_PERMISSION ON)
 set(CPACK_DEBIAN_ENABLE_COMPONENT_DEPENDS ON)
 
-# What the programs need of other packages is found by dpkg-shlibdeps, what they need of each other stands here.
+# dpkg-shlibdeps finds dependencies on other packages; dependencies between these packages are listed here.
 set(CPACK_DEBIAN_PACKAGE_SHLIBDEPS ON)
 set(CPACK_DEBIAN_PACKAGE_SHLIBDEPS_PRIVATE_DIRS
   ${PROJECT_BINARY_DIR}/lib/DASystem ${PROJECT_BINARY_DIR}/lib/kiv_util ${PROJECT_BINARY_DIR}/platform)
@@ -56,27 +56,26 @@ set(CPACK_DEBIAN_PLATFORM_PACKAGE_SECTION libs)
 set(CPACK_DEBIAN_DEV_PACKAGE_SECTION libdevel)
 set(CPACK_DEBIAN_CLIENT_PACKAGE_SECTION libdevel)
 set(CPACK_DEBIAN_KIVCTL_PACKAGE_SECTION devel)
-# A trigger tells ldconfig of the libraries. CPack leaves out its scripts for that when others are named; none are there, as it
-# warns.
+# A trigger runs ldconfig for the libraries. Naming other scripts makes CPack omit its own for that; they do not exist, so it warns.
 set(CPACK_DEBIAN_SYSTEM_PACKAGE_CONTROL_EXTRA ${PROJECT_SOURCE_DIR}/cmake/debian/triggers no/postinst no/postrm)
 set(CPACK_DEBIAN_PLATFORM_PACKAGE_CONTROL_EXTRA ${CPACK_DEBIAN_SYSTEM_PACKAGE_CONTROL_EXTRA})
 
 set(CPACK_PACKAGE_DESCRIPTION_SUMMARY "") # each package has its own
 set(CPACK_COMPONENT_SYSTEM_DESCRIPTION "system-access layer of kiv-agent
-One facade tells an on-device agent who the device and its SIM subscribers
-are, knows countries and languages, carries notifications and push messages
-over the system bus, and tells when the connection changes.")
+One facade gives an on-device agent the identity of the device and its SIM
+subscribers, country and language data and connection changes. It sends the
+agent's notifications and push messages over the system bus.")
 set(CPACK_COMPONENT_PLATFORM_DESCRIPTION "simulated mobile device behind the platform's C interfaces
-Stands in for the libraries of a device where there is none. It is strict
-with its callers, and set up by a profile or a file.")
+Replaces the libraries of a device on other machines. It checks its callers
+strictly, and a profile or a file configures it.")
 set(CPACK_COMPONENT_DEV_DESCRIPTION "system-access layer of kiv-agent: development files
-Headers, files for pkg-config and CMake, the interfaces on the bus, and an
+Contains headers, files for pkg-config and CMake, the bus interfaces, and an
 example of the agent's bus policy.")
 set(CPACK_COMPONENT_CLIENT_DESCRIPTION "client services of kiv-agent: interfaces and examples
-The interfaces on the bus by which a client service subscribes to the agent's
-events and receives them, and examples of what it installs for the bus: a
-policy, and a file that has the bus start it.")
-set(CPACK_COMPONENT_KIVCTL_DESCRIPTION "agent in miniature and remote control of the simulated device
-Asks the system-access layer from the command line, plays a client service,
-and comes with the bus services of a device.")
+Contains the bus interfaces with which a client service subscribes to the
+agent's events and receives them. Also contains examples of the bus policy and
+the .service file that a client service installs.")
+set(CPACK_COMPONENT_KIVCTL_DESCRIPTION "small agent and remote control of the simulated device
+Queries the system-access layer from the command line, acts as a client
+service, and contains the bus services of a device.")
 include(CPack)

@@ -9,8 +9,8 @@
 namespace kiv::bench
 {
 
-/// Prints the most memory that this process ever had resident, in KiB. The kernel keeps it by address space, so it is that of the
-/// program alone, unlike getrusage(), where the parent's counts as well.
+/// Prints the peak resident memory of this process in KiB. The kernel records it per address space, so unlike in getrusage(), the
+/// parent's memory does not count.
 inline void PrintPeak()
 {
     std::ifstream status("/proc/self/status");

@@ -67,7 +67,7 @@ void AskForSlots(DASystem& system)
     g_strfreev(names);
 }
 
-/// Calls members that hand out a copy.
+/// Calls members that return a copy.
 template <class... Members>
 void AskForCopies(DASystem& system, Members... members)
 {
@@ -80,7 +80,7 @@ void AskForCopies(DASystem& system, Members... members)
     (ask(members), ...);
 }
 
-/// Calls members that hand out a copy of each slot's.
+/// Calls members that return a copy per slot.
 template <class... Members>
 void AskForAll(DASystem& system, Members... members)
 {
@@ -180,7 +180,7 @@ int main()
     LookUp(system);
     AskForDevice(system);
     UseBus(system);
-    // The library tells nobody when a push ended; this is far longer than it takes.
+    // The library does not report the end of a push; this is far longer than it takes.
     [[maybe_unused]] g_autoptr(GMainLoop) loop = g_main_loop_new(nullptr, FALSE);
     g_timeout_add_once(
         250, [](gpointer running) { g_main_loop_quit(static_cast<GMainLoop*>(running)); }, loop);

@@ -1,4 +1,4 @@
-// What an agent does on the bus in its life, by GDBus alone; or with the subscriber store and the platform beside it.
+// The bus calls of an agent, made with GDBus alone, or with the subscriber store and the platform as well.
 #include "../BareBus.h"
 #include "Peak.h"
 

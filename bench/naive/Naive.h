@@ -3,8 +3,8 @@
 
 #pragma GCC visibility push(default)
 
-/// The creation frame and a lookup as one would write them first: the lock's name is printed on each call and looked up in a map
-/// under a mutex of its own, and the key is compared with one row after the other.
+/// Straightforward versions of GetInstance() and of a lookup: each call formats the lock's name and looks it up in a map under
+/// another mutex, and compares the key with one row after the other.
 namespace naive
 {
 
@@ -14,7 +14,7 @@ struct Manager
     void GetCountryNameFromMcc(const char* mcc, char** countryName);
 };
 
-/// The facade's lookup: guard, manager, search, copy.
+/// The facade's lookup: check of the key, manager, search, copy.
 void GetCountryNameFromMcc(const char* mcc, char** countryName);
 
 } // namespace naive

@@ -1,5 +1,5 @@
-# Debian's cross compiler for the architecture that the including file names, on the libraries that .ci/sysroot fetches. With
-# -DCMAKE_SYSROOT=DIR on the libraries there.
+# Uses Debian's cross compiler for the architecture of the including file, with the libraries that .ci/sysroot fetches, or with
+# those in DIR if called with -DCMAKE_SYSROOT=DIR.
 set(CMAKE_SYSTEM_NAME Linux)
 set(CMAKE_C_COMPILER ${CMAKE_LIBRARY_ARCHITECTURE}-gcc)
 set(CMAKE_CXX_COMPILER ${CMAKE_LIBRARY_ARCHITECTURE}-g++)
@@ -12,7 +12,7 @@ if(NOT EXISTS ${CMAKE_SYSROOT}/usr/include)
   message(FATAL_ERROR "The libraries of ${CPACK_DEBIAN_PACKAGE_ARCHITECTURE} are not in ${CMAKE_SYSROOT}. "
     "Run .ci/sysroot ${CPACK_DEBIAN_PACKAGE_ARCHITECTURE} first.")
 endif()
-# Libraries and packages are the target's alone, there and in CMAKE_FIND_ROOT_PATH; programs are the host's.
+# Searches libraries and packages only in the sysroot and CMAKE_FIND_ROOT_PATH, and programs only on the host.
 set(CMAKE_FIND_ROOT_PATH_MODE_PROGRAM NEVER)
 set(CMAKE_FIND_ROOT_PATH_MODE_LIBRARY ONLY)
 set(CMAKE_FIND_ROOT_PATH_MODE_INCLUDE ONLY)
