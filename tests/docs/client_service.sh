@@ -57,7 +57,8 @@ if [[ $language == cpp ]]; then
     block cpp 1 >mail.cpp
     command=$(block sh 1)
     command=${command//\/usr\/share/$scratch/prefix/share}
-    eval "${command/g++/${cxx[*]} -Wall -Wextra -Werror}"
+    command=${command/g++/${cxx[*]} -Wall -Wextra -Werror}
+    eval "${command/gcc/${cxx[*]} -x c}"
     read -ra service <<<"${KIV_EMULATOR-} ./mail"
 else
     block python 1 >mail.py
