@@ -1,6 +1,7 @@
 #include "Calls.h"
 
 #include "Locked.h"
+#include "Report.h"
 
 #include <atomic>
 #include <memory>
@@ -92,10 +93,33 @@ std::optional<Fault> TakeFault(Call call, int slot)
     return hit;
 }
 
-int Work(int (*work)(void*, State&), void* context)
+/// The code with which the device fails this call, if it does. Every fault of the function counts the call.
+std::optional<int> Break(Call call, std::vector<BrokenCall>& faults)
 {
-    const Locked state(TheState());
-    return state->Ready() ? work(context, *state) : -ENODEV;
+    std::optional<int> code;
+    for (BrokenCall& fault : faults)
+    {
+        if (fault.call == call && (++fault.seen == fault.number || (fault.number == 0 && !code)))
+            code = fault.code;
+    }
+    return code;
+}
+
+int Work(Call call, int (*work)(void*, State&), void* context)
+{
+    std::string trouble;
+    {
+        const Locked state(TheState());
+        if (state->Ready())
+        {
+            const std::optional<int> code = Break(call, state->device.faults);
+            return code ? *code : work(context, *state);
+        }
+        trouble = state->UntoldTrouble();
+    }
+    if (!trouble.empty())
+        Report(trouble);
+    return -ENODEV;
 }
 
 } // namespace
@@ -104,14 +128,14 @@ int Perform(Call call, const Subject& subject, int (*work)(void* context, State&
 try
 {
     if (!TheCalls().watched.load(std::memory_order_relaxed))
-        return Work(work, context);
+        return Work(call, work, context);
 
     const int slot = SlotOf(subject);
     std::string note = RunHook(call, slot);
     const std::optional<Fault> fault = TakeFault(call, slot);
     int result = 0;
     if (!fault || fault->leavings == Leavings::ItsResults)
-        result = Work(work, context);
+        result = Work(call, work, context);
     if (fault)
         result = fault->code;
 

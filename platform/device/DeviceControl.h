@@ -17,8 +17,28 @@
 namespace kiv::platform
 {
 
+/// The platform's functions but __dlog_print(), each under its own name: Call::tel_init.
+enum class Call
+{
+#define CALL(name) name,
+#include "calls.inc"
+#undef CALL
+};
+
+/// "tel_init" of Call::tel_init.
+const char* NameOf(Call call);
+
 /// @name The device
 /// @{
+
+/// A function of the device that fails: it returns the code and does nothing else. One that returns a pointer returns null.
+struct BrokenCall
+{
+    Call call;
+    int code;
+    unsigned number = 0; ///< the only call that fails, counted from 1 since this device is in place; 0 when every call fails
+    unsigned seen = 0;   ///< how many calls there were
+};
 
 /// A text that the device may lack: then reading it fails.
 using Text = std::optional<std::string>;
@@ -58,13 +78,14 @@ struct Device
     std::uint32_t blockSize = 4096;
     std::uint64_t blocksAvailable = 0;
     std::map<std::string, std::string> packages; ///< version by package ID
+    std::vector<BrokenCall> faults;              ///< the first that fits decides, one for a single call before one for every call
 
     std::map<std::string, std::string> reasons; ///< why a value is missing, by "GROUP.KEY" as in a device file, where that is known
 };
 
 /// The device as it is. Before anything was set, it is what the environment variable KIV_PROFILE names, a profile or a device
-/// file, and the profile "dual" without it. If that cannot be used, this is a device without anything, DeviceTrouble() tells
-/// why, and every platform call fails.
+/// file, and the profile "dual" without it. If that cannot be used, this is a device without anything, and every platform call
+/// fails. The first of them prints the reason on standard error, unless somebody has read it from DeviceTrouble().
 Device GetDevice();
 
 /// Replaces the device. Registered callbacks for each value that differs run before it returns, on this thread. The device
@@ -87,19 +108,8 @@ std::string DeviceTrouble();
 void ResetDevice();
 
 /// @}
-/// @name Calls: every function of the platform but __dlog_print()
+/// @name Calls
 /// @{
-
-/// The functions, each under its own name: Call::tel_init.
-enum class Call
-{
-#define CALL(name) name,
-#include "calls.inc"
-#undef CALL
-};
-
-/// "tel_init" of Call::tel_init.
-const char* NameOf(Call call);
 
 constexpr int kNoSlot = -1; ///< the slot of a call that concerns none, or of a fault for calls on every slot
 
@@ -129,10 +139,11 @@ enum class Leavings
 
 /// Makes calls of one function give `code`. A code of 0 with no leavings is a success that brings nothing: an out-parameter
 /// that stays null, a list of no handles. A function that gives a pointer gives null and leaves nothing, whatever the code.
-/// Faults add up; the first armed that hits decides.
+/// Faults add up; the first armed that hits decides. They come before those of the device (Device::faults), which do not count
+/// the calls that end here, and stay when the device is replaced.
 void FailCall(Call call, int code, CallNumbers which = kEveryCall, int slot = kNoSlot, Leavings leavings = Leavings::Nothing);
 
-/// Disarms all of them.
+/// Disarms all that FailCall() armed; those of the device stay.
 void ClearFaults();
 
 /// Runs within every call, on the caller's thread, before the call does its work; the text that it gives stands in the

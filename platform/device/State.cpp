@@ -2,6 +2,7 @@
 
 #include "Calls.h"
 #include "Locked.h"
+#include "Report.h"
 
 #include <algorithm>
 #include <pthread.h>
@@ -35,6 +36,7 @@ State& TheState()
     // A child of fork() has no thread but the one that called it: what others had locked at that moment stays locked for good.
     static State* const state = []
     {
+        SettleLog();
         pthread_atfork(
             []
             {
@@ -62,6 +64,7 @@ bool State::Ready()
         return trouble.empty();
 
     loaded_ = true;
+    told_ = false;
     try
     {
         Origin origin = OpenEnvironment();
@@ -75,6 +78,11 @@ bool State::Ready()
         trouble = error.what();
     }
     return trouble.empty();
+}
+
+std::string State::UntoldTrouble()
+{
+    return std::exchange(told_, true) ? std::string() : trouble;
 }
 
 Changes State::Replace(Device next)
@@ -151,6 +159,7 @@ std::string DeviceTrouble()
 {
     const Locked state(TheState());
     state->Ready();
+    state->UntoldTrouble(); // whoever asks tells it
     return state->trouble;
 }
 

@@ -30,6 +30,9 @@ struct State
     /// Whether there is a device to answer from; the first question reads what the environment names.
     bool Ready();
 
+    /// The trouble, if nobody was told of it yet; empty from then on.
+    std::string UntoldTrouble();
+
     /// Puts a device in place; the changes are then to be delivered with the lock released.
     Changes Replace(Device next);
 
@@ -50,6 +53,7 @@ struct State
 private:
     friend void ResetDevice();
     bool loaded_ = false;
+    bool told_ = false; ///< the trouble, to somebody
 };
 
 /// Lives as long as the process, for the threads that outlive its main().

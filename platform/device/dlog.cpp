@@ -2,6 +2,7 @@
 
 #include "Locked.h"
 #include "LogControl.h"
+#include "Report.h"
 #include "Visible.h"
 
 #include <glib.h>
@@ -38,13 +39,15 @@ struct Log
 
     Log()
     {
-        const char* wish = g_getenv("KIV_LOG");
+        const char* const wish = g_getenv("KIV_LOG");
         if (g_strcmp0(wish, "error") == 0)
             printedFrom = DLOG_ERROR;
         else if (g_strcmp0(wish, "info") == 0)
             printedFrom = DLOG_INFO;
         else if (g_strcmp0(wish, "journal") == 0)
             printedFrom = DLOG_VERBOSE;
+        else if (wish != nullptr && *wish != '\0')
+            kiv::platform::Report(std::string("KIV_LOG: \"") + wish + "\" is wrong; error, info or journal would be right");
         goesToJournal = printedFrom == DLOG_VERBOSE;
         Settle();
     }
@@ -100,6 +103,11 @@ void Distribute(const LogLine& line)
 
 namespace kiv::platform
 {
+
+void SettleLog()
+{
+    TheLog();
+}
 
 void StartLog()
 {

@@ -9,25 +9,25 @@ default-data=1
 
 [sim0]
 cp-name=modem0
-card-status=4
+card-status=pin-required
 imei=356938035643809
-service-state=2
+service-state=emergency-only
 roaming=false
-service-type=2
-sms-status=0
+service-type=emergency-only
+sms-status=not-ready
 
 [sim1]
 cp-name=modem1
-card-status=3
+card-status=ready
 mcc=262
 mnc=01
 msin=9876543210
 number=+4915112345678
 imei=490154203237518
-service-state=0
+service-state=in-service
 roaming=false
 service-type=6
-sms-status=1
+sms-status=ready
 
 [device]
 tizen-id=h7q3kz0r5fT9wPq
@@ -40,21 +40,21 @@ serial=KIV0123456789
 [settings]
 device-name=Workbench
 language=en_US
-font-size=1
+font-size=normal
 mobile-data=true
 
 [runtime]
 flight-mode=false
 packet-data=true
 data-roaming=false
-wifi-status=1
+wifi-status=disconnected
 
 [network]
-cellular=5
-wifi=1
-bluetooth=0
-wifi-device=1
-wifi-connection=0
+cellular=connected
+wifi=disconnected
+bluetooth=off
+wifi-device=on
+wifi-connection=disconnected
 
 [storage]
 block-size=4096

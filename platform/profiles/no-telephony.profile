@@ -3,9 +3,9 @@ description=no modem answers
 
 [telephony]
 available=false
-default-network=-1
-preferred-voice=-1
-default-data=-1
+default-network=unknown
+preferred-voice=unknown
+default-data=unknown
 
 
 [device]
@@ -19,21 +19,21 @@ serial=KIV0123456789
 [settings]
 device-name=Workbench
 language=en_US
-font-size=1
+font-size=normal
 mobile-data=true
 
 [runtime]
 flight-mode=false
 packet-data=true
 data-roaming=false
-wifi-status=1
+wifi-status=disconnected
 
 [network]
-cellular=0
-wifi=1
-bluetooth=0
-wifi-device=1
-wifi-connection=0
+cellular=out-of-service
+wifi=disconnected
+bluetooth=off
+wifi-device=on
+wifi-connection=disconnected
 
 [storage]
 block-size=4096

@@ -3,27 +3,27 @@ description=two slots without cards
 
 [telephony]
 available=true
-default-network=-1
-preferred-voice=-1
-default-data=-1
+default-network=unknown
+preferred-voice=unknown
+default-data=unknown
 
 [sim0]
 cp-name=modem0
-card-status=1
+card-status=no-card
 imei=356938035643809
-service-state=2
+service-state=emergency-only
 roaming=false
-service-type=2
-sms-status=0
+service-type=emergency-only
+sms-status=not-ready
 
 [sim1]
 cp-name=modem1
-card-status=1
+card-status=no-card
 imei=490154203237518
-service-state=2
+service-state=emergency-only
 roaming=false
-service-type=2
-sms-status=0
+service-type=emergency-only
+sms-status=not-ready
 
 [device]
 tizen-id=h7q3kz0r5fT9wPq
@@ -36,21 +36,21 @@ serial=KIV0123456789
 [settings]
 device-name=Workbench
 language=en_US
-font-size=1
+font-size=normal
 mobile-data=true
 
 [runtime]
 flight-mode=false
 packet-data=true
 data-roaming=false
-wifi-status=1
+wifi-status=disconnected
 
 [network]
-cellular=0
-wifi=1
-bluetooth=0
-wifi-device=1
-wifi-connection=0
+cellular=out-of-service
+wifi=disconnected
+bluetooth=off
+wifi-device=on
+wifi-connection=disconnected
 
 [storage]
 block-size=4096

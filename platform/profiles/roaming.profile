@@ -9,16 +9,16 @@ default-data=0
 
 [sim0]
 cp-name=modem0
-card-status=3
+card-status=ready
 mcc=450
 mnc=05
 msin=0123456789
 number=+821012345678
 imei=356938035643809
-service-state=0
+service-state=in-service
 roaming=true
 service-type=6
-sms-status=1
+sms-status=ready
 
 [device]
 tizen-id=h7q3kz0r5fT9wPq
@@ -31,21 +31,21 @@ serial=KIV0123456789
 [settings]
 device-name=Workbench
 language=en_US
-font-size=1
+font-size=normal
 mobile-data=true
 
 [runtime]
 flight-mode=false
 packet-data=true
 data-roaming=true
-wifi-status=1
+wifi-status=disconnected
 
 [network]
-cellular=2
-wifi=1
-bluetooth=0
-wifi-device=1
-wifi-connection=0
+cellular=roaming
+wifi=disconnected
+bluetooth=off
+wifi-device=on
+wifi-connection=disconnected
 
 [storage]
 block-size=4096

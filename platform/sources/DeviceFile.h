@@ -3,20 +3,13 @@
 #ifndef KIV_SOURCES_DEVICEFILE_H
 #define KIV_SOURCES_DEVICEFILE_H
 
-#include "DeviceControl.h"
+#include "DeviceFields.h"
 
-#include <stdexcept>
 #include <string>
 #include <vector>
 
 namespace kiv::platform
 {
-
-/// Tells what is wrong with a device file and what would be right.
-class DeviceFileError : public std::runtime_error
-{
-    using std::runtime_error::runtime_error;
-};
 
 /// @param name  of the file, for the error's text
 /// Throws DeviceFileError for anything that is not as it should be: there is no half device.
@@ -24,9 +17,11 @@ Device ReadDevice(const std::string& text, const std::string& name);
 
 /// The text with values changed, comments kept. Throws DeviceFileError, also when the result would not be a device.
 /// @param assignments  "GROUP.KEY=VALUE"
-std::string ChangeText(const std::string& text, const std::string& name, const std::vector<std::string>& assignments);
+/// @param removals     "GROUP.KEY"; each has to be there
+std::string ChangeText(const std::string& text, const std::string& name, const std::vector<std::string>& assignments,
+    const std::vector<std::string>& removals = {});
 
-/// Throws DeviceFileError.
+/// Throws DeviceFileError, also for what is no regular file.
 std::string ReadFile(const std::string& path);
 
 } // namespace kiv::platform

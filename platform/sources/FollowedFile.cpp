@@ -2,8 +2,8 @@
 
 #include "DeviceFile.h"
 #include "Locked.h"
+#include "Report.h"
 #include "State.h"
-#include "dlog.h"
 
 #include <exception>
 #include <utility>
@@ -31,42 +31,18 @@ try
 }
 catch (const std::exception& error)
 {
-    __dlog_print(LOG_ID_SYSTEM, DLOG_ERROR, "KIV_PLATFORM", "the device file is not followed: %s\n", error.what());
+    Report(path_ + ": changes are not noticed: " + error.what());
 }
 
 std::shared_ptr<LoopThread> FollowedFile::Follow()
 {
-    using Monitor = std::unique_ptr<GFileMonitor, decltype(&g_object_unref)>;
-    const auto monitor = std::make_shared<Monitor>(nullptr, g_object_unref);
-    const auto setUp = [source = shared_from_this(), monitor]
-    {
-        g_autoptr(GFile) file = g_file_new_for_path(source->path_.c_str());
-        g_autoptr(GError) error = nullptr;
-        monitor->reset(g_file_monitor_file(file, G_FILE_MONITOR_NONE, nullptr, &error));
-        if (*monitor != nullptr)
-            g_signal_connect(monitor->get(), "changed", G_CALLBACK(OnEvent), source.get());
-        else
-            __dlog_print(
-                LOG_ID_SYSTEM, DLOG_ERROR, "KIV_PLATFORM", "%s: not followed: %s\n", source->path_.c_str(), error->message);
-        source->ReadAgain(); // what changed before the monitor was there
-    };
-    const auto tearDown = [monitor]
-    {
-        if (*monitor != nullptr)
-            g_file_monitor_cancel(monitor->get());
-        monitor->reset();
-    };
-    return LoopThread::Start(setUp, tearDown);
+    const auto watch = std::make_shared<std::unique_ptr<FileWatch>>();
+    const auto setUp = [source = shared_from_this(), watch]
+    { *watch = std::make_unique<FileWatch>(source->path_, [source](FileWatch::Look look) { return source->ReadAgain(look); }); };
+    return LoopThread::Start(setUp, [watch] { watch->reset(); });
 }
 
-void FollowedFile::OnEvent(GFileMonitor* /*monitor*/, GFile* /*file*/, GFile* /*other*/, GFileMonitorEvent event, gpointer source)
-{
-    // Comes when a writer has closed the file and after one was renamed over it, and not while it is half written.
-    if (event == G_FILE_MONITOR_EVENT_CHANGES_DONE_HINT)
-        static_cast<FollowedFile*>(source)->ReadAgain();
-}
-
-void FollowedFile::ReadAgain()
+bool FollowedFile::ReadAgain(FileWatch::Look look)
 {
     State& state = TheState();
     Changes changes;
@@ -80,21 +56,26 @@ void FollowedFile::ReadAgain()
 
             const std::lock_guard lock(state.mutex);
             if (state.source.get() != this || text_ == text)
-                return;
+                return true;
             for (std::size_t i = 0; i < next.slots.size() && i < state.device.slots.size(); ++i)
                 if (next.slots[i].cardStatus == state.device.slots[i].cardStatus)
                     next.slots[i].cardReads = state.device.slots[i].cardReads;
+            for (BrokenCall& fault : next.faults)
+                for (const BrokenCall& old : state.device.faults)
+                    if (fault.call == old.call && fault.number == old.number && fault.code == old.code)
+                        fault.seen = old.seen;
             text_ = std::move(text);
             changes = state.Replace(std::move(next));
         }
         catch (const DeviceFileError& error)
         {
-            if (lastReport_ != error.what())
-                __dlog_print(LOG_ID_SYSTEM, DLOG_ERROR, "KIV_PLATFORM", "%s\n", error.what());
-            lastReport_ = error.what();
+            if (look == FileWatch::Look::Last && std::exchange(lastReport_, error.what()) != error.what())
+                Report(error.what());
+            return false;
         }
     }
     state.notifier.Deliver(changes);
+    return true;
 }
 
 } // namespace kiv::platform

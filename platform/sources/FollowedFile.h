@@ -3,10 +3,10 @@
 #ifndef KIV_SOURCES_FOLLOWEDFILE_H
 #define KIV_SOURCES_FOLLOWEDFILE_H
 
+#include "FileWatch.h"
 #include "LoopThread.h"
 #include "Source.h"
 
-#include <gio/gio.h>
 #include <memory>
 #include <mutex>
 #include <string>
@@ -25,8 +25,7 @@ public:
 
 private:
     std::shared_ptr<LoopThread> Follow();
-    void ReadAgain();
-    static void OnEvent(GFileMonitor* monitor, GFile* file, GFile* other, GFileMonitorEvent event, gpointer source);
+    bool ReadAgain(FileWatch::Look look);
 
     const std::string path_;
     std::string text_; ///< what the device was last read from; guarded by the lock of the state

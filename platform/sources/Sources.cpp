@@ -5,11 +5,14 @@
 #include "Host.h"
 #include "Locked.h"
 #include "State.h"
+#include "Suggestion.h"
 
+#include <algorithm>
 #include <cerrno>
 #include <fcntl.h>
+#include <functional>
 #include <glib.h>
-#include <glib/gstdio.h>
+#include <iterator>
 #include <memory>
 #include <sys/file.h>
 #include <unistd.h>
@@ -33,38 +36,47 @@ constexpr EmbeddedProfile kProfiles[] = {
 constexpr const char* kDefaultProfile = "dual";
 constexpr const char* kHost = "host";
 
-const char* TextOfProfile(const std::string& name)
+const EmbeddedProfile* Find(const std::string& name)
 {
-    for (const EmbeddedProfile& profile : kProfiles)
-        if (name == profile.name)
-            return profile.text;
-    return nullptr;
+    const auto* const found = std::find_if(
+        std::begin(kProfiles), std::end(kProfiles), [&name](const EmbeddedProfile& profile) { return name == profile.name; });
+    return found == std::end(kProfiles) ? nullptr : found;
 }
 
-// A profile never changes; what it keeps is its text.
+[[noreturn]] void FailUnknown(const std::string& name, const char* what, std::vector<std::string> names = {})
+{
+    std::transform(std::begin(kProfiles), std::end(kProfiles), std::inserter(names, names.begin()),
+        [](const EmbeddedProfile& profile) { return profile.name; });
+    std::string list;
+    for (const std::string& known : names)
+        list += (list.empty() ? "" : ", ") + known;
+    throw DeviceFileError("\"" + name + "\" is " + what + "; profiles are " + list + DidYouMean(name, names));
+}
+
+// A profile never changes.
 class EmbeddedSource : public Source
 {
 public:
-    explicit EmbeddedSource(const char* profile) : text(profile) {}
+    explicit EmbeddedSource(const EmbeddedProfile& embedded) : profile(embedded) {}
 
-    const char* const text;
+    const EmbeddedProfile& profile;
 };
+
+bool Exists(const std::string& path)
+{
+    return g_file_test(path.c_str(), G_FILE_TEST_EXISTS) != FALSE;
+}
 
 Origin Open(const std::string& nameOrPath)
 {
     if (nameOrPath == kHost)
         return Host::Open();
 
-    if (const char* const text = TextOfProfile(nameOrPath))
-        return {ReadDevice(text, "profile " + nameOrPath), std::make_shared<EmbeddedSource>(text)};
+    if (const EmbeddedProfile* const profile = Find(nameOrPath))
+        return {ReadDevice(profile->text, "profile " + nameOrPath), std::make_shared<EmbeddedSource>(*profile)};
 
-    if (nameOrPath.find('/') == std::string::npos && !g_file_test(nameOrPath.c_str(), G_FILE_TEST_EXISTS))
-    {
-        std::string names;
-        for (const EmbeddedProfile& profile : kProfiles)
-            names += std::string(profile.name) + ", ";
-        throw DeviceFileError("\"" + nameOrPath + "\" is no profile and no file; profiles are " + names + kHost);
-    }
+    if (nameOrPath.find('/') == std::string::npos && !Exists(nameOrPath))
+        FailUnknown(nameOrPath, "no profile and no file", {kHost});
     std::string text = ReadFile(nameOrPath);
     Device device = ReadDevice(text, nameOrPath);
     return {std::move(device), std::make_shared<FollowedFile>(nameOrPath, std::move(text))};
@@ -99,6 +111,31 @@ private:
     int descriptor_ = -1;
 };
 
+const EmbeddedProfile& ProfileInUse()
+{
+    const Locked state(TheState());
+    const auto* const source = state->Ready() ? dynamic_cast<EmbeddedSource*>(state->source.get()) : nullptr;
+    return source != nullptr ? source->profile : *Find(kDefaultProfile);
+}
+
+// Replaces the file by what `change` makes.
+std::string Rewrite(const std::string& path, const std::function<std::string()>& change)
+try
+{
+    const DirectoryLock lock(path);
+    const std::string text = change();
+    constexpr auto kReplaceAndSync =
+        static_cast<GFileSetContentsFlags>(G_FILE_SET_CONTENTS_CONSISTENT | G_FILE_SET_CONTENTS_DURABLE);
+    g_autoptr(GError) error = nullptr;
+    if (!g_file_set_contents_full(path.c_str(), text.data(), static_cast<gssize>(text.size()), kReplaceAndSync, 0644, &error))
+        throw DeviceFileError(path + ": " + error->message);
+    return {};
+}
+catch (const DeviceFileError& error)
+{
+    return error.what();
+}
+
 } // namespace
 
 Origin OpenEnvironment()
@@ -131,33 +168,41 @@ Profile HostProfile()
     return {kHost, kHostDescription};
 }
 
-std::string SetInDeviceFile(const std::string& path, const std::vector<std::string>& assignments)
-try
+std::optional<std::string> TextOfProfile(const std::string& name)
 {
-    const DirectoryLock lock(path);
-    std::string text;
-    if (g_file_test(path.c_str(), G_FILE_TEST_EXISTS))
-    {
-        text = ReadFile(path);
-    }
-    else
-    {
-        const Locked state(TheState());
-        const auto* const profile = state->Ready() ? dynamic_cast<EmbeddedSource*>(state->source.get()) : nullptr;
-        text = profile != nullptr ? profile->text : TextOfProfile(kDefaultProfile);
-    }
-
-    text = ChangeText(text, path, assignments);
-    constexpr auto kReplaceAndSync =
-        static_cast<GFileSetContentsFlags>(G_FILE_SET_CONTENTS_CONSISTENT | G_FILE_SET_CONTENTS_DURABLE);
-    g_autoptr(GError) error = nullptr;
-    if (!g_file_set_contents_full(path.c_str(), text.data(), static_cast<gssize>(text.size()), kReplaceAndSync, 0644, &error))
-        throw DeviceFileError(path + ": " + error->message);
-    return {};
+    const EmbeddedProfile* const profile = Find(name);
+    return profile != nullptr ? std::optional<std::string>(profile->text) : std::nullopt;
 }
-catch (const DeviceFileError& error)
+
+std::string SetInDeviceFile(const std::string& path, const std::vector<std::string>& assignments, std::string* madeFrom)
 {
-    return error.what();
+    return Rewrite(path,
+        [&]
+        {
+            const EmbeddedProfile* const profile = Exists(path) ? nullptr : &ProfileInUse();
+            if (madeFrom != nullptr)
+                *madeFrom = profile != nullptr ? profile->name : "";
+            return ChangeText(profile != nullptr ? profile->text : ReadFile(path), path, assignments);
+        });
+}
+
+std::string MakeDeviceFile(const std::string& path, const std::string& profile, const std::vector<std::string>& assignments)
+{
+    return Rewrite(path,
+        [&]
+        {
+            const EmbeddedProfile* const found = Find(profile);
+            if (found == nullptr)
+                FailUnknown(profile, "no profile");
+            if (Exists(path))
+                throw DeviceFileError(path + ": is there already; a file is made from a profile only where there is none");
+            return ChangeText(found->text, path, assignments);
+        });
+}
+
+std::string UnsetInDeviceFile(const std::string& path, const std::vector<std::string>& keys)
+{
+    return Rewrite(path, [&] { return ChangeText(ReadFile(path), path, {}, keys); });
 }
 
 } // namespace kiv::platform

@@ -105,8 +105,8 @@ TEST_F(KivctlTest, CompletesWhatFitsTheWordsBefore)
     const std::pair<const char*, const char*> cases[] = {
         {"device set runtime.fl", "runtime.flight-mode=\twhether flight mode is on\n"},
         {"device set runtime.flight-mode=t", "runtime.flight-mode=true\n"},
-        {"device set -p ./x network.wifi-device=", "network.wifi-device=0\toff\nnetwork.wifi-device=1\ton\n"},
-        {"device set sim1.sms", "sim1.sms-status=\t1 when ready for text messages\n"},
+        {"device set -p ./x network.wifi-device=", "network.wifi-device=off\nnetwork.wifi-device=on\n"},
+        {"device set sim1.sms", "sim1.sms-status=\twhether the modem is ready for text messages\n"},
         {"network --profile=ro", "--profile=roaming\tone slot, its SIM in a foreign network with data allowed\n:files\n"},
         {"-p nothing", ":files\n"},
         {"notify on --to ''", "subscribers\nmanager\n"},

@@ -12,21 +12,27 @@ TEST_F(KivctlTest, EndsWithTheDocumentedExitCode)
         {"sim wate", 2, "", "did you mean \"wait\"?"},
         {"sim --slott 1", 2, "", "did you mean \"--slot\"?"},
         {"sim --profile Singel", 10, "", "host (did you mean \"single\"?)"},
-        {"device set --profile ./x sim1.mscn=1", 10, "", "did you mean \"sim1.msin\"?"},
+        {"device set --profile ./x sim1.mscn=1", 10, "", "did you mean \"msin\"?"},
         {"device set --profile ./x sim0.mcc=45", 10, "", "./x: [sim0] mcc: \"45\" is wrong; 3 digits would be right"},
         {"device set --profile ./x sim0.mnc=4x", 10, "", "[sim0] mnc: \"4x\" is wrong; 2 to 3 digits would be right"},
-        {"device set --profile ./x 'sim0.card-status=2;;3'", 10, "",
-            "\"2;;3\" is wrong; a number from 0 to 255, or several with ;"},
+        {"device set --profile ./x 'sim0.card-status=2;;3'", 10, "", "\"2;;3\" is wrong; card-error (0), no-card (1), "},
         {"device set --profile ./x sim1.cp-name=modem0", 10, "", "[sim1] cp-name: \"modem0\" is that of sim0"},
         {"device set --profile ./x sim4.cp-name=modem4", 10, "", "[sim2] cp-name: missing"},
         {"device set --profile ./x sim8.cp-name=modem8", 10, "", "[sim8]: no such group; slots are sim0 to sim7"},
         {"device set --profile ./x sim1.mnc=123", 10, "", "[sim1] msin: too long"},
-        {"device set --profile ./x 'network.cellular=5 bars'", 10, "", "\"5 bars\" is wrong; a number from 0 to 5 would be right"},
-        {"device set --profile ./x network.wifi-connection=-2", 10, "", "\"-2\" is wrong; a number from -1 to 3 would be right"},
+        {"device set --profile ./x 'network.cellular=5 bars'", 10, "", "available (4) or connected (5) would be right"},
+        {"device set --profile ./x network.wifi-connection=-2", 10, "", "\"-2\" is wrong; failure (-1), "},
         {"device set --profile ./x storage.block-size=4294967296", 10, "", "[storage] block-size: \"4294967296\" is wrong"},
         {"device set --profile ./x 'run\ttime.wifi=1'", 10, "", "a bracket, a blank or a control character in it"},
         {"device set --profile ./x sim2.cp-name=modem2 sim2.mcc=450", 10, "",
             "[sim2] mnc: missing; mcc, mnc and msin stand together"},
+        {"device set --profile ./x network.wifi=conected", 10, "", "(did you mean \"connected\"?)"},
+        {"device set --profile ./x run-time.flight-mode=true", 10, "", "faults (did you mean \"runtime\"?)"},
+        {"device set --profile ./x faults.tel_inti=-5", 10, "", "no such function of the platform (did you mean \"tel_init\"?)"},
+        {"device set --profile ./x faults.tel_init@0=-5", 10, "", "\"@0\" is wrong; @ and a number from 1 to 1000000"},
+        {"device set --profile ./x faults.tel_init=0", 10, "",
+            "\"0\" is wrong; a number from -2147483648 to 2147483647, but not 0"},
+        {"network --profile ./fifo", 10, "", "./fifo: not a regular file"},
         {"device set --profile ./x flight-mode=true", 10, "", "GROUP.KEY=VALUE is needed"},
         {"device set --profile ./broken runtime.flight-mode=true", 10, "", "./broken: [device] serial: not UTF-8, or a backslash"},
         {"device set --profile ./x device.serial=\xff", 10, "", "[device] serial: the value is not UTF-8"},
@@ -84,6 +90,7 @@ TEST_F(KivctlTest, EndsWithTheDocumentedExitCode)
         {"subscribers add auth all a.b /a a.b --json", 0, "\"result\": \"unchanged\"", "was subscribed before"},
         {"subscribers remove auth all a.b /a a.b --json", 0, "\"result\": \"removed\"", ""},
     };
+    EXPECT_EQ(0, mkfifo("fifo", 0600));
     std::ofstream("broken") << "[device]\nserial=\\q\n";
     for (const auto& [arguments, exit, out, err] : cases)
     {
@@ -94,7 +101,10 @@ TEST_F(KivctlTest, EndsWithTheDocumentedExitCode)
         EXPECT_EQ(*out == '\0', outcome.out.empty()) << arguments;
     }
     EXPECT_FALSE(std::filesystem::exists("x"));
-    EXPECT_EQ(10, Outcome("env KIV_PROFILE=tripel " KIVCTL " network").exit);
+    const Outcome mistyped("env KIV_PROFILE=tripel KIV_LOG=verbose " KIVCTL " network");
+    EXPECT_EQ(10, mistyped.exit);
+    EXPECT_EQ(2, std::count(mistyped.err.begin(), mistyped.err.end(), '\n')) << mistyped.err;
+    EXPECT_THAT(mistyped.err, HasSubstr("kivctl: KIV_LOG: \"verbose\" is wrong; error, info or journal would be right\n"));
 }
 
 TEST_F(KivctlTest, SaysThatTheOutputCannotBeWritten)

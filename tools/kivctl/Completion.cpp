@@ -98,26 +98,6 @@ Candidates Recorded(const std::vector<std::string>& operands, bool isNew)
     return candidates;
 }
 
-/// The values of a key of device files that can be listed: those that the descriptions of the key name.
-Candidates ValuesOf(const kiv::platform::FieldInfo& field)
-{
-    if (field.values == "true or false")
-        return {{"true"}, {"false"}};
-    Candidates candidates;
-    const bool isNumber = field.values.rfind("a number", 0) == 0;
-    const std::string text = field.meaning.substr(0, field.meaning.find(';'));
-    for (size_t begin = isNumber ? text.find_first_of("-0123456789") : text.npos; begin != text.npos && begin < text.size();)
-    {
-        const size_t end = std::min(text.find(", ", begin), text.size());
-        const size_t blank = text.find(' ', begin);
-        const std::string number = text.substr(begin, blank - begin);
-        if (blank < end && number.find_first_not_of("-0123456789") == number.npos)
-            candidates.push_back({number, text.substr(blank + 1, end - blank - 1)});
-        begin = end == text.size() ? text.npos : end + 2;
-    }
-    return candidates;
-}
-
 /// "GROUP.KEY=" for every key, or the values behind it.
 Candidates Assignments(const std::string& typed)
 {
@@ -132,8 +112,8 @@ Candidates Assignments(const std::string& typed)
         if (key.size() == typed.size())
             candidates.push_back({name + "=", field.meaning});
         else if (name == key)
-            for (const Candidate& value : ValuesOf(field))
-                candidates.push_back({name + "=" + value.word, value.description});
+            for (const std::string& word : field.words)
+                candidates.push_back({name + "=" + word});
     }
     return candidates;
 }

@@ -1,41 +1,6 @@
-#include "Nearest.h"
 #include "Verbs.h"
 
 #include <SourceControl.h>
-
-#include <algorithm>
-
-namespace
-{
-
-/// The keys, those of a slot under the group of the one that is looked for.
-std::vector<std::string> KeysLike(const std::string& key)
-{
-    std::vector<std::string> keys = DeviceFileKeys();
-    if (key.rfind("sim", 0) != 0 || key.find('.') != 4)
-        return keys;
-    for (std::string& candidate : keys)
-    {
-        if (candidate.rfind("sim0.", 0) == 0)
-            candidate[3] = key[3];
-    }
-    return keys;
-}
-
-/// The nearest key for the first of the assignments that names none.
-std::string Hint(const std::vector<std::string>& assignments)
-{
-    for (const std::string& assignment : assignments)
-    {
-        const std::string key = assignment.substr(0, assignment.find('='));
-        const std::vector<std::string> keys = KeysLike(key);
-        if (std::find(keys.begin(), keys.end(), key) == keys.end() && key.rfind("packages.", 0) != 0)
-            return DidYouMean(key, keys);
-    }
-    return "";
-}
-
-} // namespace
 
 std::vector<std::string> DeviceFileKeys()
 {
@@ -61,7 +26,7 @@ Exit SetInDeviceFile(const std::vector<std::string>& assignments, const Command&
     }
     const std::string trouble = kiv::platform::SetInDeviceFile(file, assignments);
     if (!trouble.empty())
-        throw Failure(Exit::BadDevice, trouble + Hint(assignments));
+        throw Failure(Exit::BadDevice, trouble);
     return Exit::Done;
 }
 

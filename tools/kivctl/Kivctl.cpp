@@ -1,14 +1,11 @@
 #include "Kivctl.h"
 
 #include "Layout.h"
-#include "Nearest.h"
 
 #include <DeviceControl.h>
 #include <ResultCode.h>
 #include <SourceControl.h>
 #include <Visible.h>
-
-#include <unistd.h>
 
 #include <algorithm>
 #include <cstdio>
@@ -66,11 +63,7 @@ std::string DeviceAskedFor(const Command& command)
 
 std::string UseDevice(const Command& command)
 {
-    const std::string trouble =
-        command.profile.empty() ? kiv::platform::DeviceTrouble() : kiv::platform::UseProfile(command.profile);
-    const std::string device = DeviceAskedFor(command);
-    const bool isFile = device.find('/') != device.npos || access(device.c_str(), F_OK) == 0;
-    return trouble.empty() || isFile ? trouble : trouble + DidYouMean(device, ProfileNames());
+    return command.profile.empty() ? kiv::platform::DeviceTrouble() : kiv::platform::UseProfile(command.profile);
 }
 
 void RequireDevice(const Command& command)
