@@ -16,7 +16,7 @@ namespace kiv::test
 constexpr char kServiceManager[] = "org.tizen.servicemanager.service";
 constexpr char kBoardDaemon[] = "org.tizen.system.deviced";
 
-/// Records that can not be called, and what is wrong with them.
+/// Records that cannot be called, and what is wrong with them.
 const std::pair<_SubscriberInfo, std::string> kBadRecords[] = {
     {{"", "", ""}, "busname is not a bus name"},
     {{"a.b", "/x/", "a.b"}, "objectpath is not an object path"},
@@ -25,7 +25,7 @@ const std::pair<_SubscriberInfo, std::string> kBadRecords[] = {
     {{"a.b", "/x", "org.freedesktop.DBus.Locale"}, "interface is reserved"},
 };
 
-/// The library between a private bus and a subscriber store in memory.
+/// The library with a private bus and a subscriber store in memory.
 struct BusTest : testing::Test
 {
     ~BusTest() override { Settle(); }

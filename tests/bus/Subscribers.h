@@ -8,17 +8,17 @@
 namespace kiv::test
 {
 
-/// A subscriber store in memory, which knows one list for every kind and key. It stands in front of the support library's in every
-/// program that is linked with it, and holds records that the real one would refuse.
+/// A subscriber store in memory, with one list for every kind and key. It replaces the support library's in every program that
+/// links it, and accepts records that the real one refuses.
 struct Subscribers
 {
     Subscribers() { current = this; }
     ~Subscribers() { current = nullptr; }
 
     std::vector<_SubscriberInfo> records;
-    std::vector<std::string> asked; ///< what the library asked for: "kind key"
+    std::vector<std::string> asked; ///< the library's queries: "kind key"
 
-    std::mutex mutex; ///< of `asked`
+    std::mutex mutex; ///< guards `asked`
     static inline Subscribers* current = nullptr;
 };
 

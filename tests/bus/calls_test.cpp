@@ -1,5 +1,5 @@
-// How long the library waits and with which flags, for every call on the bus; and how often it makes a proxy. Functions of GIO have
-// a double in front of them that notes what it is given and passes it on.
+// Time limits and flags of every call on the bus, and the number of proxies. Doubles replace functions of GIO; they record their
+// arguments and pass them on.
 #include "bus/BusTest.h"
 
 #include <climits>
@@ -10,7 +10,7 @@ namespace
 
 std::mutex mutex;
 std::vector<std::string> noted;
-std::function<void(GDBusConnection*)> afterProxy; // done when a proxy was asked for
+std::function<void(GDBusConnection*)> afterProxy; // runs after a proxy was requested
 
 void Note(const char* what, int flags, int timeout)
 {

@@ -1,4 +1,4 @@
-// What the library makes of GIO's answers that no real bus gives on demand: two functions of GIO have a double in front of them.
+// The library's reaction to answers of GIO that no real bus gives on demand. Doubles replace two functions of GIO.
 #include "bus/BusTest.h"
 
 namespace
@@ -44,7 +44,7 @@ struct ConnectionTrouble : BusTest
     }
 };
 
-TEST_F(ConnectionTrouble, IsATimeOutOnlyWhenTheMessageSaysTime)
+TEST_F(ConnectionTrouble, IsATimeoutOnlyWhenTheMessageSaysSo)
 {
     const std::tuple<int, const char*, int, std::vector<std::string>> cases[] = {
         {24, "Timeout was reached", 3,
@@ -77,12 +77,12 @@ TEST_F(ConnectionTrouble, IsATimeOutOnlyWhenTheMessageSaysTime)
     }
 }
 
-TEST_F(ConnectionTrouble, IsPassedByWhenTheSharedOneIsDeadOrFails)
+TEST_F(ConnectionTrouble, IsAvoidedByAPrivateConnection)
 {
     store.records = {{"org.example.Nobody", "/", "a.b"}};
     const Connection dead = bus.Connect();
     g_dbus_connection_close_sync(dead.get(), nullptr, nullptr);
-    gio.refusal = "The connection is closed"; // as GDBus repeats it for a connection whose making failed
+    gio.refusal = "The connection is closed"; // GDBus repeats it for a connection whose set-up failed
     gio.code = G_IO_ERROR_CLOSED;
     for (GDBusConnection* const shared : {static_cast<GDBusConnection*>(nullptr), dead.get()})
     {
@@ -106,7 +106,7 @@ TEST_F(ConnectionTrouble, IsPassedByWhenTheSharedOneIsDeadOrFails)
     EXPECT_THAT(log.TakeErrors(), testing::Contains(testing::HasSubstr("g_bus_get_sync() failed:[")));
 }
 
-TEST_F(ConnectionTrouble, DoesNotEndTheProcessWhoeverMadeTheConnection)
+TEST_F(ConnectionTrouble, DoesNotEndTheProcess)
 {
     const Connection agents = bus.Connect();
     gio.connection = agents.get();
@@ -121,7 +121,7 @@ TEST_F(ConnectionTrouble, DoesNotEndTheProcessWhoeverMadeTheConnection)
     }
 }
 
-TEST_F(ConnectionTrouble, OfAnotherConnectionStaysItsOwnersAffair)
+TEST_F(ConnectionTrouble, OfAnAgentsOtherConnectionKeepsItsEffect)
 {
     const Connection agents = bus.Connect(), other = bus.Connect();
     gio.connection = agents.get();
@@ -132,7 +132,7 @@ TEST_F(ConnectionTrouble, OfAnotherConnectionStaysItsOwnersAffair)
     EXPECT_TRUE(g_dbus_connection_get_exit_on_close(other.get()));
 }
 
-TEST_F(ConnectionTrouble, IsCode5WhenNoProxyComes)
+TEST_F(ConnectionTrouble, IsCode5WithoutAProxy)
 {
     const Connection agents = bus.Connect();
     gio.connection = agents.get();

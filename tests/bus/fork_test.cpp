@@ -1,4 +1,4 @@
-// What a process made by fork may do on the bus.
+// The bus in processes made by fork.
 #include "bus/BusTest.h"
 
 #include <sys/wait.h>
@@ -9,7 +9,7 @@ namespace
 
 using namespace kiv::test;
 
-/// Has a child run something, and ends it when that takes long, though less than GDBus waits for an answer.
+/// Runs a function in a child. Kills the child after 20 seconds, which is less than GDBus waits for an answer.
 pid_t Start(const std::function<bool()>& run)
 {
     const pid_t child = fork();
@@ -28,7 +28,7 @@ bool Succeeds(pid_t child)
     return status == 0;
 }
 
-/// The library's calls, and how many fail.
+/// Makes the library's calls. @return how many failed
 std::size_t CallAll(const std::string& subscriber)
 {
     Subscribers store;
@@ -51,7 +51,7 @@ std::size_t CallAll(const std::string& subscriber)
     return failures;
 }
 
-/// A child made before GLib has any thread, which uses the bus once it is told where that is, and whom to call.
+/// A child made before GLib has any thread. It uses the bus after it receives the addresses of bus and subscriber.
 struct EarlyChild
 {
     EarlyChild()
@@ -78,7 +78,7 @@ struct EarlyChild
     pid_t child;
 } const early;
 
-TEST(Fork, LeavesTheBusToWhoeverUsesItAfterwards)
+TEST(Fork, AllowsTheBusOnlyToProcessesThatUseItAfterwards)
 {
     const PrivateBus bus;
     const Peer client(bus), daemon(bus, kBoardDaemon, Peer::Reply("('KIV1',)")), serviceManager(bus, kServiceManager);

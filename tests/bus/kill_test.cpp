@@ -1,4 +1,4 @@
-// A bus that is killed at random moments in every operation that uses it. More rounds, or those of an earlier run once more:
+// A bus that is killed at random moments of every operation that uses it. For more rounds, or to repeat an earlier run:
 //   KIV_KILL_ROUNDS=1000 KIV_KILL_SEED=7 bus_kill_test
 #include "bus/BusTest.h"
 
@@ -12,7 +12,7 @@ using testing::AnyOf;
 using testing::AnyOfArray;
 using testing::IsEmpty;
 
-/// What GDBus prints, after "Error while sending AddMatch()" or "GetNameOwner()", when the bus dies while a proxy is being made.
+/// GDBus prints it after "Error while sending AddMatch()" or "GetNameOwner()" when the bus dies while a proxy is being made.
 constexpr char kWhileProxiesAreMade[] = " message: The connection is closed";
 
 unsigned long Wish(const char* variable, unsigned long otherwise)
@@ -46,7 +46,7 @@ struct Kill : BusTest
             EXPECT_EQ(0, run()) << name;
     }
 
-    /// Each with its name and what comes back without a bus.
+    /// Each with its name and its result without a bus.
     const std::vector<std::tuple<const char*, std::function<int()>, std::vector<int>>> operations = {
         {"serial", [this] { return AskForSerial(); }, {1, 2}},
         {"service manager", [this] { return NotifyServiceManager(KIV_NOTI_TYPE_POLICY); }, {1, 2, 5}},
@@ -56,7 +56,7 @@ struct Kill : BusTest
     };
 };
 
-TEST_F(Kill, AtAnyMomentIsOutlivedByTheProcess)
+TEST_F(Kill, AtAnyMomentDoesNotEndTheProcess)
 {
     const unsigned long rounds = Wish("KIV_KILL_ROUNDS", 50), seed = Wish("KIV_KILL_SEED", std::random_device{}());
     std::printf("%lu rounds, seed %lu\n", rounds, seed);
@@ -97,7 +97,7 @@ TEST_F(Kill, AtAnyMomentIsOutlivedByTheProcess)
     PrivateBus::Tolerate(nullptr);
 }
 
-TEST_F(Kill, IsOverOnceTheBusIsBackThoughTheAgentHoldsTheDeadConnection)
+TEST_F(Kill, HasNoEffectOnceTheBusIsBack)
 {
     g_autoptr(GMainContext) gone = g_main_context_new(); // nobody iterates it before the end
     for (GMainContext* const maker : {static_cast<GMainContext*>(nullptr), gone})
@@ -116,9 +116,9 @@ TEST_F(Kill, IsOverOnceTheBusIsBackThoughTheAgentHoldsTheDeadConnection)
         while (!g_dbus_connection_is_closed(agents.get()))
             g_usleep(1000);
         log.Take();
-        RunAll(); // before the loop was told of the end
+        RunAll(); // before the loop notices the end
         Settle();
-        RunAll(); // after it
+        RunAll(); // afterwards
         std::thread([this] { RunAll(); }).join();
         Settle();
         EXPECT_THAT(log.TakeErrors(), IsEmpty());
@@ -129,7 +129,7 @@ TEST_F(Kill, IsOverOnceTheBusIsBackThoughTheAgentHoldsTheDeadConnection)
     }
 }
 
-TEST_F(Kill, WhileAPushConnectsLeavesTheProcessAlive)
+TEST_F(Kill, WhileAPushConnectsDoesNotEndTheProcess)
 {
     const unsigned long rounds = Wish("KIV_TEST_LONG", 0) != 0 ? 10'000 : 60;
     PrivateBus::Tolerate(kWhileProxiesAreMade);

@@ -1,4 +1,4 @@
-// What goes over the bus for each notification, and what becomes of those that can not be delivered.
+// The messages of each notification, and notifications that cannot be delivered.
 #include "bus/BusTest.h"
 
 #include <climits>
@@ -20,7 +20,7 @@ using Lines = std::vector<testing::Matcher<std::string>>;
 const struct
 {
     _KIV_NOTI_TYPE_E type;
-    const char* question; // what the store is asked
+    const char* question; // the query to the store
     std::string method, signature, values;
 } kEvents[] = {
     {KIV_NOTI_TYPE_AUTH_SUCCESS, "auth all", "auth", "si", "'450', 1"},
@@ -134,7 +134,7 @@ TEST_F(Notification, OfSeveralServicesIsOneStatusCallEach)
     EXPECT_EQ(std::vector<std::string>(3, "E DASystem.cpp SendMultiOnOffNotiToServiceManager > Invalid parameter"), log.Take());
 }
 
-TEST_F(Notification, PassesOverSubscribersThatGiveNoAnswer)
+TEST_F(Notification, SkipsSubscribersThatDoNotAnswer)
 {
     Peer last(bus), other(bus, "", Peer::Reply("(@as [], 7)")), refusing(bus, "", Peer::Refuse()), leaving(bus);
     leaving.Set(leaving.Leave());
@@ -159,7 +159,7 @@ TEST_F(Notification, PassesOverSubscribersThatGiveNoAnswer)
         EXPECT_THAT(peer->Calls(), ElementsAre(Status("7, 'on'")));
 }
 
-TEST_F(Notification, GoesToWhoOwnsTheNameWhenItsRecordIsReached)
+TEST_F(Notification, GoesToTheOwnerOfTheNameAtTheMomentOfTheCall)
 {
     constexpr char kName[] = "org.example.Moving";
     Peer before(bus, kName), after(bus);
@@ -181,7 +181,7 @@ TEST_F(Notification, GoesToWhoOwnsTheNameWhenItsRecordIsReached)
     EXPECT_THAT(log.TakeErrors(), ElementsAre(StatusError("no call result: ")));
 }
 
-TEST_F(Notification, WhoseBusGoesInTheMiddleOfTheWalkReportsEachOfTheRest)
+TEST_F(Notification, LogsEachSubscriberThatALostBusLeavesOut)
 {
     Peer killing(bus, "", Peer::InsteadDo([this] { bus.Stop(); })), last(bus);
     store.records = {Record(client), Record(killing), Record(last)};
@@ -193,7 +193,7 @@ TEST_F(Notification, WhoseBusGoesInTheMiddleOfTheWalkReportsEachOfTheRest)
     EXPECT_THAT(client.Calls(), SizeIs(1));
 }
 
-TEST_F(Notification, ContinuesOnTheNewBusInTheMiddleOfTheWalk)
+TEST_F(Notification, ContinuesOnANewBus)
 {
     const auto restart = [this]
     {
@@ -203,13 +203,13 @@ TEST_F(Notification, ContinuesOnTheNewBusInTheMiddleOfTheWalk)
     Peer killing(bus, "", Peer::InsteadDo(restart));
     store.records.assign(3, Record(killing));
     NotifyStatus();
-    // The new bus was asked for the other two, whom it does not know.
+    // The other two were requested from the new bus, which does not know them.
     EXPECT_THAT(log.TakeErrors(), AllOf(SizeIs(3), Each(StatusError("no call result: "))));
 }
 
-TEST_F(Notification, ToTheServiceManagerTellsWhetherItWasAnswered)
+TEST_F(Notification, ToTheServiceManagerReturnsWhetherItWasAnswered)
 {
-    // What stands in an answer does not matter. The second time that it is to leave, it is not there, and is not started either.
+    // The content of an answer does not matter. When it should leave a second time, it is not there, and is not started either.
     const std::tuple<Peer::Answer, int, const char*> cases[] = {{Peer::Reply("('no', 13)"), 0, ""},
         {Peer::Refuse(), 2, "not today"}, {serviceManager.Leave(), 2, ""}, {serviceManager.Leave(), 2, "DO_NOT_AUTO_START"}};
     for (const auto& [answer, code, reason] : cases)
@@ -221,7 +221,7 @@ TEST_F(Notification, ToTheServiceManagerTellsWhetherItWasAnswered)
     }
 }
 
-TEST_F(BusTest, AsksTheBoardDaemonForTheSerialNumberAfreshEachTime)
+TEST_F(BusTest, RequestsTheSerialNumberAnewOnEachCall)
 {
     const auto sent = [](const char* message) { return StartsWith(Line(message, "E", "SendDbusMethodNReceiveDID")); };
     const Lines refused = {StartsWith(Line("g_dbus_message_to_gerror() failed:[", "E", "ParseDeviceUniqueID"))};

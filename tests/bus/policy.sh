@@ -1,5 +1,5 @@
 #!/usr/bin/env bash
-# The example policy on a bus that denies by default: the library's calls pass, others do not, and a client service has to add a
+# Checks the example policy on a bus that denies by default: it allows only the library's calls, and a client service must add a
 # rule.
 # usage: policy.sh KIVCTL KIV_AGENT_CONF
 set -euo pipefail
@@ -30,7 +30,7 @@ start() # name text-that-it-prints command...
     done
 }
 
-# The agent, the services and their client are one user here, so the services' part of the policy is as narrow as can be.
+# The agent, the services and their client run as one user here, so the policy allows the services as little as possible.
 sed "s/user=\"kiv-agent\"/user=\"$(id --user)\"/" "$policy" >"$scratch/agent.conf"
 cat >"$scratch/bus.conf" <<CONF
 <busconfig>
@@ -82,7 +82,7 @@ EVENTS
 [[ $("$kivctl" push mail --data a --message b) == "sent subscribers=1 delivered=1" ]] || fail "not pushed"
 ! grep Rejected "$scratch/bus.log" || fail "the library makes calls that the policy denies"
 
-# Without a rule of its own, a client service is not told, nor is one started that does not run; the others are.
+# Without a rule for it, a client service is neither notified nor started. The others are.
 subscribe Other --kind auth
 "$kivctl" subscribers add auth all org.example.Gone /org/example org.example.Gone >/dev/null
 [[ $("$kivctl" notify auth-success 2>&1) == *"subscribers=3 delivered=1"* ]] || fail "not told to exactly one of three"
@@ -107,7 +107,7 @@ org.freedesktop.DBus             /               org.freedesktop.DBus.ListNames
 org.example.Other                /               org.kiv.ClientService.auth
 CALLS
 
-# Where not even the owner of a name may be asked for, nothing can be addressed.
+# If the bus denies even the query for the owner of a name, no service can be called.
 deny='<deny send_interface="org.freedesktop.DBus" send_member="GetNameOwner"/>'
 sed --in-place "s|</busconfig>|<policy context=\"mandatory\">$deny</policy>&|" "$scratch/bus.conf"
 kill -HUP "${pids[0]}"

@@ -1,4 +1,4 @@
-// The messages of a notification and of a push are those of the loop that one would write first, and no other.
+// A notification and a push send the same messages as a straightforward loop.
 #include "bus/BusTest.h"
 #include "support/BusMonitor.h"
 
@@ -19,12 +19,12 @@ struct Traffic : BusTest
     }
 
     const std::vector<std::string> paths = SubscriberPaths(3);
-    const Connection shared{g_bus_get_sync(G_BUS_TYPE_SYSTEM, nullptr, nullptr)}; // held, or each side would connect
+    const Connection shared{g_bus_get_sync(G_BUS_TYPE_SYSTEM, nullptr, nullptr)}; // held, so that neither side connects
     Peer service{bus, kServiceName};
     BusMonitor monitor{bus, shared.get()};
 };
 
-TEST_F(Traffic, OfANotificationIsThatOfTheBareLoop)
+TEST_F(Traffic, OfANotificationEqualsThatOfTheBareLoop)
 {
     std::string who = kImsi;
     const auto bare = monitor.During([this] { NotifyBare(paths, 7); });
@@ -33,7 +33,7 @@ TEST_F(Traffic, OfANotificationIsThatOfTheBareLoop)
     EXPECT_EQ(bare, ours);
 }
 
-TEST_F(Traffic, OfAPushIsThatOfTheBareLoopInAnyOrder)
+TEST_F(Traffic, OfAPushEqualsThatOfTheBareLoopInAnyOrder)
 {
     const auto bare = monitor.During([this] { PushBare(paths, "7"); });
     const auto push = [this]

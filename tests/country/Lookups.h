@@ -8,23 +8,23 @@
 namespace kiv::test
 {
 
-// The rows of the tables, listed apart from the library's own.
+// The rows of the tables, written independently of the library's.
 inline const Rows kCountry = Read("country.tsv"); // mcc, alpha-2, name
 inline const Rows kService = Read("service.tsv"); // mcc, service country code
 inline const Rows kCodes = Read("codes.tsv");     // mcc, alpha-3, calling code or "-"
 inline const Rows kMo = Read("mo.txt");           // mcc
 
-/// A lookup of the facade, or a test whether a key is in a table, which is told as the lookup of the key itself.
+/// A lookup of the facade. A test whether a key is in a table counts as a lookup of the key itself.
 struct Lookup
 {
     const char* name;
     std::function<std::string(const char*)> ask;
     Column answers;
-    const char* keyName;       ///< what the log calls an empty key
-    const char* miss;          ///< what the manager logs when nothing is found
+    const char* keyName;       ///< name of the key in the log
+    const char* miss;          ///< log line of the manager when nothing is found
     std::string none = "null"; ///< the answer when nothing is found
 
-    /// What it gives for a key.
+    /// Returns the answer for a key.
     std::string Answer(const std::string& key) const
     {
         const auto found = answers.find(key);
@@ -34,7 +34,7 @@ struct Lookup
     }
 };
 
-constexpr auto kKeep = [](void*) {}; // of a text that is the library's own
+constexpr auto kKeep = [](void*) {}; // for constant text of the library
 
 inline auto Text(void (DASystem::*lookup)(const char*, char**), void (*release)(void*) = std::free)
 {
@@ -47,7 +47,7 @@ inline auto Test(bool (DASystem::*test)(const char*))
     return [=](const char* key) { return std::string(std::invoke(test, DASystem::GetInstance(), key) ? key : "false"); };
 }
 
-/// What a calling code leads to by way of its MCC.
+/// Returns the answer for a calling code by way of its MCC.
 inline Column ByCallingCode(const Column& ofMcc)
 {
     Column found = Find(kCodes, 2, 0);
@@ -56,7 +56,7 @@ inline Column ByCallingCode(const Column& ofMcc)
     return found;
 }
 
-/// The alpha-2 code of an MCC that two countries share is that of the last.
+/// Of two countries that share an MCC, the last is the answer.
 inline const Column kLastAlpha2 = Find(Rows(kCountry.rbegin(), kCountry.rend()), 0, 1);
 
 #define TEXT(name) #name, Text(&DASystem::name)

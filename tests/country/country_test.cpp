@@ -1,4 +1,4 @@
-// Every lookup over every key, against rows that were listed apart from the library's own.
+// Every lookup with every key, compared with rows written independently of the library's.
 #include "country/Lookups.h"
 #include "support/LogCapture.h"
 
@@ -16,7 +16,7 @@ TEST(TheListedRows, AreAsManyAsTheTablesHold)
         (std::vector<std::size_t>{236, 134, 237, 48}), (std::vector{kCountry.size(), kService.size(), kCodes.size(), kMo.size()}));
 }
 
-/// Every key and answer of every lookup, and texts that differ from it by as little as can be.
+/// Every key and answer of every lookup, and texts that hardly differ from them.
 std::set<std::string> ManyKeys()
 {
     std::set<std::string> keys;
@@ -41,12 +41,12 @@ std::string Refused(const std::string& function, const std::string& keyName)
 Lines Missed(const Lookup& lookup)
 {
     const std::string manager = "E DASimManager.cpp ";
-    if (lookup.none == "untouched") // for want of the MCC that it needs
+    if (lookup.none == "untouched") // it lacks the MCC that it needs
         return {manager + "GetMccFromCountryCallingCode > fail to get mcc", Refused(lookup.name, "mcc")};
     return lookup.miss == nullptr ? Lines() : Lines{manager + lookup.name + " > " + lookup.miss};
 }
 
-TEST(CountryLookups, GiveTheRowOfTheVeryKey)
+TEST(CountryLookups, ReturnTheRowWithExactlyThisKey)
 {
     const std::set<std::string> keys = ManyKeys();
     LogCapture log;
@@ -60,7 +60,7 @@ TEST(CountryLookups, GiveTheRowOfTheVeryKey)
     }
 }
 
-TEST(CountryLookups, RefuseANullOrEmptyKeyInTheFacadeAlone)
+TEST(CountryLookups, RefuseANullOrEmptyKeyOnlyInTheFacade)
 {
     LogCapture log;
     for (const char* const key : {static_cast<const char*>(nullptr), ""})

@@ -1,10 +1,10 @@
 #!/usr/bin/python3
-"""Compares the library's tables with what others publish. Every difference stands in a reviewed list, with its reason: one that
-is not there fails, and one there that is no more fails too.
+"""Compares the library's tables with published data. A reviewed list contains every difference with its reason. The check fails
+for a difference that is not in the list, and for an entry of the list that is no longer a difference.
 
 usage: world.py iso-codes|libphonenumber|mobile-broadband-provider-info DATA_DIR
 
-DATA_DIR holds the rows of the tables, which the test of the lookups compares with the library's answers, and the list."""
+DATA_DIR contains the list, and the rows of the tables, which the test of the lookups compares with the library's answers."""
 import csv
 import importlib.util
 import json

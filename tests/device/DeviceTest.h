@@ -17,7 +17,7 @@ using platform::kEveryCall;
 using platform::kNoSlot;
 using platform::Leavings;
 
-/// The facade over a device with two SIMs.
+/// The facade on a device with two SIMs.
 struct DeviceTest : testing::Test
 {
     DeviceTest()
@@ -35,7 +35,7 @@ struct DeviceTest : testing::Test
         platform::ChangeDevice([&](Device& device) { device.*fact = value; });
     }
 
-    /// How many calls were made since the last time.
+    /// Returns the number of platform calls since the last time.
     static std::size_t TakeCalls() { return platform::TakeJournal().size(); }
 
     DASystem& facade = *DASystem::GetInstance();

@@ -1,4 +1,4 @@
-// The connection states, and the listener that hears of their changes.
+// The connection states, and the listener that is notified of changes.
 #include "device/DeviceTest.h"
 
 #include <DAConnectionManager.h>
@@ -34,7 +34,7 @@ TEST_F(ConnectionTest, IsUpWhenAnySelectedConnectionIs)
     {
         const std::bitset<5> bit(bits);
         const bool checkWifi = bit[0], checkBluetooth = bit[1], cellular = bit[2], wifi = bit[3], bluetooth = bit[4];
-        Set(&Device::cellularState, cellular ? 5 : 2); // what means connected to one means something else to the others
+        Set(&Device::cellularState, cellular ? 5 : 2); // the same number means something else in the other states
         Set(&Device::wifiState, wifi ? 2 : 5);
         Set(&Device::bluetoothState, bluetooth ? 2 : 5);
         const bool isUp = cellular || (checkWifi && wifi) || (checkBluetooth && bluetooth);
@@ -72,7 +72,7 @@ TEST_F(ConnectionTest, ListenerReceivesFiveKindsOfChangeWhateverFails)
         EXPECT_EQ(6U, TakeCalls());
     }
     C::__pListener = &listener;
-    kiv::platform::SetDevice(before); // would be told, if anything were still registered
+    kiv::platform::SetDevice(before); // would be notified if it were still registered
 }
 
 TEST_F(ConnectionTest, ListenerReceivesAChangeDuringItsRegistration)

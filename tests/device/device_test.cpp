@@ -1,4 +1,4 @@
-// What the facade tells of device and platform.
+// The facade's members for device and platform.
 #include "device/DeviceTest.h"
 
 #include <cmath>
@@ -12,7 +12,7 @@ using testing::IsEmpty;
 
 using DeviceFacts = DeviceTest;
 
-TEST_F(DeviceFacts, ThatAreTextsAreNullWhereThePlatformSucceedsWithoutOne)
+TEST_F(DeviceFacts, ThatAreTextsAreNullWhenThePlatformReturnsNone)
 {
     for (const Call call : {Call::system_settings_get_value_string, Call::system_info_get_platform_string,
              Call::package_info_get_version, Call::telephony_modem_get_imei})
@@ -21,13 +21,13 @@ TEST_F(DeviceFacts, ThatAreTextsAreNullWhereThePlatformSucceedsWithoutOne)
              &DASystem::GetTizenIdN, &DASystem::GetIMEI})
         EXPECT_EQ("null", Out([&](char** out) { EXPECT_EQ(0, std::invoke(read, facade, out)); }));
     EXPECT_EQ("null", Out([&](char** out) { EXPECT_EQ(0, facade.GetPackageVersion("org.example.mail", out)); }));
-    kiv::platform::FailCall(Call::package_info_create, 0); // no handle, which must not be used
+    kiv::platform::FailCall(Call::package_info_create, 0); // succeeds without a handle
     EXPECT_EQ("null", Out([&](char** out) { EXPECT_EQ(0, facade.GetPackageVersion("org.example.mail", out)); }));
     EXPECT_THAT(kiv::platform::TakeMisuses(), IsEmpty());
     EXPECT_THAT(log.Take(), IsEmpty());
 }
 
-TEST_F(DeviceFacts, ThatAreSwitchesAreReadEachForItself)
+TEST_F(DeviceFacts, ThatAreSwitchesAreReadSeparately)
 {
     constexpr bool Device::*kSwitches[] = {&Device::flightMode, &Device::dataRoaming, &Device::mobileData, &Device::packetData};
     for (const auto& on : kSwitches)
@@ -40,7 +40,7 @@ TEST_F(DeviceFacts, ThatAreSwitchesAreReadEachForItself)
     }
 }
 
-TEST_F(DeviceFacts, OfAPackageAreThoseOfOneThatIsInstalledUnderThatVeryName)
+TEST_F(DeviceFacts, OfAPackageNeedItsExactName)
 {
     const std::string place = "E DASystem.cpp IsPackageInstalled > ", empty = "PackageName is empty. IsPackageInstalled finish.";
     for (const char* const package : {static_cast<const char*>(nullptr), "", "org.example.mai"})
@@ -77,7 +77,7 @@ TEST_F(DeviceFacts, HaveAnImeiWithOrWithoutAnAnsweringModem)
 
     kiv::platform::FailCall(Call::telephony_modem_get_imei, -1);
     const std::pair<const char*, const char*> zones[] = {{"EAST-9", "324000000000000"}, {"WEST5", "-18000000000000"},
-        {"STD0DST-2,0/0,J365/25", "720000000000000"}, // summer all the year
+        {"STD0DST-2,0/0,J365/25", "720000000000000"}, // daylight saving time all year
         {"UTC", "000000000000000"}};
     for (const auto& [zone, digits] : zones)
     {

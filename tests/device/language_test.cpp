@@ -1,4 +1,4 @@
-// The device's language as a code, against rows that were listed apart from the library's own.
+// The device's language as a code, compared with rows written independently of the library's.
 #include "device/DeviceTest.h"
 
 #include <climits>
@@ -11,7 +11,7 @@ using namespace kiv::test;
 
 struct Language : DeviceTest
 {
-    /// Asks for the plain code and the ISO 639-2 one.
+    /// Reads the plain code and the ISO 639-2 code.
     void Expect(const std::string& plain, const std::string& iso)
     {
         EXPECT_EQ(plain, Out([&](char** out) { EXPECT_EQ(0, facade.GetDeviceLanguageCode(out, false)); }));
@@ -49,7 +49,7 @@ TEST_F(Language, IsThePartOfTheSettingBeforeTheFirstUnderscore)
     Expect("EN", "eng"); // success without a text
 }
 
-TEST_F(Language, IsCutOutWithHelpersThatKnowTheirBounds)
+TEST_F(Language, HelpersStayWithinTheBoundsOfTheText)
 {
     EXPECT_EQ(5, facade.GetTagStartPosition("en_US_x", "_x"));
     EXPECT_EQ(-1, facade.GetTagStartPosition("en", "_"));

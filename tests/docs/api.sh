@@ -1,5 +1,5 @@
 #!/usr/bin/env bash
-# The pages of the headers are made without a warning: whatever is public is documented.
+# Doxygen makes the pages of the headers without a warning, so everything public is documented.
 # usage: api.sh SOURCE_DIR
 set -euo pipefail
 command -v doxygen >/dev/null || { echo "skipped: doxygen is not installed"; exit 77; }

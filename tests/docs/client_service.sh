@@ -1,5 +1,5 @@
 #!/usr/bin/env bash
-# Builds a client service as the page about them says, in one of its languages, and has it hear what the page says.
+# Builds the client service of the documentation, in one of its languages, and checks that it prints what the page shows.
 # usage: client_service.sh BUILD_DIR SOURCE_DIR cpp|python [CXX...]
 set -euo pipefail
 build=$1 sources=$2 language=$3 cxx=("${@:4}")
@@ -73,7 +73,7 @@ read -ra subscriptions <<<"$(block sh 3)"
 start subscriptions ready "${subscriptions[@]::3}"
 start service ready "${service[@]}"
 
-# What the page shows once more: what the service printed stands behind its start.
+# Repeats what the page shows: the service's output follows its start.
 block console 1 | awk '/^\$ / { file = /^\$ \.\/mail/ ? "heard" : "told"; if (file == "heard") next } { print >file ".expected" }'
 while read -r prompt command; do
     [[ $prompt == '$' ]] || continue

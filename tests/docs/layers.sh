@@ -1,5 +1,5 @@
 #!/usr/bin/env bash
-# The picture of the layers has an arrow where a folder includes a header of another one, and no other.
+# The picture of the layers has exactly one arrow for each folder that includes headers of another folder.
 # usage: layers.sh SOURCE_DIR
 set -euo pipefail
 cd "$1"
@@ -15,7 +15,7 @@ drawn()
         awk '$2 == "-->" { print folder[$1], folder[$3]; next } { folder[$1] = $2 }'
 }
 
-# A folder that has a header of that name includes its own.
+# A folder with a header of that name includes its own.
 included()
 {
     for folder in "${folders[@]}"; do

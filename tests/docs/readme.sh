@@ -1,5 +1,5 @@
 #!/usr/bin/env bash
-# The README names every member of the facade and as many tests as there are, and whatever a page links to is there.
+# The README names every member of the facade and the number of tests, and all links of the pages work.
 # usage: readme.sh SOURCE_DIR BUILD_DIR
 set -euo pipefail
 cd "$1"

@@ -31,7 +31,7 @@ std::vector<std::string> kiv::fuzz::Split(std::string_view text, char separator,
 extern "C" int LLVMFuzzerInitialize(int*, char***)
 {
     g_log_set_always_fatal(static_cast<GLogLevelFlags>(G_LOG_LEVEL_ERROR | G_LOG_LEVEL_CRITICAL | G_LOG_LEVEL_WARNING));
-    std::signal(SIGTRAP, [](int) { std::abort(); }); // GLib's way to end the process; libFuzzer keeps the input for the other
+    std::signal(SIGTRAP, [](int) { std::abort(); }); // GLib ends the process with SIGTRAP; libFuzzer keeps the input after SIGABRT
     kiv::platform::SetLogSink([](const auto&) {});   // every line is formatted
     return std::atexit([] { std::fprintf(stderr, "fed %zu\n", kiv::fuzz::fed); });
 }

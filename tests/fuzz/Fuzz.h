@@ -1,5 +1,5 @@
 /// @file
-/// What the fuzz targets have in common. Their inputs are lines of text, so that one can be read, and written by hand.
+/// Shared code of the fuzz targets. Their inputs are lines of text, so that people can read and write them.
 #ifndef KIV_TESTS_FUZZ_H
 #define KIV_TESTS_FUZZ_H
 
@@ -11,20 +11,20 @@
 namespace kiv::fuzz
 {
 
-/// Ends the run, which keeps the input, unless it is true.
+/// Ends the run and keeps the input if the condition is false.
 void Require(bool isTrue, const char* what);
 
-/// What the library was given so far; the sum is printed at the end of the run.
+/// Counts what the library received; the end of the run prints the sum.
 inline std::size_t fed = 0;
 inline void Feed(std::size_t records)
 {
     fed += records;
 }
 
-/// The pieces between separators, and empty ones behind them up to `least`.
+/// Returns the pieces between separators, followed by empty ones up to `least`.
 std::vector<std::string> Split(std::string_view text, char separator, std::size_t least = 1);
 
-/// As std::strtoll() reads it, wrapped.
+/// Returns the number as std::strtoll() reads it, wrapped.
 inline int Number(const std::string& text)
 {
     return static_cast<int>(std::strtoll(text.c_str(), nullptr, 10));
@@ -32,7 +32,7 @@ inline int Number(const std::string& text)
 
 } // namespace kiv::fuzz
 
-/// What each target defines.
+/// Each target defines it.
 void Try(std::string_view input);
 
 #endif

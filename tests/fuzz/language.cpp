@@ -1,4 +1,4 @@
-// A language setting, against codes that were listed apart from the library's own.
+// A language setting, compared with codes written independently of the library's.
 #include "Fuzz.h"
 #include "support/Texts.h"
 

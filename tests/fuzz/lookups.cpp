@@ -1,4 +1,4 @@
-// A letter that picks a lookup, and its key, against rows that were listed apart from the library's own.
+// A letter that selects a lookup, and its key, compared with rows written independently of the library's.
 #include "country/Lookups.h"
 #include "Fuzz.h"
 
@@ -9,7 +9,7 @@ using namespace kiv::test;
 
 void Try(std::string_view input)
 {
-    static const bool isSilent = (kiv::platform::SetLogSink({}), true); // to format lines would take longer than to look up
+    static const bool isSilent = (kiv::platform::SetLogSink({}), true); // formatting lines would take longer than the lookup
     Require(isSilent, "nobody reads the log");
     const Lookup& lookup = kLookups[input.empty() ? 0 : static_cast<unsigned char>(input[0] - 'a') % std::size(kLookups)];
     const std::string key = input.empty() ? "" : std::string(input.substr(1)).c_str(); // up to the first null

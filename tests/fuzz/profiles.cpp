@@ -1,4 +1,4 @@
-// Device files. What can be read is then the device and answers, and its text is changed by the assignments behind a line "%%".
+// Device files. A valid file becomes the device and answers calls. Assignments after a line "%%" change its text.
 #include "DeviceFile.h"
 #include "Fuzz.h"
 

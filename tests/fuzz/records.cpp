@@ -1,6 +1,5 @@
-// Lines of bus name, object path and interface with tabs between them; each line's name with each line's path and interface is a
-// record of a subscriber. A good record stands somewhere among them. A line "push" in front has a push delivered, anything else
-// has a notification.
+// Lines of bus name, object path and interface, separated by tabs. Each line's name with each line's path and interface is a
+// subscriber's record. A good record is among them. If the first line is "push", a push is delivered, otherwise a notification.
 #include "Fuzz.h"
 #include "bus/Subscribers.h"
 #include "support/Peer.h"
@@ -12,7 +11,7 @@ using namespace kiv::test;
 
 void Try(std::string_view input)
 {
-    static std::atomic<unsigned> number{0}; // of the input: the good record has an object of its own, which no other record names
+    static std::atomic<unsigned> number{0}; // of the input; the good record has its own object, which no other record names
     static std::atomic<int> delivered{0}, late{0};
     static const auto path = [](unsigned of) { return "/example/client/" + std::to_string(of); };
     const auto answer = [](GDBusMessage* call)
@@ -23,7 +22,7 @@ void Try(std::string_view input)
     };
     static const PrivateBus& bus = *new PrivateBus;
     static Peer& peer = *new Peer(bus, "org.tizen.servicemanager.service", answer);
-    static GDBusConnection* const connection = g_bus_get_sync(G_BUS_TYPE_SYSTEM, nullptr, nullptr); // as an agent holds it
+    static GDBusConnection* const connection = g_bus_get_sync(G_BUS_TYPE_SYSTEM, nullptr, nullptr); // held, like an agent does
     peer.Forget();
 
     constexpr std::size_t kMostLines = 10; // the bus lets a connection wait for 128 replies at once

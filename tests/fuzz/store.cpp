@@ -1,5 +1,5 @@
-// What is done to a store, a line each, with fields behind tabs: "+" adds a subscription, "-" removes one, "@" writes a text at a
-// place of the file. After each step, what is found has to fit it, as long as nothing was written but subscriptions.
+// Operations on a store, one per line, with fields separated by tabs: "+" adds a subscription, "-" removes one, "@" writes a text
+// at a place of the file. Until the first "@", the subscribers found must be right after each step.
 #include "Fuzz.h"
 
 #include <DASubscribeDataManager.h>

@@ -1,4 +1,4 @@
-// Texts for the bus, a line each, behind a line with a letter that picks an operation and a number: service id, flag or time.
+// Texts for the bus, one per line. The first line has a letter that selects an operation, and a number: service id, flag or time.
 #include "Fuzz.h"
 #include "bus/Subscribers.h"
 #include "support/Peer.h"
@@ -19,8 +19,8 @@ DADBusManager& manager = *DADBusManager::GetInstance();
 // clang-format off
 const struct
 {
-    std::ptrdiff_t texts; ///< how many go on the bus
-    int refused;          ///< the code when one is no text
+    std::ptrdiff_t texts; ///< how many are sent on the bus
+    int refused;          ///< the code when one is invalid
     int (*send)(int number, Arguments t);
 } kOperations[] = {
     {5, 4, [](int n, Arguments t) { return manager.SendNotiToServiceManager(KIV_NOTI_TYPE_POLICY, t[0], n, t[1], t[2], t[3], t[4]); }},
@@ -38,7 +38,7 @@ const struct
 
 void Try(std::string_view input)
 {
-    static std::vector<std::string> told; // bodies as they came; the caller reads them when it has an answer, or sees the count
+    static std::vector<std::string> told; // bodies in order of arrival; read after an answer, or when `count` shows them
     static std::atomic<std::size_t> count{0};
     const auto answer = [](GDBusMessage* call)
     {

@@ -1,7 +1,7 @@
 # shellcheck shell=bash
-# Sourced. Builds the agent that the README shows against an installed tree, the way a user would, and runs it.
+# Sourced. Builds the README's agent with an installed tree, as a user would, and runs it.
 
-# With the flags of pkg-config and with CMake's package; both find the tree wherever it stands.
+# Builds with the flags of pkg-config and with CMake's package. Both find the tree in any place.
 try_agent() # prefix readme scratch compiler...
 {
     local prefix=$1 readme=$2 scratch=$3 cxx=("${@:4}") flags
@@ -30,7 +30,7 @@ CMAKE
     run_agent "$scratch/with-cmake/agent"
 }
 
-# KIV_EMULATOR is the command that runs the programs of a cross build, word by word; else it is empty.
+# KIV_EMULATOR is the command that runs programs of a cross build, word by word; otherwise it is empty.
 run_agent() # agent
 {
     export DBUS_SYSTEM_BUS_ADDRESS="unix:path=$scratch/no-bus" KIV_SUBSCRIBERS="$scratch/subscribers.db"

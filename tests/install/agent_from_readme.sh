@@ -1,5 +1,5 @@
 #!/usr/bin/env bash
-# Installs a build into a prefix that is on no default path, moves it, and there builds and runs the agent that the README shows.
+# Installs a build into a prefix outside the default paths, moves it, and builds and runs the README's agent with it.
 # usage: agent_from_readme.sh BUILD_DIR README CXX...
 set -euo pipefail
 build=$1 readme=$2 cxx=("${@:3}")
@@ -24,7 +24,7 @@ for header in "$scratch"/moved/include/kiv_system/{tele,wifi,net_,run,sys,sto,pa
         "${cxx[@]}" -x c -std=c11 -fsyntax-only -Wall -Wextra -Wpedantic -Werror "${flags[@]}" "$header"
 done
 
-# Where the C library counts with 32 bits unless told otherwise, the contract says what to tell it.
+# Where the C library uses 32 bits by default, the contract documents the setting for 64 bits.
 narrow=$(echo '#include <sys/statvfs.h>
 #if __SIZEOF_LONG__ == 4
 narrow

@@ -1,6 +1,6 @@
 #!/usr/bin/env bash
-# Holds what was built against what hardening asks for.
-# usage: hardening.sh READELF FILE...   the first of them calls something that _FORTIFY_SOURCE watches
+# Checks that the built files are hardened.
+# usage: hardening.sh READELF FILE...   the first one calls a function that _FORTIFY_SOURCE checks
 set -euo pipefail
 readelf=$1
 shift

@@ -1,4 +1,4 @@
-// An agent that opens the library while it runs, and closes it with changes and deliveries still to come.
+// An agent that opens the library at run time, and closes it while changes and deliveries are still to come.
 #include "bus/BusTest.h"
 
 #include <DeviceControl.h>
@@ -21,14 +21,14 @@ struct Listener : IDAConnectionStateListener
     std::atomic<unsigned> heard{0};
 };
 
-/// A function of the library by its name there; a member takes its object first.
+/// Returns a function of the library by its symbol; a member takes its object first.
 template <class Function>
 Function* Symbol(void* library, const char* name)
 {
     return reinterpret_cast<Function*>(dlsym(library, name));
 }
 
-TEST(Library, StaysForItsListenerAndPushesAfterItIsClosed)
+TEST(Library, StaysLoadedForItsCallbacksAfterItIsClosed)
 {
     const PrivateBus bus;
     Peer client(bus);

@@ -1,6 +1,6 @@
 #!/usr/bin/env bash
-# Builds the library for a device: from its own sources alone, on libraries and headers that it finds by the names that pkg-config
-# knows on a device. The simulated device is installed under these names, each header where its .pc file alone leads to.
+# Builds the library for a device: from its own sources only, with libraries and headers that pkg-config finds by their names on a
+# device. The simulated device is installed under these names, each header in a place that only its .pc file names.
 # usage: native.sh BUILD_DIR SOURCE_DIR CXX...
 set -euo pipefail
 build=$1 sources=$2 cxx=("${@:3}")
@@ -60,7 +60,7 @@ fi
 configure -DKIV_PC_DLOG=device-log && cmake --build "$scratch/build" --parallel 2 >>"$scratch/log" 2>&1 &&
     cmake --install "$scratch/build" --prefix "$scratch/prefix" >>"$scratch/log" || { cat "$scratch/log"; exit 1; }
 
-# Nothing of the device is built or installed, and the same is exported. An agent gets to the device by the names.
+# Nothing of the device is built or installed, and the exports are the same. An agent finds the device by these names.
 made=$(find "$scratch/prefix" -name '*.so*' -o -name '*.h' | sed 's|.*/||; s|[.]so.*|.so|' | sort --unique | tr '\n' ' ')
 expected=$({ ls "$sources/lib/DASystem/include"; echo libkiv_system.so; } | sort | tr '\n' ' ')
 [[ $made == "$expected" ]] || { echo "installed: $made"; exit 1; }

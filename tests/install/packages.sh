@@ -1,6 +1,6 @@
 #!/usr/bin/env bash
-# Makes the Debian packages of a build, has them checked, installs them into a root of their own, and there builds and runs the
-# agent that the README shows, and kivctl.
+# Makes the Debian packages of a build, checks them, installs them into a private root, and builds and runs the README's agent and
+# kivctl there.
 # usage: packages.sh BUILD_DIR README CXX...
 set -euo pipefail
 build=$1 readme=$2 cxx=("${@:3}")
@@ -16,8 +16,8 @@ cpack --config "$build/CPackConfig.cmake" -B "$scratch" >cpack.log 2>&1 || { cat
 ls ./*.deb
 lintian --allow-root --fail-on error ./*.deb
 
-# dpkg knows what is installed here, or in a cross build what the compiler's libraries are, so that it refuses a package whose
-# dependencies are not there.
+# dpkg knows what is installed here, or in a cross build the packages of the compiler's libraries, so it refuses a package with
+# missing dependencies.
 root=$scratch/root
 mkdir -p "$root"/var/lib/dpkg/{info,updates,triggers}
 cp "${KIV_SYSROOT-}/var/lib/dpkg/status" "$root/var/lib/dpkg/status"

@@ -1,6 +1,6 @@
 #!/usr/bin/env bash
-# Builds once more what was built, from a copy of the sources in another place, and compares every byte: of the libraries, or of
-# kivctl and the packages too.
+# Repeats the build with a copy of the sources in another place, and compares every byte of the libraries, or also of kivctl and the
+# packages.
 # usage: same_bytes.sh BUILD_DIR SOURCE_DIR [packages]
 set -euo pipefail
 build=$1 sources=$2 packages=${3-} target=kiv_system
@@ -12,7 +12,7 @@ copy=$scratch/a/copy/of/the/sources
 mkdir -p "$copy" "$scratch"/{first,second}
 cp -r "$sources"/{CMakeLists.txt,LICENSE,cmake,dbus,lib,platform,tools} "$copy"
 mapfile -t settings < <(grep -E '^CMAKE_(TOOLCHAIN_FILE|BUILD_TYPE|UNITY_BUILD|CXX_COMPILER|CXX_FLAGS(_[A-Z]+)?|INSTALL_(PREFIX|LIBDIR)):' "$build/CMakeCache.txt")
-generator=$(sed -n 's/^CMAKE_GENERATOR:INTERNAL=//p' "$build/CMakeCache.txt") # whose working directories stand in debug information
+generator=$(sed -n 's/^CMAKE_GENERATOR:INTERNAL=//p' "$build/CMakeCache.txt") # debug information contains its working directories
 cmake -S "$copy" -B "$scratch/b" -G "$generator" "${settings[@]/#/-D}" -DKIV_BUILD_TESTS=OFF >"$scratch/log" 2>&1 &&
     cmake --build "$scratch/b" --parallel 2 --target $target >>"$scratch/log" 2>&1 ||
     { cat "$scratch/log"; exit 1; }

@@ -1,4 +1,4 @@
-// Pushes to the client services of a private bus, which go on in the main loop of the caller's thread.
+// Pushes to client services on a private bus. They run in the main loop of the caller's thread.
 #include "bus/BusTest.h"
 
 namespace
@@ -16,7 +16,7 @@ struct Push : BusTest
 {
     void Deliver() { EXPECT_EQ(0, manager.DeliverPushMessage("7", "data", "message", 1'700'000'000)); }
 
-    /// Delivers, and tells what is logged in the loop.
+    /// Delivers a push and returns what is logged in the loop.
     std::vector<std::string> Steps()
     {
         Deliver();
@@ -48,7 +48,7 @@ TEST_F(Push, CarriesItsTextsAndTimeToEverySubscriber)
         std::string id = "7", data = "{k: 1}", message = "gr\xC3\xBC\xC3\x9F";
         EXPECT_EQ(0, manager.DeliverPushMessage(id.c_str(), data.c_str(), message.c_str(), time));
         for (std::string* const text : {&id, &data, &message})
-            text->assign(text->size(), '!'); // as good as freed
+            text->assign(text->size(), '!'); // as if freed
         Settle();
         const std::string values = "(('7', '{k: 1}', 'gr\xC3\xBC\xC3\x9F', " + std::to_string(time) + "),)";
         EXPECT_EQ("/example/client org.example.Client.push ((sssx)) " + values, first.Calls().back());
@@ -74,7 +74,7 @@ TEST_F(Push, LogsEachStepOfADelivery)
     EXPECT_EQ(expected, Steps());
 }
 
-TEST_F(Push, IsNotStartedWithATextThatCannotGoOnTheBus)
+TEST_F(Push, IsNotStartedWithAnInvalidText)
 {
     for (const auto& [bad, flaw] : {std::pair<const char*, std::string>(nullptr, " is null"), {"\xFF", " is not valid UTF-8"}})
     {
@@ -87,7 +87,7 @@ TEST_F(Push, IsNotStartedWithATextThatCannotGoOnTheBus)
     EXPECT_THAT(store.asked, testing::IsEmpty());
 }
 
-TEST_F(Push, WaitsForTheLoopOfTheThreadDefaultContextOfWhoeverStartedIt)
+TEST_F(Push, RunsInTheThreadDefaultContextOfItsCaller)
 {
     Peer client(bus);
     Subscribe(client);
@@ -97,7 +97,7 @@ TEST_F(Push, WaitsForTheLoopOfTheThreadDefaultContextOfWhoeverStartedIt)
         context, [](gpointer flag) -> gboolean { return *static_cast<bool*>(flag) = true, G_SOURCE_REMOVE; }, &ran);
     g_main_context_push_thread_default(context);
     Deliver();
-    EXPECT_EQ(0, NotifySubscribers(KIV_NOTI_TYPE_AUTH_SUCCESS)); // a synchronous call gets through
+    EXPECT_EQ(0, NotifySubscribers(KIV_NOTI_TYPE_AUTH_SUCCESS)); // a synchronous call succeeds
     g_main_context_pop_thread_default(context);
     EXPECT_FALSE(ran) << "and runs nothing of the caller's";
     EXPECT_THAT(client.Calls(), ElementsAre(HasSubstr(".auth ")));
@@ -106,9 +106,9 @@ TEST_F(Push, WaitsForTheLoopOfTheThreadDefaultContextOfWhoeverStartedIt)
     EXPECT_THAT(client.Calls(), ElementsAre(HasSubstr(".auth "), call));
 }
 
-TEST_F(Push, GoesToTheNewBusAfterOneThatDied)
+TEST_F(Push, GoesToTheNewBusAfterTheOldOneDied)
 {
-    Connection agents(g_bus_get_sync(G_BUS_TYPE_SYSTEM, nullptr, nullptr)); // with which GDBus would end the process
+    Connection agents(g_bus_get_sync(G_BUS_TYPE_SYSTEM, nullptr, nullptr)); // GDBus would end the process when it closes
     Peer silent(bus, "", Peer::InsteadDo([] {}));
     store.records = {Record(silent), Record(silent)};
     Deliver();
@@ -134,7 +134,7 @@ TEST_F(Push, GoesToTheNewBusAfterOneThatDied)
     bus.Start();
     Peer next(bus);
     store.records = {Record(next)};
-    // What the push left behind does not keep another thread from the bus, though its context is iterated no more.
+    // Another thread can still use the bus, although the context of the push is not iterated any more.
     std::thread([this] { NotifySubscribers(KIV_NOTI_TYPE_AUTH_SUCCESS); }).join();
     EXPECT_THAT(next.Calls(), SizeIs(1));
 }

@@ -12,7 +12,7 @@ namespace kiv::test
 constexpr char kPath[] = "/org/example/Client";
 constexpr char kInterface[] = "org.example.Client";
 
-/// A folder for a subscriber store, the one in use as long as it lives; in memory where there is a place for that.
+/// A folder with the subscriber store in use while it lives; in memory if possible.
 struct StoreFolder
 {
     StoreFolder() { g_setenv("KIV_SUBSCRIBERS", (path / "subscribers.db").c_str(), TRUE); }
@@ -27,7 +27,7 @@ struct StoreFolder
                       .data());
 };
 
-/// A client service that subscribes over the bus, with a connection of its own.
+/// A client service that subscribes over the bus, with its own connection.
 class Client : public Peer
 {
 public:
@@ -36,7 +36,7 @@ public:
     std::string UniqueName() const { return g_dbus_connection_get_unique_name(Bus()); }
 
     /// Calls the subscription service.
-    /// @return the reply's body as text, or the error's name without what all have in common; its text is kept
+    /// @return the reply's body as text, or the error's name without the common prefix; `reason` keeps its text
     std::string Call(const char* method, GVariant* arguments = nullptr)
     {
         GError* error = nullptr;

@@ -1,5 +1,5 @@
-// The subscription service as a bus starts it: it ends when idle, is killed, and has many clients.
-// KIV_TEST_LONG=1 has 100 clients come and leave for 30 seconds.
+// The subscription service, started by a bus: it ends when idle, is killed, and has many clients.
+// With KIV_TEST_LONG=1, 100 clients come and leave for 30 seconds.
 #include "services/Client.h"
 #include "support/Deliveries.h"
 
@@ -26,10 +26,10 @@ bool IsLong()
     return g_strcmp0(g_getenv("KIV_TEST_LONG"), "1") == 0;
 }
 
-/// Writes what a bus needs that starts the service on demand. @return its configuration
+/// Writes the files of a bus that starts the service on demand. @return its configuration
 std::string Configure(const fs::path& folder, const std::string& idleSeconds)
 {
-    // The bus hands its own output on, which is a pipe that nobody empties.
+    // The service inherits the bus's output, a pipe that nobody reads.
     std::ofstream(folder / "org.kiv.Subscriptions.service")
         << "[D-BUS Service]\nName=org.kiv.Subscriptions\nExec=/bin/sh -c 'exec " KIV_SUBSCRIPTION_SERVICE " --idle " << idleSeconds
         << " >/dev/null'\n";
@@ -78,7 +78,7 @@ struct OnDemand
     std::mt19937 random{std::random_device{}()};
 };
 
-TEST(SubscriptionService, EndsWhenIdleAndLosesNoCallMeanwhile)
+TEST(SubscriptionService, LosesNoCallWhenItEndsIdle)
 {
     OnDemand on("0.02");
     std::set<pid_t> processes;
@@ -91,7 +91,7 @@ TEST(SubscriptionService, EndsWhenIdleAndLosesNoCallMeanwhile)
     EXPECT_LT(2U, processes.size());
 }
 
-TEST(SubscriptionService, StaysAsLongAsThereIsAUniqueNameToWatch)
+TEST(SubscriptionService, StaysWhileThereIsAUniqueNameToWatch)
 {
     OnDemand on("0.02");
     Client leaves(on.bus);
@@ -121,7 +121,7 @@ TEST(SubscriptionService, LeavesTheStoreRightWheneverItIsKilled)
                 return victim > 0 ? kill(victim, SIGKILL) : 0;
             });
         const char* const method = round % 2 == 0 ? "Subscribe" : "Unsubscribe";
-        // An answer that died with the service says nothing of the change; the second call then finds it done.
+        // If the answer is lost with the service, the change may be done; then the second call finds it done.
         std::string answer;
         while ((answer = on.client.Change(method, kMail)) == "NoReply")
             continue;
@@ -140,7 +140,7 @@ TEST(SubscriptionService, LeavesTheStoreRightWheneverItIsKilled)
     }
 }
 
-/// What is sent: how many notifications began, and how many of these have ended.
+/// The number of notifications that began, and of those that have ended.
 struct Sent
 {
     std::atomic<int> begun{0};
@@ -154,7 +154,7 @@ int ComeAndLeave(const PrivateBus& bus, const Sent& sent, steady_clock::time_poi
     for (; steady_clock::now() < end; ++clients)
     {
         Client client(bus);
-        const int mayFrom = sent.begun; // which may look for its subscribers later
+        const int mayFrom = sent.begun; // the notification may look for its subscribers later
         EXPECT_EQ("(true,)", client.Change("Subscribe", "")) << client.reason;
         const int mustFrom = sent.begun + 1;
         while (sent.ended < mustFrom && steady_clock::now() < end)
@@ -199,7 +199,7 @@ Usage UsageOf(pid_t process)
     return {resident * sysconf(_SC_PAGESIZE) / 1024, std::distance(begin(open), end(open))};
 }
 
-TEST(SubscriptionService, LosesAndMixesUpNothingWhileManyClientsComeAndLeave)
+TEST(SubscriptionService, ServesManyClientsThatComeAndLeave)
 {
     const std::size_t clients = IsLong() ? 100 : 20;
     const auto period = std::chrono::milliseconds(IsLong() ? 30'000 : 1'000);

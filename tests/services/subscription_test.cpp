@@ -15,7 +15,7 @@ namespace
 using testing::HasSubstr;
 using testing::IsEmpty;
 
-/// The service in a thread of its own, as its program runs it.
+/// The service in a thread of its own, run like its program.
 class Running
 {
 public:
@@ -51,7 +51,7 @@ private:
     std::thread thread_;
 };
 
-/// Keeps changes of the store waiting.
+/// Makes changes of the store wait.
 class StoreLock
 {
 public:
@@ -112,7 +112,7 @@ struct Subscriptions : testing::Test
         service = std::make_unique<Running>(administrators);
     }
 
-    /// The bus names of the store's records, in their order.
+    /// Returns the bus names of the store's records, in their order.
     static std::vector<std::string> Stored()
     {
         std::vector<DASubscription> records;
@@ -160,7 +160,7 @@ TEST_F(Subscriptions, AreMadeListedAndRemovedUnderTheNamesOfTheCaller)
     }
 }
 
-TEST_F(Subscriptions, OfOthersAreOutOfReach)
+TEST_F(Subscriptions, OfOthersCannotBeSeenOrChanged)
 {
     Client client(bus), other(bus);
     client.Own(kMail);
@@ -187,7 +187,7 @@ TEST_F(Subscriptions, OfOthersAreOutOfReach)
         "([('auth', 'all', '" + client.UniqueName() + "', '/org/example/Client', 'org.example.Client')],)", client.Call("List"));
 }
 
-TEST_F(Subscriptions, ThatCannotBeOnesAreRefusedWithTheReason)
+TEST_F(Subscriptions, ThatAreInvalidAreRefusedWithTheReason)
 {
     Client client(bus);
     const struct
@@ -209,7 +209,7 @@ TEST_F(Subscriptions, ThatCannotBeOnesAreRefusedWithTheReason)
     EXPECT_THAT(Stored(), IsEmpty());
 }
 
-TEST_F(Subscriptions, StayAsTheyAreWhenTheNameChangesHandsMeanwhile)
+TEST_F(Subscriptions, DoNotChangeWhenTheNameGetsANewOwnerMeanwhile)
 {
     for (const char* method : {"Subscribe", "Unsubscribe"})
     {
@@ -266,7 +266,7 @@ TEST_F(Subscriptions, UnderAUniqueNameEndWhenItLeavesTheBus)
     AwaitStored({stays.UniqueName(), kMail});
 }
 
-TEST_F(Subscriptions, UnderAUniqueNameAreNotThoseOfTheSameNameOnTheNextBus)
+TEST_F(Subscriptions, UnderAUniqueNameDoNotApplyOnTheNextBus)
 {
     PrivateBus::Tolerate("");
     Client client(bus);
@@ -283,7 +283,7 @@ TEST_F(Subscriptions, UnderAUniqueNameAreNotThoseOfTheSameNameOnTheNextBus)
     AwaitStored({kMail});
 }
 
-TEST_F(Subscriptions, AreAtMostAThousandOfAUserUnderAllNames)
+TEST_F(Subscriptions, AreLimitedToAThousandPerUser)
 {
     {
         Client client(bus);
@@ -316,7 +316,7 @@ TEST_F(Subscriptions, FailWithTheStoresReason)
     EXPECT_EQ("(true,)", client.Change("Subscribe", ""));
 }
 
-TEST_F(Subscriptions, TakeArgumentsOfTheirTypesAlone)
+TEST_F(Subscriptions, AcceptOnlyArgumentsOfTheRightTypes)
 {
     Client client(bus);
     for (const char* method : {"Subscribe", "Unsubscribe", "List"})
@@ -334,7 +334,7 @@ TEST_F(Subscriptions, TakeArgumentsOfTheirTypesAlone)
     EXPECT_THAT(Stored(), IsEmpty());
 }
 
-TEST_F(Subscriptions, OfACallerThatFloodsAreRefusedBeyondALimit)
+TEST_F(Subscriptions, OfACallerWithTooManyOpenCallsAreRefused)
 {
     constexpr unsigned kMore = 20;
     Client client(bus), other(bus);

@@ -1,6 +1,6 @@
 #!/usr/bin/env bash
-# The subscription service among users: on a bus that denies by default, with the policies as they are installed, a client service of
-# another user subscribes and is notified of everything, and a third user cannot meddle. Only root can be several users.
+# Runs the subscription service with several users, which only root can do. On a bus that denies by default, with the installed
+# policies, a client service of another user subscribes and receives all notifications. A third user cannot interfere.
 # usage: users.sh BUILD_DIR SOURCE_DIR
 set -euo pipefail
 build=$1 sources=$2
@@ -58,7 +58,7 @@ expect() # text command...
     [[ $answer == *"$1"* ]] || fail "not \"$1\", but \"$answer\": ${*:2}"
 }
 
-# Where a stock bus has its helper start a service as a user, this one starts it by itself.
+# A standard bus starts a service as a user with a helper; this bus starts it itself.
 sed "s|^Exec=.*/|Exec=$(command -v setpriv) --reuid=$agent --regid=$agent --clear-groups $scratch/prefix/bin/|" \
     "$share/dbus-1/system-services/org.kiv.Subscriptions.service" >"$scratch/services/org.kiv.Subscriptions.service"
 for policy in "$sources/dbus/kiv-agent.conf" "$share/dbus-1/system.d/org.kiv.Subscriptions.conf" \

@@ -12,7 +12,7 @@ namespace
 
 constexpr char kMarker[] = "org.example.Marker";
 
-/// What the monitor saw. The program's own, since GLib's thread may still be in the filter when the monitor is gone.
+/// The messages that the monitor saw. It is global, since GLib's thread may still be in the filter when the monitor is gone.
 struct
 {
     std::mutex mutex;
@@ -56,8 +56,8 @@ BusMonitor::~BusMonitor()
     g_dbus_connection_close_sync(watching_.get(), nullptr, nullptr);
 }
 
-/// Runs on the thread that reads the connection. A monitor answers nothing of what it sees, so GDBus gets none of it but the reply
-/// to its own call.
+/// Runs on the thread that reads the connection. A monitor must not answer messages, so GDBus receives only the reply to its own
+/// call.
 GDBusMessage* BusMonitor::Filter(GDBusConnection* connection, GDBusMessage* message, gboolean incoming, gpointer)
 {
     const char* const destination = g_dbus_message_get_destination(message);
@@ -75,7 +75,7 @@ GDBusMessage* BusMonitor::Filter(GDBusConnection* connection, GDBusMessage* mess
     return nullptr;
 }
 
-/// What was sent before the marker has been seen when the marker is.
+/// When the monitor sees the marker, it has seen everything sent before.
 void BusMonitor::AwaitMarker()
 {
     g_dbus_connection_emit_signal(shared_, nullptr, "/", kMarker, "Marker", nullptr, nullptr);

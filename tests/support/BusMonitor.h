@@ -6,24 +6,24 @@
 namespace kiv::test
 {
 
-/// Sees every message that goes over the bus, as long as it lives. One at a time.
+/// Sees every message on the bus while it lives. One at a time.
 class BusMonitor
 {
 public:
-    /// @param shared  the connection whose messages are in question; borrowed
+    /// @param shared  the connection whose messages are recorded; borrowed
     BusMonitor(const PrivateBus& bus, GDBusConnection* shared);
     BusMonitor(const BusMonitor&) = delete;
     BusMonitor& operator=(const BusMonitor&) = delete;
     ~BusMonitor();
 
-    /// The messages that an operation causes: a line each with all of it but serials, in the order of the bus.
+    /// Returns the messages of an operation in the order of the bus, one per line, complete except for serials.
     std::vector<std::string> During(const std::function<void()>& operation);
 
 private:
     static GDBusMessage* Filter(GDBusConnection* connection, GDBusMessage* message, gboolean incoming, gpointer);
     void AwaitMarker();
 
-    GDBusConnection* shared_; ///< a mark that is sent over it shows where they end
+    GDBusConnection* shared_; ///< a marker sent over it shows where they end
     Connection watching_;
 };
 

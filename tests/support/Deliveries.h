@@ -17,11 +17,11 @@ void IterateUntil(Condition isMet, GMainContext* context = nullptr)
     {
         ASSERT_LT(g_get_monotonic_time(), deadline);
         if (!g_main_context_iteration(context, FALSE))
-            g_usleep(1000); // for what comes true outside the loop
+            g_usleep(1000); // for conditions outside the loop
     }
 }
 
-/// Counts the deliveries of push messages by what the library logs.
+/// Counts deliveries of push messages by the library's log lines.
 class Deliveries
 {
 public:
@@ -40,10 +40,10 @@ public:
     Deliveries& operator=(const Deliveries&) = delete;
     ~Deliveries() { platform::SetLogSink(nullptr); }
 
-    /// Whether every one that was started has ended.
+    /// Whether all started deliveries have ended.
     bool HaveEnded() const { return open_ == 0; }
 
-    /// Iterates a main context until they have, and until what GDBus leaves there is gone, too.
+    /// Iterates a main context until all have ended and nothing of GDBus is left in it.
     void Settle(GMainContext* context = nullptr) const
     {
         IterateUntil([this] { return HaveEnded(); }, context);

@@ -9,7 +9,7 @@
 namespace kiv::test
 {
 
-/// The lines that the library logs while this object lives.
+/// Captures the library's log lines while it lives.
 class LogCapture
 {
 public:
@@ -18,9 +18,8 @@ public:
     LogCapture& operator=(const LogCapture&) = delete;
     ~LogCapture() { platform::StopLog(); }
 
-    /// What was logged since the last Take, a text a line: "E DASimManager.cpp IsValidMcc > mcc is invalid", as far as it begins
-    /// like that. A line that is not in the form of the library's lines is handed out behind "bad line: ", which no expectation
-    /// matches.
+    /// Returns the lines logged since the last call, as "E DASimManager.cpp IsValidMcc > mcc is invalid". A line that does not have
+    /// the library's form starts with "bad line: ", which no expectation matches.
     static std::vector<std::string> Take(const std::string& prefix = "")
     {
         std::vector<std::string> texts;

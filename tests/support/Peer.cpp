@@ -6,8 +6,8 @@ namespace kiv::test
 namespace
 {
 
-/// Guards the state of all peers. One of the program's own, because what a peer made is handed to the reading thread by GLib, whose
-/// locks ThreadSanitizer does not see.
+/// Guards the state of all peers. It is global, because GLib passes a peer's objects to the reading thread, and ThreadSanitizer
+/// does not see GLib's locks.
 std::mutex mutex;
 
 std::string Describe(GDBusMessage* message)
@@ -25,12 +25,12 @@ struct Peer::State
     Answer answer;
     std::vector<std::string> calls;
     bool forgetful = false;
-    std::atomic<int> busy{0}; ///< answers being worked at
+    std::atomic<int> busy{0}; ///< answers in progress
 };
 
 Peer::Peer(const PrivateBus& bus, const std::string& name, Answer answer) : connection_(bus.Connect())
 {
-    // The thread that reads the connection may enter the filter when the peer is gone already, so what the filter uses stays.
+    // The thread that reads the connection may enter the filter after the peer is gone, so the filter's data stays.
     static auto& states = *new std::list<State>;
     {
         const std::lock_guard lock(mutex);
@@ -67,7 +67,7 @@ GDBusMessage* Peer::Filter(GDBusConnection* connection, GDBusMessage* message, g
     std::unique_lock lock(mutex);
     Answer answer = state.answer;
     if (g_strcmp0(g_dbus_message_get_interface(message), "org.freedesktop.DBus.Properties") == 0)
-        answer = Reply("(@a{sv} {},)"); // which every proxy asks for when it is made
+        answer = Reply("(@a{sv} {},)"); // every new proxy calls GetAll
     else if (!state.forgetful)
         state.calls.push_back(Describe(message));
     ++state.busy;

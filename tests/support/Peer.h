@@ -6,15 +6,15 @@
 namespace kiv::test
 {
 
-/// Somebody else on the bus, with a connection of its own: takes every method call on every object and interface, keeps it in
-/// one line, "/object/path an.interface.Method (signature) (body)", and answers as it was told to.
+/// Another participant on the bus, with its own connection. It accepts every method call, records it as
+/// "/object/path an.interface.Method (signature) (body)", and answers as configured.
 class Peer
 {
 public:
-    /// What to do with a call: the answer to give, or null for none. Runs on the thread that reads the connection.
+    /// Handles a call and returns the answer, or null for none. Runs on the thread that reads the connection.
     using Answer = std::function<GDBusMessage*(GDBusMessage* call)>;
 
-    /// @param name    well-known name to own; empty for the unique name alone
+    /// @param name    well-known name to own; empty for only the unique name
     /// @param answer  none: answers each call without a value
     explicit Peer(const PrivateBus& bus, const std::string& name = "", Answer answer = {});
     Peer(const Peer&) = delete;
@@ -24,22 +24,22 @@ public:
     /// Answers with a body in GVariant's text form, a tuple.
     static Answer Reply(const char* body);
     static Answer Refuse();
-    /// Does something and gives no answer.
+    /// Does something and does not answer.
     static Answer InsteadDo(std::function<void()> action);
-    /// Leaves the bus without an answer.
+    /// Leaves the bus and does not answer.
     Answer Leave();
     void Set(Answer answer);
 
-    /// The name to call it by: the well-known one, else the unique one.
+    /// Returns the well-known name if it has one, otherwise the unique name.
     const std::string& Name() const { return name_; }
-    /// Owns a well-known name from now on, instead of whoever did.
+    /// Takes a well-known name over from its owner.
     void Own(const std::string& name);
     std::vector<std::string> Calls() const;
-    /// Its connection, for calls of its own.
+    /// Returns its connection, for calls by the peer.
     GDBusConnection* Bus() const { return connection_.get(); }
-    /// Keeps no calls from now on.
+    /// Stops recording calls.
     void Forget();
-    /// Leaves the bus; no answer is being worked at on return.
+    /// Leaves the bus; on return no answer is in progress.
     void Close();
 
 private:

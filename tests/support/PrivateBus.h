@@ -12,13 +12,13 @@ using bench::Connection;
 using bench::Unref;
 using Message = std::unique_ptr<GDBusMessage, Unref>;
 
-/// The system bus of this process, from whose making on GLib has nothing to say: a warning of its fails the test.
+/// A private system bus of this process. While it exists, every warning of GLib fails the test.
 struct PrivateBus : bench::BusDaemon
 {
-    /// @param configuration  as BusDaemon takes it
+    /// @param configuration  passed to BusDaemon
     explicit PrivateBus(std::string configuration = {});
 
-    /// Lets GLib say this after all.
+    /// Allows GLib to print this.
     static void Tolerate(const char* message);
 };
 

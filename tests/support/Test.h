@@ -1,7 +1,7 @@
 #ifndef KIV_TESTS_TEST_H
 #define KIV_TESTS_TEST_H
 
-// What the tests include, precompiled.
+// Headers that every test includes, precompiled.
 #include <gio/gio.h>
 #include <gmock/gmock.h>
 #include <gtest/gtest.h>

@@ -1,5 +1,5 @@
 /// @file
-/// Texts that come out of the library, and those that are listed apart from its own tables.
+/// Texts that the library returns, and texts written independently of its tables.
 #ifndef KIV_TESTS_TEXTS_H
 #define KIV_TESTS_TEXTS_H
 
@@ -8,7 +8,7 @@
 namespace kiv::test
 {
 
-/// Takes over what an operation wrote to a text out-parameter: the text, "null" or "untouched".
+/// Takes over the value of a text out-parameter: the text, "null" or "untouched".
 template <class Operation>
 std::string Out(Operation operation, void (*release)(void*) = std::free)
 {
@@ -21,7 +21,7 @@ std::string Out(Operation operation, void (*release)(void*) = std::free)
     return text;
 }
 
-/// What stands in a file.
+/// Returns the content of a file.
 inline std::string Contents(const std::string& path)
 {
     return (std::ostringstream() << std::ifstream(path, std::ios::binary).rdbuf()).str();
@@ -45,7 +45,7 @@ inline Rows Read(const char* file)
 
 using Column = std::map<std::string, std::string>;
 
-/// The cells of one column by those of another; the first row with a key counts, and "-" is no key and no cell.
+/// Maps the cells of one column to those of another. The first row with a key counts; "-" is neither key nor cell.
 inline Column Find(const Rows& rows, std::size_t key, std::size_t result)
 {
     Column found;

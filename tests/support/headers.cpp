@@ -1,1 +1,1 @@
-// Compiles nothing of its own: the headers that every test includes are precompiled on its behalf.
+// Empty: the shared headers are precompiled with this file.

@@ -1,7 +1,7 @@
 #ifndef KIV_TESTS_MEMBERS_H
 #define KIV_TESTS_MEMBERS_H
 
-// Calls any member: makes its arguments, and puts its results into words, by their types alone.
+// Calls any member: makes its arguments and describes its results, from their types only.
 #include "sweep/World.h"
 
 #include <ITapiSim.h>
@@ -13,12 +13,12 @@ using Text = const char*;
 using Slots = telephony_handle_list_s;
 using Status = TelSimCardStatus_t;
 
-/// What goes into the parameters of an operation: its texts, its numbers.
+/// The texts and numbers for the parameters of an operation.
 struct Given
 {
     Text text = "";
     double number = 0;
-    bool keepsTexts = false; ///< the texts that come out are the library's
+    bool keepsTexts = false; ///< the returned texts belong to the library
 };
 
 template <class... Values>
@@ -30,9 +30,9 @@ std::string Tell(const Values&... values)
     return text.str();
 }
 
-inline char before[] = "before"; ///< what a text is that is to be written
+inline char before[] = "before"; ///< value of a text before it is written
 
-/// Tells a text that came out, and frees it.
+/// Describes a returned text, and frees it.
 inline std::string Take(Text text)
 {
     const std::string told = text == nullptr ? "null" : text;
@@ -56,7 +56,7 @@ using Target = std::conditional_t<std::is_reference_v<Type>, std::remove_referen
 template <class Type>
 using Held = std::conditional_t<kIsTextIn<Type>, std::string, std::conditional_t<kIsHandles<Type>, Slots, Target<Type>>>;
 
-/// What is passed for a parameter.
+/// The argument for a parameter.
 template <class Type>
 struct Argument
 {
@@ -90,7 +90,7 @@ struct Argument
             return value;
     }
 
-    /// What came out. A number that the platform writes counts after a success alone.
+    /// Describes the result. A number written by the platform counts only after a success.
     std::string TellOut(bool isDone) const
     {
         std::string told;
@@ -126,7 +126,7 @@ std::string TellResult(const Result& result)
     }
 }
 
-/// Calls a member with arguments made for its parameters. @return its result and what came out, a blank before each
+/// Calls a member with arguments made for its parameters. @return its result and its out-parameters, a blank before each
 template <class Class, class Result, class... Parameters>
 std::string CallMember(Result (Class::*member)(Parameters...), const Given& given, const Session& session)
 {

@@ -17,7 +17,7 @@ namespace kiv::test
 namespace
 {
 
-/// The symbol of a member, readable: "DASystem::GetIMEI(char**)".
+/// Returns the readable symbol of a member: "DASystem::GetIMEI(char**)".
 template <class Function>
 std::string SymbolOf(Function function)
 {
@@ -31,7 +31,7 @@ std::string SymbolOf(Function function)
 
 using Rows = std::vector<Operation>;
 
-/// The row added last, until the next one is.
+/// The row added last.
 class Row
 {
 public:
@@ -40,7 +40,7 @@ public:
         operation_.good = Complete(good);
     }
 
-    /// What it comes to when one of these calls fails.
+    /// Sets the outcome when one of these calls fails.
     Row Fails(const Calls& calls, const Story& story) const
     {
         operation_.failing.push_back({calls, Complete(story)});
@@ -50,7 +50,7 @@ public:
     void WithoutMemory(const std::vector<std::string>& results) const { operation_.noMemory = results; }
 
 private:
-    /// Puts the place of the member into its own lines, which come as "E > text".
+    /// Inserts the place of the member into its own lines, which are given as "E > text".
     Story Complete(Story story) const
     {
         const std::string& name = operation_.name;
@@ -65,10 +65,10 @@ private:
     const char* file_;
 };
 
-/// What rows have in common; every row names its group.
+/// The common values of rows; every row names its group.
 struct Group
 {
-    /// Adds a member under its very type.
+    /// Adds a member of exactly this type.
     template <class Type, class Class>
     Row Add(Type Class::*member, const Given& given, const Story& good) const
     {
@@ -91,7 +91,7 @@ struct Group
     }
 
     Rows& rows;
-    const char* file; ///< where lines of their own come from
+    const char* file; ///< source file of their own lines
     Kind kind;
     SimLock lock;
 };
@@ -101,7 +101,7 @@ const Calls kOpen{Call::telephony_init}, kState{Call::telephony_sim_get_state}, 
 const std::string kNotOpened = "E DASimManager.cpp SuccessToInitTelephonyHandle > telephony_init Failed.";
 const std::string kNotAvailable = "E DASimManager.cpp IsSimAvailable > Sim is not available";
 
-/// Hears of changes: what changed, and the new value.
+/// Records changes: what changed, and the new value.
 struct Listener : IDAConnectionStateListener
 {
     void OnWifiDeviceStateChanged(wifi_device_state_e state, void*) override { heard += Tell("device", state); }
@@ -130,7 +130,7 @@ std::string Listen(Session&)
     return listener.heard;
 }
 
-/// Connection states, of the facade as of its manager.
+/// Connection states, of the facade and of its manager.
 template <class S>
 void AddConnection(Rows& rows)
 {
@@ -157,7 +157,7 @@ std::string OpenAndClose(Session& session)
     return Tell(isOpen, count, S::GetInstance()->DeinitHandleList(&session.left));
 }
 
-/// SIM queries by slot or modem, of the facade as of its manager.
+/// SIM queries by slot or modem, of the facade and of its manager.
 template <class S>
 void AddSim(Rows& rows)
 {
@@ -198,7 +198,7 @@ void AddSim(Rows& rows)
     single.Add<bool(Status)>(&S::IsWaittingSimCheck, {"", 4}, {"true"}).WithoutMemory({"false"});
 }
 
-/// Country lookups, of the facade as of its manager.
+/// Country lookups, of the facade and of its manager.
 template <class S>
 void AddCountry(Rows& rows)
 {
@@ -216,7 +216,7 @@ void AddCountry(Rows& rows)
 
 using Noti = int(_KIV_NOTI_TYPE_E, Text, int, Text, Text, Text, Text);
 
-/// What a call of the one subscriber comes to.
+/// The outcome of a call of the one subscriber.
 Story WalkOf(const std::string& function)
 {
     const std::string place = "I DADBusManager.cpp " + function + " > ";
@@ -263,7 +263,7 @@ void AddSlots(Rows& rows)
     }
 }
 
-/// What the facade has beside its forwards.
+/// The facade's members that do not forward.
 void AddFacade(Rows& rows)
 {
     using S = DASystem;
@@ -314,7 +314,7 @@ void AddFacade(Rows& rows)
 
     Story policy = WalkOf("SendPolicyNotification"), statuses = WalkOf("SendStatusNotification");
     policy.insert(policy.begin() + 1, "I > noti type [5] service_id [5]");
-    statuses.insert(statuses.end(), {statuses[1], statuses[5]}); // nobody subscribed to the other service
+    statuses.insert(statuses.end(), {statuses[1], statuses[5]}); // the other service has no subscribers
     bus.Add<Noti>(&S::SendNotiToServiceManager, {"450", KIV_NOTI_TYPE_POLICY}, policy).WithoutMemory({"4"});
     bus.AddRun({SymbolOf<int (S::*)(Text, int, int*, char**)>(&S::SendMultiOnOffNotiToServiceManager)}, SendMulti, statuses);
     bus.Add<int(Text*)>(&S::GetDeviceUniqueID, {}, {"0 KIV0123456789", "I DADBusManager.cpp GetDeviceUniqueID > "})
@@ -337,7 +337,7 @@ std::string OpenAndDelete(Session&)
     return Tell(isOpen, count);
 }
 
-/// What the SIM manager has beside what the facade forwards.
+/// The SIM manager's members without a forward in the facade.
 void AddSimManager(Rows& rows)
 {
     using S = DASimManager;

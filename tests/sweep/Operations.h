@@ -11,43 +11,43 @@ namespace kiv::test
 using platform::Call;
 using Calls = std::vector<Call>;
 
-/// What an operation came to: its result with what it wrote, then each line that it logged, as LogCapture tells it.
+/// The outcome of an operation: its result with its out-parameters, then each logged line in LogCapture's form.
 using Story = std::vector<std::string>;
 
-/// What an operation comes to when one of these calls fails.
+/// The outcome of an operation when one of these calls fails.
 struct Failing
 {
     Calls calls;
-    Story story; ///< a text that ends with '*': what the platform wrote before it failed goes through
+    Story story; ///< with '*' at the end of a text, values that the platform wrote before it failed are passed on
 };
 
 enum class Kind
 {
-    Single,  ///< fails when one of its calls fails, and only then
-    Walk,    ///< goes on after a call that fails
+    Single,  ///< fails exactly when one of its calls fails
+    Walk,    ///< goes on after a failed call
     Bus,     ///< calls somebody on the bus
-    Push,    ///< the same, and a main loop of the thread's goes on with it
-    Listener ///< of the one thread that changes are delivered on
+    Push,    ///< the same, and continues in a main loop of the thread
+    Listener ///< runs in the one thread that delivers changes
 };
 
 enum class SimLock
 {
-    AroundReads, ///< held around the SIM reads, one by one
-    Whole        ///< held at every call
+    AroundReads, ///< held during each SIM read
+    Whole        ///< held during every call
 };
 
-/// One operation with typical arguments; one that opens and the one that closes are called together.
+/// One operation with typical arguments. Members that open and close are called together.
 struct Operation
 {
-    std::vector<std::string> symbols; ///< the members that it calls, as the library exports them
-    std::string name;                 ///< the first of them
+    std::vector<std::string> symbols; ///< exported symbols of the members that it calls
+    std::string name;                 ///< the first symbol
     Kind kind = Kind::Single;
     SimLock lock = SimLock::AroundReads;
-    bool needsHandle = false; ///< the first of the session
+    bool needsHandle = false; ///< uses the first handle of the session
     std::function<std::string(Session&)> run;
     Story good; ///< on the profile "dual"
     std::vector<Failing> failing;
-    std::vector<std::string> noMemory; ///< results of another failure: of memory
+    std::vector<std::string> noMemory; ///< results when there is no memory
 
     bool IsLockedAt(Call call) const;
 };

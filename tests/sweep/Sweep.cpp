@@ -18,7 +18,7 @@ World& TheWorld()
 
 constexpr char kManySlots[] = "dual, many times over";
 
-/// A line whatever the numbers in it are.
+/// Replaces the numbers of a line, so that they do not matter.
 std::string AnyNumber(std::string line)
 {
     const auto isOfNumber = [](char ch) { return std::strchr("-0123456789", ch) != nullptr; };
@@ -113,7 +113,7 @@ testing::AssertionResult Sweep::MayBe(const Operation& operation, const Story& s
         allow(each.story);
 
     auto words = Words(untouched[0] + " before true false"), told = Words(story[0]);
-    for (int number = 0; number <= 32; ++number) // a status, or how many texts came out
+    for (int number = 0; number <= 32; ++number) // a status, or the number of returned texts
         words.insert(std::to_string(number));
     for (const platform::SimSlot& slot : device.slots)
     {

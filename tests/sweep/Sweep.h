@@ -9,29 +9,29 @@ namespace kiv::test
 
 constexpr char kSimAccess[] = "CORE_MUTEX_NAME_SIM_ACCESS";
 
-// What the doubles of the named locks and of sleep() keep; they stand in front of those that the library links. One thread only.
-inline const char* heldLock = "";           ///< its name, empty for none; the test fails when a second one is taken
-inline std::set<std::string> lockNames;     ///< of the locks made
-inline std::function<bool()> isLockRefused; ///< whether a lock of a new name can not be made
-inline int pauses = 0;                      ///< the seconds that were to be slept
+// State of the doubles of the named locks and of sleep(), which replace those that the library links. One thread only.
+inline const char* heldLock = "";           ///< its name, or empty; taking a second lock fails the test
+inline std::set<std::string> lockNames;     ///< names of the locks made
+inline std::function<bool()> isLockRefused; ///< whether making a lock with a new name fails
+inline int pauses = 0;                      ///< requested seconds of sleep
 
-/// How many calls or allocations are to fail in a row. Once an operation ends before so many have, more come to the same.
+/// How many calls or allocations fail in a row. Once an operation ends before all have failed, more have the same outcome.
 std::vector<unsigned> Lengths();
 
-/// Tries operations one by one in one world, each on a device that nobody used before.
+/// Tries operations one by one in one world, each on a fresh device.
 struct Sweep : testing::Test
 {
     Sweep();
     ~Sweep() override;
 
-    /// The profiles, and one device with many slots, of whose walks several calls and allocations fail.
+    /// The profiles, and a device with many slots, so that several calls and allocations of one walk fail.
     static std::vector<std::string> Devices();
     void Use(const std::string& name);
 
-    /// The operation of that name.
+    /// Returns the operation with that name.
     static const Operation& Find(const std::string& name);
 
-    /// Runs an operation between two actions; nothing may be open and no lock held in the end.
+    /// Runs an operation between two actions. In the end, nothing may be open and no lock held.
     Story Try(
         const Operation& operation, const std::function<void()>& arm = [] {},
         const std::function<void()>& disarm = platform::ClearFaults);

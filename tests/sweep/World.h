@@ -9,7 +9,7 @@
 namespace kiv::test
 {
 
-/// The telephony handles that one call of an operation is given, and those that it leaves open. Both are closed at its end.
+/// The telephony handles that one operation receives, and those that it leaves open. The destructor closes both.
 struct Session
 {
     Session();
@@ -20,11 +20,11 @@ struct Session
     telephony_handle_list_s given{}, left{};
 };
 
-/// Whether a test takes its long form, for which the environment variable KIV_TEST_LONG asks.
+/// Whether the environment variable KIV_TEST_LONG requests a test's long form.
 bool IsLong();
 
-/// What the operations need: UTC, the profile "dual" with its clock stopped, and a private bus with whom they call on it. The test
-/// fails when GLib has anything to say.
+/// The operations' world: UTC, the profile "dual" with its clock stopped, and a private bus with the services that they call. The
+/// test fails when GLib prints anything.
 struct World
 {
     World();
@@ -34,7 +34,7 @@ struct World
 
     static void Use(const std::string& profile);
 
-    std::string directory; ///< of the subscriber store
+    std::string directory; ///< directory of the subscriber store
     PrivateBus bus;
     Peer board, serviceManager, client;
     Deliveries deliveries;

@@ -1,4 +1,4 @@
-// What operations leave behind: those that end with the call in a thread without a main loop, pushes in one with a loop.
+// Memory that operations leave behind: pushes in a thread with a main loop, all others in a thread without one.
 #include "sweep/Operations.h"
 
 #include <DADBusManager.h>
@@ -8,7 +8,7 @@
 namespace
 {
 
-/// The heap memory in use.
+/// Returns the heap memory in use.
 std::atomic<long> blocks{0}, bytes{0};
 
 void* Count(void* block)
@@ -26,7 +26,7 @@ void Discount(void* block)
 
 } // namespace
 
-// The allocator as everything in the process calls it: the C library does the work, these count.
+// Replaces the allocator of the process: counts, and lets the C library do the work.
 extern "C"
 {
     void* __libc_malloc(std::size_t size);
@@ -59,7 +59,7 @@ namespace
 
 using namespace kiv::test;
 
-/// The memory in use, once GDBus's own thread has cleaned up: when the number of blocks stays the same for a while.
+/// Returns the memory in use after GDBus's own thread has cleaned up, when the number of blocks stays the same for a while.
 std::pair<long, long> InUse()
 {
     for (long last = -1, same = 0; same < 10; same = last == blocks ? same + 1 : 0)
@@ -70,7 +70,7 @@ std::pair<long, long> InUse()
     return {blocks, bytes};
 }
 
-/// Whether at most half a block and 64 bytes per call remain in the end; GDBus's thread has ten seconds to clean up.
+/// Whether at most half a block and 64 bytes per call remain; GDBus's thread has ten seconds to clean up.
 testing::AssertionResult HasGrownLittle(const std::pair<long, long>& before, int calls)
 {
     const gint64 deadline = g_get_monotonic_time() + 10 * G_TIME_SPAN_SECOND;
@@ -89,13 +89,13 @@ testing::AssertionResult HasGrownLittle(const std::pair<long, long>& before, int
 TEST(Growth, IsBelowOneBlockPerCall)
 {
     World world;
-    int error = 0; // held in the short form, since to connect for each call takes longer
+    int error = 0; // held in the short form, since connecting for each call takes longer
     const Connection connection(IsLong() ? nullptr : DADBusManager::GetInstance()->InitDbusConnection(&error));
     const auto measure = [&](const Operation& operation)
     {
         const int calls = IsLong() ? 5000 : operation.kind == Kind::Bus ? 50 : 500;
         std::pair<long, long> before;
-        for (int i = -calls / 10; i < calls; ++i) // the first make what stays, like GLib's types
+        for (int i = -calls / 10; i < calls; ++i) // the first calls make what stays, like GLib's types
         {
             if (i == 0)
                 before = InUse();

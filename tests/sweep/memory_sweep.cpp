@@ -1,7 +1,6 @@
-// Every operation on every profile, with each allocation of the library's own failing in its turn: alone, and with all that
-// follow. The library's are those that it and its support library make, in the code of the standard library too; GLib ends the
-// process where it finds no memory, so its own are left alone. To make a named lock counts as one. What is lost, LeakSanitizer
-// tells.
+// Every operation on every profile, with each allocation of the library failing in turn: alone, and with all that follow. These are
+// the allocations of the library and its support library, also in code of the standard library. GLib ends the process when there is
+// no memory, so its allocations succeed. Making a named lock counts as an allocation. LeakSanitizer reports lost memory.
 #include "sweep/Sweep.h"
 
 #include <DAConnectionManager.h>
@@ -19,13 +18,13 @@
 namespace
 {
 
-/// What is done to the allocations of the one thread that runs the operation.
+/// Controls the allocations of the one thread that runs the operation.
 struct Injection
 {
     bool isArmed = false;
-    unsigned first = 0, last = 0; ///< those that fail
+    unsigned first = 0, last = 0; ///< numbers of those that fail
     unsigned seen = 0, failed = 0;
-    const char* lockOfInstance = ""; ///< held when the last instance was made
+    const char* lockOfInstance = ""; ///< lock held when the last instance was made
 };
 thread_local Injection injection;
 
@@ -35,7 +34,7 @@ bool IsIn(const char* library, const void* code)
     return _dl_find_object(const_cast<void*>(code), &object) == 0 && std::strstr(object.dlfo_link_map->l_name, library) != nullptr;
 }
 
-/// Whether an allocation is made for the library: by its code, or by the standard library's that its code called.
+/// Whether an allocation is made by the library's code, or by the standard library for it.
 bool IsOwn(const void* caller)
 {
     if (IsIn("libstdc++", caller))
@@ -61,7 +60,7 @@ bool Fails(const void* caller)
 {
     if (!injection.isArmed)
         return false;
-    injection.isArmed = false; // what this code needs itself
+    injection.isArmed = false; // this code allocates too
     const bool fails = IsOwn(caller) && FailsNext();
     injection.isArmed = true;
     return fails;
@@ -69,7 +68,7 @@ bool Fails(const void* caller)
 
 } // namespace
 
-// The library calls these, in the code of the standard library too; the sanitizers let them be replaced.
+// The library calls these, also in code of the standard library. Sanitizers allow to replace them.
 extern "C" char* strdup(const char* text) noexcept
 {
     const std::size_t size = std::strlen(text) + 1;
@@ -105,7 +104,7 @@ namespace
 
 using namespace kiv::test;
 
-/// Takes the instance of a class away, but not from the one whose member is called.
+/// Removes the instance of a class, except the one whose member is called.
 template <class S>
 void Forget(const std::string& name, const Operation& operation)
 {
@@ -119,14 +118,14 @@ struct MemorySweep : Sweep
     MemorySweep()
     {
         void* frames[2];
-        backtrace(frames, 2); // loads what it needs
+        backtrace(frames, 2); // loads its libraries
         int error = 0;
         connection.reset(DADBusManager::GetInstance()->InitDbusConnection(&error));
         isLockRefused = [] { return injection.isArmed && FailsNext(); };
     }
     ~MemorySweep() override { isLockRefused = nullptr; }
 
-    /// Lets allocations fail in the first use of the library: no class has an instance, no lock was named.
+    /// Lets allocations fail as in the first use of the library: without instances and named locks.
     Story TryFailing(const Operation& operation, unsigned first, unsigned last)
     {
         const auto arm = [&]
@@ -142,12 +141,12 @@ struct MemorySweep : Sweep
         return Try(operation, arm, [] { injection.isArmed = false; });
     }
 
-    /// Lets every allocation fail in its turn until there is none left. @return how many failed
+    /// Lets every allocation fail in turn. @return how many failed
     unsigned TryAll(const Operation& operation)
     {
         const Story untouched = TryFailing(operation, 0, 0);
         Story allowed = untouched;
-        for (const Operation& other : Operations()) // the classes may not come into being
+        for (const Operation& other : Operations()) // the classes cannot be made
             if (other.failing.size() == 1 && other.failing[0].story[0] == "none")
                 allowed.push_back(other.failing[0].story[1]);
         unsigned injections = 0;
@@ -167,10 +166,10 @@ struct MemorySweep : Sweep
         }
     }
 
-    Connection connection; ///< held, so that not every operation has to connect
+    Connection connection; ///< held, so that not every operation connects
 };
 
-TEST_F(MemorySweep, GivesFailureResultsWhicheverAllocationFails)
+TEST_F(MemorySweep, ReturnsFailureResultsWhicheverAllocationFails)
 {
     unsigned injections = 0;
     for (const std::string& name : Devices())
@@ -202,7 +201,7 @@ TEST_F(MemorySweep, LogsThatAnInstanceCannotBeMade)
     for (const std::string name : {"DASystem", "DASimManager", "DADBusManager", "DAConnectionManager"})
     {
         const Operation& operation = Find(name + "::GetInstance()");
-        for (const unsigned allocation : {1U, 2U}) // for the lock of that name, for the instance
+        for (const unsigned allocation : {1U, 2U}) // of the lock's name, and of the instance
             EXPECT_EQ(operation.failing.at(0).story, TryFailing(operation, allocation, allocation)) << name << ", " << allocation;
     }
 }

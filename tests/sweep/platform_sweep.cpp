@@ -1,4 +1,4 @@
-// Every operation on every profile, with each of its platform calls failing in its turn: alone, and with all that follow.
+// Every operation on every profile, with each of its platform calls failing in turn: alone, and with all that follow.
 #include "sweep/Sweep.h"
 
 #include <iostream>
@@ -17,8 +17,8 @@ bool Contains(const Calls& calls, Call call)
     return std::find(calls.begin(), calls.end(), call) != calls.end();
 }
 
-/// What is left behind by a call that is to fail. One that opens may not have opened, which nobody could close; one that closes
-/// must have closed, since nobody would do so again.
+/// What a failed call leaves behind. A failed call that opens must not open anything, since nobody could close it. A failed call
+/// that closes must close, since nobody would try again.
 Leavings Possible(Call call, Leavings wanted)
 {
     const Calls opening{Call::telephony_init, Call::tel_init, Call::package_info_create, Call::connection_create};
@@ -28,7 +28,7 @@ Leavings Possible(Call call, Leavings wanted)
     return Contains(closing, call) ? Leavings::ItsResults : wanted;
 }
 
-/// What an operation comes to that ends with the first call that fails.
+/// The outcome of an operation that ends with the first failed call.
 Story Expected(const Operation& operation, const Calls& failed, Leavings leavings, const Story& untouched)
 {
     for (const Call call : failed)
@@ -65,7 +65,7 @@ struct PlatformSweep : Sweep
                 << operation.name << ": " << platform::NameOf(call);
             made.push_back(call);
             platform::ClearFaults();
-            constexpr int kPatience = 120; // who waits for a SIM does so without a bound
+            constexpr int kPatience = 120; // waiting for a SIM has no time limit
             if (pauses >= kPatience)
                 return "";
             if (made.size() >= first && made.size() <= last)
@@ -93,7 +93,7 @@ TEST_F(PlatformSweep, HasEveryPublicMemberInItsTable)
     std::ifstream in(KIV_EXPORTED_SYMBOLS);
     for (std::string symbol; std::getline(in, symbol);)
     {
-        // Neither a destructor nor a constructor nor a variable.
+        // Skips constructors, destructors and variables.
         if (g_regex_match_simple(R"(^(\w+)::(?!~|\1\().*\)$)", symbol.c_str(), GRegexCompileFlags(0), GRegexMatchFlags(0)))
             exported.insert(symbol);
     }
@@ -103,15 +103,15 @@ TEST_F(PlatformSweep, HasEveryPublicMemberInItsTable)
     EXPECT_THAT(listed, testing::ContainerEq(exported));
 }
 
-TEST_F(PlatformSweep, AnswersRightOnADeviceWhereAllGoesWell)
+TEST_F(PlatformSweep, ReturnsTheRightResultsWhenNothingFails)
 {
     for (const Operation& operation : Operations())
         EXPECT_EQ(operation.good, TryFailing(operation, 0, 0, Leavings::Nothing)) << operation.name;
 }
 
-TEST_F(PlatformSweep, GivesFailureResultsWhicheverCallFails)
+TEST_F(PlatformSweep, ReturnsFailureResultsWhicheverCallFails)
 {
-    const std::size_t kMostCalls = IsLong() ? 200 : 20; // of one operation: polling makes more, all alike
+    const std::size_t kMostCalls = IsLong() ? 200 : 20; // per operation: polling makes more, which are all alike
     int pairs = 0;
     for (const std::string& name : Devices())
     {

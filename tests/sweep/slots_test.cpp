@@ -1,4 +1,4 @@
-// The questions about SIMs on devices where some do not answer, slots that are not there, and values that no profile holds.
+// SIM queries with SIMs that do not answer, slots that do not exist, and values that no profile contains.
 #include "sweep/Sweep.h"
 
 #include <DASimManager.h>
@@ -14,13 +14,13 @@ const std::string kManager = "E DASimManager.cpp ";
 
 struct Slots : Sweep
 {
-    /// What the operation of that name comes to on the device.
+    /// Returns the outcome of the operation with that name on the device.
     Story Ask(const std::string& operation) { return Try(Find(operation)); }
 
     DASystem& facade = *DASystem::GetInstance();
 };
 
-TEST_F(Slots, ThatDoNotAnswerArePassedOver)
+TEST_F(Slots, ThatDoNotAnswerAreSkipped)
 {
     // The first and the fourth are locked, the second is without IMSI and number.
     const std::vector<platform::SimSlot> slots = {{"modem0", {4}, {}, "449", "04", "0123456789", "0000", {}},
@@ -41,7 +41,7 @@ TEST_F(Slots, ThatDoNotAnswerArePassedOver)
     }
 }
 
-TEST_F(Slots, WithANegativeNumberAreNotThere)
+TEST_F(Slots, WithANegativeNumberDoNotExist)
 {
     const Session session;
     bool isRoaming = true;
@@ -51,12 +51,12 @@ TEST_F(Slots, WithANegativeNumberAreNotThere)
     EXPECT_THAT(platform::TakeMisuses(), testing::IsEmpty());
 }
 
-TEST_F(Slots, DoNotTellRoamingToANullPointer)
+TEST_F(Slots, ReturnFalseForANullRoamingPointer)
 {
     EXPECT_FALSE(facade.GetRoamingStatus(0, nullptr));
 }
 
-TEST_F(Slots, AreJudgedByWhatTheModemSays)
+TEST_F(Slots, AreJudgedByTheModemsAnswers)
 {
     using Of = std::vector<platform::SimSlot>;
     const char kExist[] = "DASystem::IsSimExist()", kAny[] = "DASystem::IsSimAvailable()",
@@ -87,7 +87,7 @@ TEST_F(Slots, AreJudgedByWhatTheModemSays)
     }
 }
 
-// How the card statuses 0 to 14 are judged: yes, no, wait. 255 is judged as 2; any other, as 0.
+// The meaning of the card statuses 0 to 14: yes, no, wait. 255 is like 2; any other is like 0.
 // status                     0    5    10  14
 constexpr char kUsable[] = "nnnynnnnnnnnnnn";
 constexpr char kPolled[] = "nnwywwnwwwwnwnw";

@@ -1,5 +1,5 @@
-// Eight threads on every operation at once, while a ninth changes the listener and what it hears of, and the main thread iterates
-// the main loop. With the support library's own locks.
+// Eight threads run every operation at once. A ninth exchanges the listener and changes values that it is notified of, and the main
+// thread iterates the main loop. Uses the support library's real locks.
 #include "sweep/Operations.h"
 
 namespace

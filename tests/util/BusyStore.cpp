@@ -18,7 +18,7 @@ using testing::HasSubstr;
 using testing::Not;
 using testing::SizeIs;
 
-/// A process beside the test's; it is killed at the end if it still runs.
+/// Another process. The destructor kills it if it is still running.
 class Beside
 {
 public:
@@ -55,7 +55,7 @@ private:
     pid_t id_;
 };
 
-/// Writes to the file itself before it is killed.
+/// Writes to the file before it is killed.
 constexpr const char* kInterrupted = "PRAGMA cache_size = 1; BEGIN; UPDATE subscription SET key = '8'; CREATE TABLE t(a);"
                                      "WITH RECURSIVE n(i) AS (SELECT 1 UNION ALL SELECT i + 1 FROM n WHERE i < 99)"
                                      "INSERT INTO t SELECT zeroblob(9999) FROM n";
@@ -64,7 +64,7 @@ struct BusyStore : SubscriberStore
 {
     BusyStore() { Use("subscribers.db"); }
 
-    /// What processes share.
+    /// State that the processes share.
     struct Board
     {
         std::atomic<int> arrived, added;
@@ -73,7 +73,7 @@ struct BusyStore : SubscriberStore
 
     ~BusyStore() override { munmap(board, sizeof(Board)); }
 
-    /// Adds subscribers under the keys 1, 2, ... until it is over.
+    /// Adds subscribers with the keys 1, 2, ... until `isOver`.
     void KeepAdding()
     {
         while (!board->isOver)
@@ -99,7 +99,7 @@ struct BusyStore : SubscriberStore
         return keys;
     }
 
-    /// Works as a user who may read the store and write nothing.
+    /// Runs as a user who may read the store but write nothing.
     template <class Work>
     void AsReader(Work work)
     {
@@ -121,7 +121,7 @@ struct BusyStore : SubscriberStore
         permit(0700, 0600);
     }
 
-    /// Runs statements of SQLite's own on the store; its connection, to be closed.
+    /// Runs SQL statements on the store. @return the connection, which the caller closes
     sqlite3* Execute(const char* sql)
     {
         sqlite3* db = nullptr;
@@ -133,7 +133,7 @@ struct BusyStore : SubscriberStore
     Board* const board = new (mmap(nullptr, sizeof(Board), PROT_READ | PROT_WRITE, MAP_SHARED | MAP_ANONYMOUS, -1, 0)) Board();
 };
 
-TEST_F(BusyStore, LosesNothingWhenManyProcessesMakeFillAndReadIt)
+TEST_F(BusyStore, LosesNothingWhileManyProcessesUseIt)
 {
     constexpr int kStores = 10;
     std::vector<Beside> writers;
@@ -161,7 +161,7 @@ TEST_F(BusyStore, LosesNothingWhenManyProcessesMakeFillAndReadIt)
     }
 }
 
-TEST_F(BusyStore, IsTheFileThatIsMovedOverItAndWholeInACopy)
+TEST_F(BusyStore, MayBeCopiedAndReplacedAtAnyTime)
 {
     for (int round = 0; round < 12; ++round)
     {
@@ -209,7 +209,7 @@ TEST_F(BusyStore, NoticesAnotherStoreThatIsCopiedIntoItsFile)
         EXPECT_EQ(Outcome::Done, Add("push", name, ":1.7"));
         EXPECT_EQ(":1.7 ", Find("push", name));
     }
-    for (const char* const name : {"one.db", "other.db"}) // changed at the same moment, as far as the file system can tell
+    for (const char* const name : {"one.db", "other.db"}) // changed at almost the same moment
         EXPECT_EQ(0, chmod((directory / name).c_str(), 0600));
     for (const auto& [name, found] : {std::pair("one.db", ""), {"other.db", ":1.7 "}})
     {
@@ -221,7 +221,7 @@ TEST_F(BusyStore, NoticesAnotherStoreThatIsCopiedIntoItsFile)
     EXPECT_EQ(":1.7 ", Find("push", "one.db"));
 }
 
-TEST_F(BusyStore, HasAllThatWasAddedBeforeItsWriterWasKilled)
+TEST_F(BusyStore, KeepsWhatAKilledWriterAdded)
 {
     std::minstd_rand random;
     for (int round = 0; round < 30; ++round)
@@ -235,13 +235,13 @@ TEST_F(BusyStore, HasAllThatWasAddedBeforeItsWriterWasKilled)
         for (std::size_t i = 0; i < expected.size(); ++i)
             expected[i] = std::to_string(i + 1);
         std::vector<std::string> keys = Keys();
-        if (keys.size() == expected.size() + 1) // added, but killed before it could say so
+        if (keys.size() == expected.size() + 1) // added, but killed before it could report it
             expected.push_back(std::to_string(++board->added));
         EXPECT_EQ(expected, keys);
     }
 }
 
-TEST_F(BusyStore, UndoesAnInterruptedChangeOrSaysThatItMayNot)
+TEST_F(BusyStore, UndoesAnInterruptedChangeOrReportsWhyItCannot)
 {
     EXPECT_EQ(Outcome::Done, Add("push", "7", ":1.7"));
     EXPECT_EQ(":1.7 ", Find("push", "7"));
@@ -258,7 +258,7 @@ TEST_F(BusyStore, UndoesAnInterruptedChangeOrSaysThatItMayNot)
     EXPECT_FALSE(fs::exists(store.Path() + "-journal"));
 }
 
-TEST_F(BusyStore, CanBeReadWhereItCannotBeWritten)
+TEST_F(BusyStore, CanBeReadWhenItCannotBeWritten)
 {
     for (const char* const form : {"PRAGMA journal_mode = DELETE", "PRAGMA journal_mode = WAL"})
     {
@@ -307,7 +307,7 @@ TEST_F(BusyStore, ReadsALogOfVersion1UntilTheFirstChangeFoldsIt)
     }
 }
 
-TEST_F(BusyStore, IsOpenInNoChildAndWorksThere)
+TEST_F(BusyStore, WorksInAChildWithoutInheritedDescriptors)
 {
     EXPECT_EQ(Outcome::Done, Add("push", "7", ":1.7"));
     auto finding = std::async(std::launch::async,

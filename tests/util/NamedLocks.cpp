@@ -5,7 +5,7 @@
 namespace
 {
 
-TEST(NamedLocks, EqualTextsAreOneLockInEveryBufferAndKindFromTheirFirstUseOn)
+TEST(NamedLocks, EqualTextsAreOneLockFromTheirFirstUse)
 {
     constexpr int kThreads = 8;
     std::vector<std::atomic<int>> arrived(3000);
@@ -34,10 +34,10 @@ TEST(NamedLocks, EqualTextsAreOneLockInEveryBufferAndKindFromTheirFirstUseOn)
     EXPECT_EQ(std::vector<int>(visits.size(), 2 * kThreads), visits);
 }
 
-// A thread that met one lock under two of the names it holds would wait for itself.
-TEST(NamedLocks, ManyNamesAreAsManyLocksAlsoWhileTheProcessEnds)
+// If two of its names were the same lock, the thread would wait for itself.
+TEST(NamedLocks, DifferentNamesAreDifferentLocksUntilTheProcessEnds)
 {
-    testing::FLAGS_gtest_death_test_style = "threadsafe"; // a new process, whose first lock comes behind atexit
+    testing::FLAGS_gtest_death_test_style = "threadsafe"; // a new process, which takes its first lock after atexit()
     const auto holdMany = []
     {
         std::list<DAMutexLock> held;

@@ -27,7 +27,7 @@ struct SubscriberStore : testing::Test
         return store.Add({kind, key, {busname, "/org/example/A", "org.example.A"}}, reason);
     }
 
-    /// The bus names that are appended, a blank behind each, and what is logged meanwhile.
+    /// Returns the appended bus names, a blank after each, and what is logged meanwhile.
     std::string Find(const char* kind, const char* key)
     {
         kiv::platform::StartLog();

@@ -7,7 +7,7 @@
 namespace
 {
 
-TEST_F(SubscriberStore, GivesTheSubscribersOfOneEventInTheOrderInWhichTheySubscribed)
+TEST_F(SubscriberStore, ReturnsSubscribersInTheOrderOfTheirSubscriptions)
 {
     for (const char* busname : {":1.7", "org.example.Z", "org.example.A"})
     {
@@ -26,7 +26,7 @@ TEST_F(SubscriberStore, GivesTheSubscribersOfOneEventInTheOrderInWhichTheySubscr
         EXPECT_EQ("", Find(kind, key));
 }
 
-TEST_F(SubscriberStore, RefusesWhatNoSubscriptionCanBeAndIsMadeForItsUserAlone)
+TEST_F(SubscriberStore, RefusesInvalidSubscriptions)
 {
     const char* const fields[] = {"kind \"", "key \"", "bus name \"", "object path \"", "interface \""};
     const std::pair<int, std::string> faults[] = {{0, "activate"}, {1, ""}, {1, std::string(256, 'k')}, {1, "\xff"}, {1, "a\nb"},
@@ -42,6 +42,10 @@ TEST_F(SubscriberStore, RefusesWhatNoSubscriptionCanBeAndIsMadeForItsUserAlone)
     }
     EXPECT_EQ("", Find("push", "7"));
     EXPECT_TRUE(fs::is_empty(directory));
+}
+
+TEST_F(SubscriberStore, IsReadableByItsUserOnly)
+{
     const mode_t usual = umask(0);
     EXPECT_EQ(Outcome::Done, store.Add({"push", std::string(255, 'k'), {":1.7", '/' + std::string(1023, 'p'), "a.b"}}, reason));
     umask(usual);
@@ -50,7 +54,7 @@ TEST_F(SubscriberStore, RefusesWhatNoSubscriptionCanBeAndIsMadeForItsUserAlone)
     EXPECT_EQ(fs::perms::owner_read | fs::perms::owner_write, fs::status(store.Path()).permissions());
 }
 
-TEST_F(SubscriberStore, TakesForAServiceIdOnlyWhatTheAgentLooksUp)
+TEST_F(SubscriberStore, AcceptsOnlyServiceIdsThatTheAgentLooksUp)
 {
     for (const char* const kind : {"policy", "status"})
     {
@@ -71,7 +75,7 @@ TEST_F(SubscriberStore, IsWhereTheEnvironmentSaysOrInTheStateDirectory)
     }
 }
 
-TEST_F(SubscriberStore, LeavesAFileThatItCannotUseAsItIsAndSaysWhatToDo)
+TEST_F(SubscriberStore, ExplainsWhatToDoAboutAnUnusableFile)
 {
     ASSERT_EQ(Outcome::Done, Add("push", "7", ":1.7"));
     const std::string good = Contents(store.Path());
