@@ -4,6 +4,7 @@
 set -euo pipefail
 build=$1 sources=$2 language=$3 cxx=("${@:4}")
 page=$sources/docs/client-service.md
+. "$sources/tests/install/emulate.sh"
 if [[ $language == python ]] && ! /usr/bin/python3 -c 'from gi.repository import Gio' 2>/dev/null; then
     echo "skipped: python3-gi or gir1.2-glib-2.0 is not installed"
     exit 77
@@ -44,13 +45,8 @@ start() # name text-that-it-prints command...
 }
 
 cmake --install "$build" --prefix "$scratch/prefix" >install.log
-# KIV_EMULATOR is the command that runs the programs of a cross build, word by word; else it is empty.
-mkdir bin
-for program in "$scratch"/prefix/bin/*; do
-    printf '#!/bin/sh\nexec %s "%s" "$@"\n' "${KIV_EMULATOR-}" "$program" >"bin/${program##*/}"
-done
-chmod +x bin/*
-export PKG_CONFIG_PATH LD_LIBRARY_PATH PATH=$scratch/bin:$PATH
+emulate "$scratch"/prefix/bin/*
+export PKG_CONFIG_PATH LD_LIBRARY_PATH PATH=$scratch/prefix/bin:$PATH
 PKG_CONFIG_PATH=$(dirname "$(find "$scratch/prefix" -name kiv_system.pc)")
 LD_LIBRARY_PATH=$(dirname "$(find "$scratch/prefix" -name libkiv_system.so)")
 if [[ $language == cpp ]]; then
@@ -59,7 +55,8 @@ if [[ $language == cpp ]]; then
     command=${command//\/usr\/share/$scratch/prefix/share}
     command=${command/g++/${cxx[*]} -Wall -Wextra -Werror}
     eval "${command/gcc/${cxx[*]} -x c}"
-    read -ra service <<<"${KIV_EMULATOR-} ./mail"
+    emulate mail
+    service=(./mail)
 else
     block python 1 >mail.py
     service=(/usr/bin/python3 mail.py)

@@ -4,6 +4,7 @@
 # usage: users.sh BUILD_DIR SOURCE_DIR
 set -euo pipefail
 build=$1 sources=$2
+. "$sources/tests/install/emulate.sh"
 readonly agent=daemon client=mail stranger=games
 ((EUID == 0)) || { echo "skipped: only root can be several users"; exit 77; }
 command -v setpriv >/dev/null || { echo "skipped: util-linux is not installed"; exit 77; }
@@ -17,6 +18,7 @@ chown $agent "$scratch/store"
 export DBUS_SYSTEM_BUS_ADDRESS=unix:path=$scratch/bus KIV_SUBSCRIBERS=$scratch/store/subscribers.db
 unset KIV_PROFILE KIV_LOG
 cmake --install "$build" --prefix "$scratch/prefix" >"$scratch/installed"
+emulate "$scratch"/prefix/bin/*
 readonly share=$scratch/prefix/share kivctl=$scratch/prefix/bin/kivctl
 
 fail() # text
