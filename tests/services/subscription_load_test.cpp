@@ -84,9 +84,14 @@ TEST(SubscriptionService, LosesNoCallWhenItEndsIdle)
     std::set<pid_t> processes;
     for (int round = 0; round < (IsLong() ? 2000 : 40); ++round)
     {
-        ASSERT_EQ("(true,)", on.client.Change(round % 2 == 0 ? "Subscribe" : "Unsubscribe", kMail)) << on.client.reason;
+        Client leaves(on.bus);
+        Client& client = round % 4 < 2 ? on.client : leaves;
+        const std::string name = round % 4 < 2 ? kMail : leaves.UniqueName();
+        ASSERT_EQ("(true,)", client.Change(round % 4 == 1 ? "Unsubscribe" : "Subscribe", name)) << client.reason;
         processes.insert(on.Process());
+        leaves.Close();
         g_usleep(15'000 + on.random() % 15'000);
+        IterateUntil([&] { return round % 4 == 0 || on.Stored().empty(); });
     }
     EXPECT_LT(2U, processes.size());
 }

@@ -302,6 +302,11 @@ TEST_F(Subscriptions, AreLimitedToAThousandPerUser)
     EXPECT_EQ("(false,)", client.Change("Subscribe", kMail)) << "it is there";
     EXPECT_EQ("(true,)", client.Change("Unsubscribe", kMail));
     EXPECT_EQ("(true,)", client.Change("Subscribe", ""));
+
+    client.Change("Unsubscribe", "");
+    client.Change("Subscribe", kMail);
+    std::ofstream(DASubscriberStore::Path() + ".names") << "[users]\n" << kMail << '=' << getuid() + 1 << '\n';
+    EXPECT_EQ("LimitsExceeded", client.Change("Subscribe", kMail, "activated")) << "the records of another come with the name";
 }
 
 TEST_F(Subscriptions, FailWithTheStoresReason)
