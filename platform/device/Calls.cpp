@@ -32,7 +32,7 @@ struct Fault
 
 struct Calls
 {
-    std::atomic<bool> watched{false}; // the one thing that is looked at while nobody is interested
+    std::atomic<bool> watched{false}; // false without hook, faults and journal, which are then not read
     std::mutex mutex;
     std::shared_ptr<const CallHook> hook;
     std::vector<Fault> faults;
@@ -46,7 +46,7 @@ Calls& TheCalls()
     return *calls;
 }
 
-// Changes what is done with calls.
+// Changes the handling of calls.
 template <class Change>
 void Set(Change change)
 {
@@ -93,7 +93,7 @@ std::optional<Fault> TakeFault(Call call, int slot)
     return hit;
 }
 
-/// The code with which the device fails this call, if it does. Every fault of the function counts the call.
+/// Returns the code with which the device fails this call, if it does. Every fault of the function counts the call.
 std::optional<int> Break(Call call, std::vector<BrokenCall>& faults)
 {
     std::optional<int> code;
@@ -182,7 +182,7 @@ const char* NameOf(Call call)
 
 void FailCall(Call call, int code, CallNumbers which, int slot, Leavings leavings)
 {
-    // What a null result would leave behind, nobody could release.
+    // Nobody could release what a null result left behind.
     if (call == Call::tel_init || call == Call::tel_get_cp_name_list || call == Call::vconf_get_str)
         leavings = Leavings::Nothing;
 

@@ -1,5 +1,5 @@
 /// @file
-/// How every function of the platform answers: past hook and faults, from the one state, into the journal.
+/// The path of every platform call: hook, faults, the shared state, journal.
 #ifndef KIV_DEVICE_CALLS_H
 #define KIV_DEVICE_CALLS_H
 
@@ -17,17 +17,17 @@
 namespace kiv::platform
 {
 
-/// What tells the slot of a call: a handle, or the CP name of a modem; neither when the call concerns no slot.
+/// Identifies the slot of a call by a handle or by the CP name of a modem. Both are null for a call without a slot.
 struct Subject
 {
     const void* handle = nullptr;
     const char* cpName = nullptr;
 };
 
-/// Makes one call: `work` runs with the state locked, unless a fault takes its place. No exception leaves it.
+/// Makes one call: runs `work` with the state locked, unless a fault replaces it. Does not throw.
 int Perform(Call call, const Subject& subject, int (*work)(void* context, State& state), void* context) noexcept;
 
-/// Perform() of a lambda that takes the state and gives the code.
+/// Calls Perform() with a lambda that takes the state and returns the code.
 template <class Work>
 int Answer(Call call, const Subject& subject, Work work) noexcept
 {
@@ -35,7 +35,7 @@ int Answer(Call call, const Subject& subject, Work work) noexcept
         call, subject, [](void* context, State& state) { return (*static_cast<Work*>(context))(state); }, &work);
 }
 
-/// Answer() with the slot that a handle stands for; a handle that is not right is noted and refused.
+/// Calls Answer() with the slot of a handle; an invalid handle is refused and reported as misuse.
 template <class Work>
 int AnswerForSlot(Call call, HandleKind kind, const void* handle, Work work) noexcept
 {
@@ -59,7 +59,7 @@ int Give(Out* out, Value value)
     return 0;
 }
 
-/// Gives a copy of the text, made with malloc(); a text that is not there is an error.
+/// Returns a copy of the text in `out`, made with malloc(); a missing text is an error.
 inline int GiveText(char** out, const Text& text)
 {
     if (out == nullptr)
@@ -73,13 +73,13 @@ inline int GiveText(char** out, const Text& text)
     return 0;
 }
 
-/// Makes a call that registers for a topic; without a topic or a callback it is refused.
+/// Makes a call that registers for a topic. A call without topic or callback is refused.
 int Register(Call call, std::optional<Topic> topic, bool hasCallback, Notifier::Callback callback) noexcept;
 
-/// Makes a call that ends a registration. Returns when no callback of it runs on another thread.
+/// Makes a call that ends a registration. Returns when none of its callbacks runs on another thread.
 int Unregister(Call call, std::optional<Topic> topic) noexcept;
 
-/// Forgets hook, faults and journal.
+/// Removes hook, faults and journal.
 void ResetCalls();
 
 } // namespace kiv::platform

@@ -1,7 +1,7 @@
 /// @file
-/// The remote control of the simulated device that stands behind the platform's C interfaces on a workstation: what the device
-/// is, which of its services fail, what was asked of it, and what was done wrong with its handles. For tests and tools; the
-/// product never calls it. Any thread may call anything here.
+/// The remote control of the simulated device behind the platform's C interfaces on a workstation: sets the device's values, makes
+/// its services fail, records calls, and reports misused handles. For tests and tools; the product never calls it. Any thread may
+/// call any function here.
 #ifndef KIV_DEVICE_DEVICECONTROL_H
 #define KIV_DEVICE_DEVICECONTROL_H
 
@@ -25,7 +25,7 @@ enum class Call
 #undef CALL
 };
 
-/// "tel_init" of Call::tel_init.
+/// Returns the name of a function, such as "tel_init".
 const char* NameOf(Call call);
 
 /// @name The device
@@ -36,29 +36,29 @@ struct BrokenCall
 {
     Call call;
     int code;
-    unsigned number = 0; ///< the only call that fails, counted from 1 since this device is in place; 0 when every call fails
-    unsigned seen = 0;   ///< how many calls there were
+    unsigned number = 0; ///< the only call that fails, counted from 1 since the device was set; 0 if every call fails
+    unsigned seen = 0;   ///< number of calls so far
 };
 
-/// A text that the device may lack: then reading it fails.
+/// A text of the device; reading it fails if it is missing.
 using Text = std::optional<std::string>;
 
 struct SimSlot
 {
     std::string cpName;
-    std::vector<int> cardStatus{3}; ///< TelSimCardStatus_t over successive reads of it; the last one stays
-    std::optional<int> simState;    ///< telephony_sim_state_e; without one it follows the card status
-    Text mcc, mnc, msin;            ///< reading the IMSI fails unless all three are there
-    Text number;                    ///< without one, reading it succeeds and gives null
+    std::vector<int> cardStatus{3}; ///< TelSimCardStatus_t for successive reads; the last one stays
+    std::optional<int> simState;    ///< telephony_sim_state_e; if missing, follows the card status
+    Text mcc, mnc, msin;            ///< reading the IMSI fails if one is missing
+    Text number;                    ///< if missing, reading it succeeds and returns null
     Text imei;
     int serviceState = 0; ///< telephony_network_service_state_e
     bool roaming = false;
     int serviceType = 5; ///< TAPI_PROP_NETWORK_SERVICE_TYPE
     int smsStatus = 1;
-    unsigned cardReads = 0; ///< how often the card status was read, which is where its script stands
+    unsigned cardReads = 0; ///< number of reads of the card status: the position in cardStatus
 };
 
-/// All that the device answers from. Code may set any value, also one that no device file may hold.
+/// The values of the device. Code may set any value, even one that device files must not contain.
 struct Device
 {
     std::string description;
@@ -67,7 +67,7 @@ struct Device
     std::vector<SimSlot> slots;
 
     Text tizenId, platformName, platformVersion, modelName, salesCode, serial;
-    std::optional<std::int64_t> currentTime; ///< seconds since 1970; without one it is the host's clock
+    std::optional<std::int64_t> currentTime; ///< seconds since 1970; if missing, the host's clock
     Text deviceName, language;
     std::optional<int> fontSize = 1;
     bool mobileData = true;
@@ -78,42 +78,41 @@ struct Device
     std::uint32_t blockSize = 4096;
     std::uint64_t blocksAvailable = 0;
     std::map<std::string, std::string> packages; ///< version by package ID
-    std::vector<BrokenCall> faults;              ///< the first that fits decides, one for a single call before one for every call
+    std::vector<BrokenCall> faults;              ///< the first that matches decides; those for a single call go first
 
-    std::map<std::string, std::string> reasons; ///< why a value is missing, by "GROUP.KEY" as in a device file, where that is known
+    std::map<std::string, std::string> reasons; ///< why a value is missing, if known, by "GROUP.KEY" as in a device file
 };
 
-/// The device as it is. Before anything was set, it is what the environment variable KIV_PROFILE names, a profile or a device
-/// file, and the profile "dual" without it. If that cannot be used, this is a device without anything, and every platform call
-/// fails. The first of them prints the reason on standard error, unless somebody has read it from DeviceTrouble().
+/// Returns the device as it is now. Initially it is the profile or device file that the environment variable KIV_PROFILE names, by
+/// default the profile "dual". If that cannot be used, the device is empty and every platform call fails. The first failed call
+/// prints the reason on standard error, unless DeviceTrouble() was called before.
 Device GetDevice();
 
-/// Replaces the device. Registered callbacks for each value that differs run before it returns, on this thread. The device
-/// follows no file from then on.
+/// Replaces the device. Registered callbacks for each changed value run on this thread before it returns. The device no longer
+/// follows a file.
 void SetDevice(const Device& device);
 
-/// As SetDevice(), with what `change` makes of the device as it is; a device that follows a file goes on following it. `change`
-/// calls nothing of the platform or of this control.
+/// Like SetDevice(), but modifies the present device, which goes on following its file if it has one. `change` must not call the
+/// platform or this control.
 void ChangeDevice(const std::function<void(Device&)>& change);
 
-/// Why the device has no such value, or cannot know it better: one of its `reasons`; empty where none is known.
+/// Returns one of the device's `reasons`: why a value is missing or inexact; empty if unknown.
 /// @param key  "GROUP.KEY" as in a device file
 std::string ReasonFor(const std::string& key);
 
-/// What is wrong with the profile or file that KIV_PROFILE names; empty when nothing is.
+/// Returns what is wrong with the profile or file that KIV_PROFILE names; empty if nothing is.
 std::string DeviceTrouble();
 
-/// Back to the beginning: the environment's device, no registrations, faults, hooks, journal, misuses. Handles that are still
-/// open are closed.
+/// Restores the initial state: the environment's device, no registrations, faults, hooks, journal or misuses. Closes open handles.
 void ResetDevice();
 
 /// @}
 /// @name Calls
 /// @{
 
-constexpr int kNoSlot = -1; ///< the slot of a call that concerns none, or of a fault for calls on every slot
+constexpr int kNoSlot = -1; ///< for calls without a slot, and for faults on every slot
 
-/// Which calls a fault hits, counted from its arming and, if it is for one slot, among the calls on that slot.
+/// The calls that a fault affects, counted from the moment when it is set. A fault for one slot counts only calls on that slot.
 struct CallNumbers
 {
     unsigned first;
@@ -130,40 +129,40 @@ constexpr CallNumbers Only(unsigned number)
     return {number, number};
 }
 
-/// What a call that is made to fail leaves behind.
+/// What a call that fails on demand leaves behind.
 enum class Leavings
 {
-    Nothing,   ///< the call does nothing: out-parameters stay untouched
+    Nothing,   ///< the call does nothing: out-parameters are unchanged
     ItsResults ///< the call does its work, and then reports the code
 };
 
-/// Makes calls of one function give `code`. A code of 0 with no leavings is a success that brings nothing: an out-parameter
-/// that stays null, a list of no handles. A function that gives a pointer gives null and leaves nothing, whatever the code.
-/// Faults add up; the first armed that hits decides. They come before those of the device (Device::faults), which do not count
-/// the calls that end here, and stay when the device is replaced.
+/// Makes calls of one function return `code`. Code 0 with Leavings::Nothing is an empty success: an out-parameter that stays null,
+/// or a list without handles. A function that returns a pointer returns null and leaves nothing behind, whatever the code. Faults
+/// add up; of those that affect a call, the first one set decides. They go before Device::faults, which do not count the calls that
+/// fail here. They stay when the device is replaced.
 void FailCall(Call call, int code, CallNumbers which = kEveryCall, int slot = kNoSlot, Leavings leavings = Leavings::Nothing);
 
-/// Disarms all that FailCall() armed; those of the device stay.
+/// Removes all faults set by FailCall(), but not those of the device.
 void ClearFaults();
 
-/// Runs within every call, on the caller's thread, before the call does its work; the text that it gives stands in the
-/// journal. It may block and may call other functions of the platform, whose calls then run without it. Null ends it.
+/// Runs in every call, on the caller's thread, before the call does its work. The journal contains the text that it returns. It may
+/// block, and may call other functions of the platform, which then run without the hook. Null removes the hook.
 using CallHook = std::function<std::string(Call call, int slot)>;
 void SetCallHook(CallHook hook);
 
-/// One call, written down when it returns.
+/// One call, recorded when it returns.
 struct JournalEntry
 {
     Call call;
-    int slot;         ///< kNoSlot where the call concerns none
-    int result;       ///< the code; of a function that gives a pointer, what its failure stood for
-    std::string note; ///< what the hook gave
+    int slot;         ///< kNoSlot for a call without a slot
+    int result;       ///< the code; for a function that returns a pointer, the code of its failure
+    std::string note; ///< text from the hook
 };
 
-/// Keeps an entry for every call from now on; entries kept before are dropped. Off until then.
+/// Starts to keep an entry for every call, and drops earlier entries. Initially off.
 void StartJournal();
 
-/// The entries kept since StartJournal() or the last TakeJournal().
+/// Returns the entries kept since StartJournal() or the last TakeJournal().
 std::vector<JournalEntry> TakeJournal();
 void StopJournal();
 
@@ -171,11 +170,11 @@ void StopJournal();
 /// @name Handles: telephony handle lists and handles, TAPI handles, package and connection handles
 /// @{
 
-/// Each handle that is open: its kind, its slot, and where it was opened.
+/// Describes each open handle: its kind, its slot, and where it was opened.
 std::vector<std::string> OpenHandles();
 
-/// Each wrong use of a handle so far: closed twice, used after closing, given to another service, never one. Such a call does
-/// nothing else, and gives an error code. Forgets what it gives.
+/// Returns and removes the descriptions of misused handles: closed twice, used after closing, passed to another service, or never
+/// opened. Such a call does nothing and returns an error code.
 std::vector<std::string> TakeMisuses();
 
 /// @}

@@ -18,7 +18,7 @@ const char* NameOf(HandleKind kind)
     return kKinds[static_cast<std::size_t>(kind)];
 }
 
-// "libx.so+0x1f2 (near Function)": what addr2line and a reader need.
+// Returns "libx.so+0x1f2 (near Function)", for addr2line and for readers.
 std::string Place(const void* address)
 {
     Dl_info info{};
@@ -90,7 +90,7 @@ std::vector<std::string> Handles::Describe() const
 {
     std::vector<std::string> all;
     for (const auto& [address, handle] : open_)
-        if (handle->kind != HandleKind::Telephony) // goes with its list
+        if (handle->kind != HandleKind::Telephony) // closed with its list
             all.push_back(platform::Describe(handle->kind, handle->slot, handle->opening));
     return all;
 }
@@ -111,7 +111,7 @@ void Handles::NoteMisuse(HandleKind kind, const void* handle, Call user, const c
         return;
     }
 
-    const Closed* last = nullptr; // the address may have been several handles
+    const Closed* last = nullptr; // several handles may have had the address
     for (std::size_t i = closedCount_; i > 0 && closedCount_ - i < closed_.size() && last == nullptr; --i)
         if (closed_[(i - 1) % closed_.size()].handle == handle)
             last = &closed_[(i - 1) % closed_.size()];

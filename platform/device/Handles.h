@@ -1,5 +1,5 @@
 /// @file
-/// Every handle that the simulated device has given out, and what was done wrong with them.
+/// Every open handle of the simulated device, and reports of misuse.
 #ifndef KIV_DEVICE_HANDLES_H
 #define KIV_DEVICE_HANDLES_H
 
@@ -26,12 +26,12 @@ enum class HandleKind
     Connection
 };
 
-/// Who opened a handle.
+/// The call that opened a handle.
 struct Opening
 {
     Call by;
-    unsigned number;    ///< that of the call, counted from 1
-    const void* caller; ///< where the call returns to
+    unsigned number;    ///< number of the call, counted from 1
+    const void* caller; ///< return address of the call
 };
 
 struct OpenHandle
@@ -39,32 +39,32 @@ struct OpenHandle
     HandleKind kind;
     int slot;
     Opening opening;
-    std::string subject;           ///< package of a package handle, CP name of the modem that belongs to one of a slot
-    std::vector<telephony_h> list; ///< of a handle list
+    std::string subject;           ///< package of a package handle, or CP name of a slot's modem
+    std::vector<telephony_h> list; ///< handles of a handle list
 };
 
-/// Handles are addresses of heap memory that is freed on closing. A pointer that comes in is only looked up, never followed,
-/// until it is known to be open. Guarded by the lock of the state.
+/// Handles are addresses of heap memory that is freed on closing. A caller's pointer is looked up, and dereferenced only if it is
+/// an open handle. Guarded by the lock of the state.
 class Handles
 {
 public:
-    /// Counts one opening call.
+    /// Counts an opening call.
     Opening Open(Call by, const void* caller) { return {by, ++opened_[by], caller}; }
 
-    /// Gives out a handle: the address of the object, or that of the array of a handle list.
+    /// Adds a handle and returns it: the address of the object, or of the array of a handle list.
     template <class Handle>
     Handle Add(OpenHandle handle)
     {
         return static_cast<Handle>(AddObject(std::move(handle)));
     }
 
-    /// Null, and a misuse is noted, when `handle` is not open or not of the kind.
+    /// Finds an open handle of that kind. If there is none, reports a misuse and returns null.
     const OpenHandle* Find(HandleKind kind, const void* handle, Call user);
 
-    /// Whether it was open; else a misuse is noted.
+    /// Closes a handle. @return whether it was open; if not, reports a misuse
     bool Close(HandleKind kind, const void* handle, Call user);
 
-    /// kNoSlot for what is not open or has none.
+    /// Returns the slot; kNoSlot for a handle that is not open or has none.
     int SlotOf(const void* handle) const;
 
     std::vector<std::string> Describe() const;
@@ -84,7 +84,7 @@ private:
 
     std::unordered_map<const void*, std::unique_ptr<OpenHandle>> open_;
     std::unordered_map<Call, unsigned> opened_;
-    std::array<Closed, 64> closed_{}; // the last ones, to tell "closed twice" from "never one"
+    std::array<Closed, 64> closed_{}; // the last ones, to distinguish "closed twice" from "never opened"
     std::size_t closedCount_ = 0;
     std::vector<std::string> misuses_;
 };

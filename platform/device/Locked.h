@@ -7,7 +7,7 @@
 namespace kiv::platform
 {
 
-/// An object with its own `mutex`, locked while this stands.
+/// Gives access to an object with a `mutex`, and holds that while it lives.
 template <class Object>
 class Locked
 {

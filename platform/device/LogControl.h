@@ -1,7 +1,7 @@
 /// @file
-/// What the simulated device does with the lines of the platform log. Nothing unless somebody asks: tests keep them, tools
-/// listen to them, and the environment variable KIV_LOG prints them to standard error, "error" those of error priority and up,
-/// "info" those of information priority and up; "journal" sends all of them to the system log instead.
+/// Controls what the simulated device does with lines of the platform log, which it drops by default. Tests keep them, and tools
+/// receive them. The environment variable KIV_LOG prints them on standard error: with "error" from error priority on, with "info"
+/// from information priority on. "journal" sends all of them to the system log instead.
 #ifndef KIV_DEVICE_LOGCONTROL_H
 #define KIV_DEVICE_LOGCONTROL_H
 
@@ -19,20 +19,20 @@ struct LogLine
     int id;       ///< log_id_t
     int priority; ///< log_priority
     std::string tag;
-    std::string text; ///< as formatted, the writer's own line end included
+    std::string text; ///< formatted, including the writer's line end
 };
 
-/// Keeps every line from now on; lines kept before are dropped.
+/// Starts to keep every line, and drops earlier ones.
 void StartLog();
 
-/// The lines kept since StartLog() or the last TakeLog(), oldest first.
+/// Returns the lines kept since StartLog() or the last TakeLog(), oldest first.
 std::vector<LogLine> TakeLog();
 
-/// Keeps no more lines; what was kept stays for TakeLog().
+/// Stops keeping lines; TakeLog() still returns those kept before.
 void StopLog();
 
-/// Hands every line from now on to `sink`, on the thread that writes it; an empty function ends that. When it returns, the
-/// sink before it may still be at work on other threads.
+/// Passes every line to `sink`, on the thread that writes it; an empty function ends that. On return, the previous sink may still
+/// be running on other threads.
 void SetLogSink(std::function<void(const LogLine&)> sink);
 
 } // namespace kiv::platform

@@ -1,5 +1,5 @@
 /// @file
-/// Who is told of which change of the device.
+/// Notifies callbacks of changes of the device.
 #ifndef KIV_DEVICE_NOTIFIER_H
 #define KIV_DEVICE_NOTIFIER_H
 
@@ -16,7 +16,7 @@
 namespace kiv::platform
 {
 
-/// What one can register for.
+/// The values that callbacks can be registered for.
 enum class Topic
 {
     WifiDevice,
@@ -35,7 +35,7 @@ struct Change
 };
 using Changes = std::vector<Change>;
 
-/// The topics that differ between two devices, with what `after` has.
+/// Returns the topics that differ between two devices, with the values of `after`.
 Changes Differences(const Device& before, const Device& after);
 
 class Notifier
@@ -43,18 +43,18 @@ class Notifier
 public:
     using Callback = std::function<void(int value)>;
 
-    /// A second registration for a topic takes the place of the first.
+    /// Registers a callback, which replaces an earlier one for the topic.
     void Add(Topic topic, Callback callback);
 
-    /// Whether there was a registration.
+    /// Removes a registration. @return whether there was one
     bool Remove(Topic topic);
     void RemoveAll();
     bool HasAny();
 
-    /// Calls who is registered at the moment of each call, with no lock held.
+    /// Calls the callbacks that are registered at the moment of each call, with no lock held.
     void Deliver(const Changes& changes);
 
-    /// Waits until no callback of the topic runs on another thread; not within a callback, which could wait for itself.
+    /// Waits until no callback of the topic runs on another thread. Does not wait within a callback, which could wait for itself.
     void AwaitEnd(Topic topic);
 
     /// @name Around fork()

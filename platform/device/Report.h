@@ -1,5 +1,5 @@
 /// @file
-/// What the device says to the user of a process that does not ask for it.
+/// Messages of the device to the user of a process.
 #ifndef KIV_DEVICE_REPORT_H
 #define KIV_DEVICE_REPORT_H
 
@@ -8,11 +8,11 @@
 namespace kiv::platform
 {
 
-/// Prints one line on standard error, behind the name of the program, whatever KIV_LOG is: for what the user of a process has set
-/// up wrong, which its own results do not show. Call it with no lock held.
+/// Prints one line on standard error, after the name of the program, whatever KIV_LOG is. It is for wrong settings of the user that
+/// the results of the process do not show. Call it without a lock.
 void Report(const std::string& text);
 
-/// Reads KIV_LOG, which the first line of the log does otherwise, and reports a word that it does not know.
+/// Reads KIV_LOG before the first line of the log does, and reports an unknown word.
 void SettleLog();
 
 } // namespace kiv::platform

@@ -1,5 +1,5 @@
 /// @file
-/// What keeps the device's values current besides its remote control: the seam between the device and where its state comes from.
+/// The interface between the device and the source of its values, which keeps them current.
 #ifndef KIV_DEVICE_SOURCE_H
 #define KIV_DEVICE_SOURCE_H
 
@@ -11,7 +11,7 @@
 namespace kiv::platform
 {
 
-/// One source is in use at a time, or none. It puts devices in place with the lock of the state held, and only while in use.
+/// At most one source is in use at a time. Only that one replaces the device, with the lock of the state held.
 class Source
 {
 public:
@@ -20,28 +20,28 @@ public:
     Source& operator=(const Source&) = delete;
     virtual ~Source() = default;
 
-    /// Starts or ends its work, as it is in use and there are registrations. Called after either may have changed, with no lock
-    /// held. Ended, its thread is gone, except that a callback does not wait for it.
+    /// Starts its work if it is in use and there are registrations, otherwise ends it. Called without a lock after either may have
+    /// changed. When its work has ended, its thread is gone; only a call from a callback does not wait for that.
     virtual void Settle() noexcept {}
 
-    /// @name What it looks up when a call asks for it, if anything; the state is locked, and the device is that of the state
+    /// @name Values that the source reads when a call needs them; the state is locked, and the device is that of the state
     /// @{
     virtual void Refresh(Device& /*device*/, Text Device::* /*text*/) {}
     virtual void RefreshStorage(Device& /*device*/) {}
-    /// @return whether the platform has packages at all
+    /// @return whether the platform has packages
     virtual bool RefreshPackage(Device& /*device*/, const std::string& /*id*/) { return true; }
     /// @}
 };
 
-/// A device, and what keeps it current; null when nothing does.
+/// A device and its source, which is null when nothing keeps the device current.
 struct Origin
 {
     Device device;
     std::shared_ptr<Source> source;
 };
 
-/// What the environment names. Defined with the sources: the device knows none of them. Throws an exception that describes what
-/// is wrong.
+/// Returns the device that the environment names. Defined with the sources, which the device does not know. Throws an exception
+/// that describes what is wrong.
 Origin OpenEnvironment();
 
 } // namespace kiv::platform

@@ -14,7 +14,7 @@ namespace kiv::platform
 namespace
 {
 
-// A change from anywhere: what `change` gives under the lock is delivered without it.
+// Runs `change` under the lock, and delivers the changes that it returns without the lock.
 template <class Make>
 void Apply(Make change)
 {
@@ -33,7 +33,7 @@ void Apply(Make change)
 
 State& TheState()
 {
-    // A child of fork() has no thread but the one that called it: what others had locked at that moment stays locked for good.
+    // A child of fork() has only the thread that called it, so locks that other threads held at that moment stay locked.
     static State* const state = []
     {
         SettleLog();
@@ -159,7 +159,7 @@ std::string DeviceTrouble()
 {
     const Locked state(TheState());
     state->Ready();
-    state->UntoldTrouble(); // whoever asks tells it
+    state->UntoldTrouble(); // the caller reports it
     return state->trouble;
 }
 

@@ -1,5 +1,5 @@
 /// @file
-/// The one state that all services of the simulated device answer from.
+/// The state that all services of the simulated device share.
 #ifndef KIV_DEVICE_STATE_H
 #define KIV_DEVICE_STATE_H
 
@@ -17,26 +17,26 @@ namespace kiv::platform
 
 struct State
 {
-    std::mutex mutex; ///< guards what stands before the notifier, which guards itself
+    std::mutex mutex; ///< guards all members before the notifier, which has its own lock
 
     Device device;
     std::shared_ptr<Source> source; ///< keeps the device current; null when nothing does
-    std::string trouble;            ///< what is wrong with the environment's profile
+    std::string trouble;            ///< what is wrong with the profile that the environment names
     Handles handles;
     bool wifiInitialized = false;
 
     Notifier notifier;
 
-    /// Whether there is a device to answer from; the first question reads what the environment names.
+    /// Whether there is a device. The first call reads the one that the environment names.
     bool Ready();
 
-    /// The trouble, if nobody was told of it yet; empty from then on.
+    /// Returns the trouble on the first call; empty afterwards.
     std::string UntoldTrouble();
 
-    /// Puts a device in place; the changes are then to be delivered with the lock released.
+    /// Replaces the device. The caller delivers the changes after it releases the lock.
     Changes Replace(Device next);
 
-    /// A text of the device, as it is now.
+    /// Returns the present value of a text of the device.
     const Text& Current(Text Device::*text)
     {
         if (source != nullptr)
@@ -44,10 +44,10 @@ struct State
         return device.*text;
     }
 
-    /// The slot whose modem has the name, or kNoSlot.
+    /// Returns the slot whose modem has the name, or kNoSlot.
     int SlotOf(const char* cpName) const;
 
-    /// The slot that a handle was opened for, wherever its modem is now; null when that is gone.
+    /// Returns the slot that a handle was opened for, even if its modem has moved; null when the modem is gone.
     SimSlot* Find(int slot, const std::string& cpName);
 
 private:
@@ -56,13 +56,13 @@ private:
     bool told_ = false; ///< the trouble, to somebody
 };
 
-/// Lives as long as the process, for the threads that outlive its main().
+/// Returns the state, which is never destroyed, since threads may outlive main().
 State& TheState();
 
-/// Has the source in use start or end its work. Called with no lock held, after registrations came or went.
+/// Makes the source in use start or end its work. Call it without a lock after registrations changed.
 void SettleSource() noexcept;
 
-/// Replaces the device and what keeps it current. Registered callbacks for each value that differs run before it returns.
+/// Replaces the device and its source. Registered callbacks for each changed value run before it returns.
 void Use(Origin origin);
 
 } // namespace kiv::platform

@@ -8,8 +8,8 @@
 namespace kiv::platform
 {
 
-/// The text as it may go to a terminal. Whatever could move the cursor, forge a line or reorder what is shown becomes an escape:
-/// control and format characters and the Unicode line ends ("\n", "\x1b", "\u202e"), and each byte that is not UTF-8 ("\xff").
+/// Returns a text that is safe for a terminal. It escapes everything that could move the cursor, forge a line or reorder the
+/// output: control and format characters, Unicode line ends ("\n", "\x1b", "\u202e"), and bytes that are not UTF-8 ("\xff").
 std::string Visible(const std::string& text);
 
 } // namespace kiv::platform

@@ -24,7 +24,7 @@ using Sink = std::function<void(const LogLine&)>;
 
 constexpr int kNobody = DLOG_FATAL + 1;
 
-// One number decides on the path of every line: below it, nobody wants the line and it is not even formatted.
+// Lines with a lower priority than this number are not even formatted, since nobody wants them.
 constexpr int kNotSettled = -1;
 std::atomic<int> wantedFrom{kNotSettled};
 

@@ -7,7 +7,7 @@ using namespace kiv::platform;
 namespace
 {
 
-// The version of a package, or the code of its absence.
+// Reads the version of a package; returns an error code if it is not installed.
 int FindPackage(State& state, const std::string& id, const std::string*& version)
 {
     if (state.source != nullptr && !state.source->RefreshPackage(state.device, id))
@@ -29,7 +29,7 @@ PLATFORM_API int package_manager_get_package_size_info(
         {
             if (package_id == nullptr)
                 return -EINVAL;
-            if (callback) // packages have no sizes here
+            if (callback) // packages have no sizes on this device
                 return -ENOTSUP;
             const std::string* version = nullptr;
             return FindPackage(state, package_id, version);

@@ -9,7 +9,7 @@ using namespace kiv::platform;
 namespace
 {
 
-// What the card status that was read last, or the first one, means for the SIM.
+// Returns the SIM state that follows from the last card status read, or from the first one.
 int SimStateOf(const SimSlot& sim)
 {
     if (sim.simState)
@@ -82,7 +82,7 @@ PLATFORM_API int telephony_deinit(telephony_handle_list_s* list)
                 return -EINVAL;
             const telephony_handle_list_s closed = *list;
             *list = {};
-            if (closed.count == 0 && closed.handle == nullptr) // what telephony_init() gives on a device without slots
+            if (closed.count == 0 && closed.handle == nullptr) // as telephony_init() returns on a device without slots
                 return 0;
             return state.handles.Close(HandleKind::HandleList, closed.handle, Call::telephony_deinit) ? 0 : -EINVAL;
         });

@@ -6,16 +6,16 @@
 namespace kiv
 {
 
-/// The device daemon, as far as its board interface goes: tells the board's serial number.
+/// The board interface of the device daemon, which returns the board's serial number.
 class BoardDaemon : public BusParty
 {
 public:
     static constexpr char kBusName[] = "org.tizen.system.deviced";
 
-    /// Serves from now on. Throws BusError.
+    /// Starts to serve. Throws BusError.
     explicit BoardDaemon(const std::string& serial);
 
-    /// The serial number of the device in use. Throws std::runtime_error that tells why there is none.
+    /// Returns the serial number of the device in use. Throws std::runtime_error with the reason if there is none.
     static std::string DeviceSerial();
 };
 

@@ -7,7 +7,7 @@ namespace kiv
 namespace
 {
 
-/// Names of a structure's members stand in an annotation of the argument: introspection data has no place of its own for them.
+/// An annotation of the argument contains the names of a structure's members, since introspection data has no other place for them.
 constexpr char kMembersAnnotation[] = "org.kiv.Members";
 
 std::vector<std::string> ArgumentNames(const GDBusMethodInfo& method)

@@ -16,7 +16,7 @@ struct VariantDeleter
 };
 using VariantPtr = std::unique_ptr<GVariant, VariantDeleter>;
 
-/// A method call as it arrived at a BusParty; good for as long as it is being answered.
+/// A method call that arrived at a BusParty; valid until it is answered.
 struct BusCall
 {
     struct Value
@@ -26,18 +26,18 @@ struct BusCall
     };
 
     const GDBusMethodInfo& method; ///< from the party's interface description
-    const char* sender;            ///< unique name of the caller, which the bus vouches for
+    const char* sender;            ///< unique name of the caller, set by the bus
     GVariant* arguments;           ///< tuple of the call's arguments; borrowed
 
-    /// The arguments with the names that the interface description gives them. The one argument of a method that takes a
-    /// structure is told by the members of that structure.
+    /// Returns the arguments with their names from the interface description. For a method with one structure as its argument,
+    /// returns the members of the structure.
     std::vector<Value> Values() const;
 
-    /// The kind of event that the call is about, as the subscriber store names it; the method's name for a call without a kind.
+    /// Returns the event's kind as in the subscriber store, or the method's name for a call without a kind.
     std::string Event() const;
 
-    /// The call on one line: event, then name=value with values in GVariant text form, so that no value breaks the line; what a
-    /// terminal should not see is escaped.
+    /// Returns the call on one line: event, then name=value with values in GVariant text form, so that no value breaks the line.
+    /// Characters that could harm a terminal are escaped.
     std::string Line() const;
 };
 

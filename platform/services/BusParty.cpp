@@ -7,11 +7,11 @@ namespace kiv
 namespace
 {
 
-/// Flags and answers of org.freedesktop.DBus.RequestName.
+/// Flags and replies of org.freedesktop.DBus.RequestName.
 constexpr guint kDoNotQueue = 4;
 constexpr guint kPrimaryOwner = 1;
 
-/// A private connection, because the process's shared one belongs to the library that may be at work in the same process.
+/// Makes a private connection, because the shared one belongs to the library, which the same process may use.
 GDBusConnection* Connect()
 {
     g_autoptr(GError) error = nullptr;
@@ -48,7 +48,7 @@ BusParty::BusParty(const char* xml, Handler handler)
 BusParty::~BusParty()
 {
     g_dbus_connection_unregister_object(connection_.get(), registration_);
-    g_dbus_connection_flush_sync(connection_.get(), nullptr, nullptr); // closing drops the replies that are not written yet
+    g_dbus_connection_flush_sync(connection_.get(), nullptr, nullptr); // closing drops replies that are not written yet
     g_dbus_connection_close_sync(connection_.get(), nullptr, nullptr);
 }
 
@@ -91,7 +91,7 @@ void BusParty::Called(GDBusConnection*, const char* sender, const char*, const c
     }
     catch (const CallError& error)
     {
-        const g_autofree char* text = g_utf8_make_valid(error.what(), -1); // a file's name in it may be anything
+        const g_autofree char* text = g_utf8_make_valid(error.what(), -1); // it may contain any file name
         g_dbus_method_invocation_return_error_literal(invocation, G_DBUS_ERROR, error.code, text);
     }
 }

@@ -11,7 +11,7 @@
 namespace kiv
 {
 
-/// The bus can not be reached, or refuses what a party asks of it.
+/// The bus cannot be reached, or refuses a request of a party.
 class BusError : public std::runtime_error
 {
 public:
@@ -26,7 +26,7 @@ public:
     const Reason reason;
 };
 
-/// What a handler throws to answer a call with an error of the bus.
+/// Thrown by a handler to answer a call with a bus error.
 class CallError : public std::runtime_error
 {
 public:
@@ -35,7 +35,7 @@ public:
     const GDBusError code;
 };
 
-/// One who answers calls on the system bus: a connection of its own, one object on it, and a well-known name where wanted.
+/// Answers calls on the system bus. It has its own connection, one object on it, and optionally a well-known name.
 /// Calls are answered in the default main context, which the owner iterates.
 class BusParty
 {
@@ -43,34 +43,34 @@ public:
     /// Answers a call. @return the reply's body, a tuple, consumed when floating; null for an empty one. May throw CallError.
     using Handler = std::function<GVariant*(const BusCall&)>;
 
-    /// Connects and exports the object; there is no name to call it by yet but the connection's own.
-    /// @param xml  introspection data of one node: its name is the object path, its first interface the object's
+    /// Connects and exports the object, which at first has only the connection's unique name.
+    /// @param xml  introspection data of one node: its name is the object path, its first interface that of the object
     /// Throws BusError. Blocks while connecting.
     BusParty(const char* xml, Handler handler);
     BusParty(const BusParty&) = delete;
     BusParty& operator=(const BusParty&) = delete;
     virtual ~BusParty();
 
-    /// Takes a well-known name for as long as the party lives; does not queue for it.
+    /// Takes a well-known name while the party lives; does not queue for it.
     /// Throws BusError. Blocks on the bus.
     void OwnName(const std::string& name);
 
-    /// Gives the well-known name back. A call that the bus has sent here before is in the main context on return.
+    /// Releases the well-known name. On return, calls that the bus has already sent here are in the main context.
     /// Blocks on the bus.
     void ReleaseName();
 
-    /// The well-known name taken, or else the connection's unique one.
+    /// Returns the well-known name if there is one, otherwise the connection's unique name.
     const std::string& Name() const { return name_; }
     const char* ObjectPath() const { return node_->path; }
     const char* Interface() const { return node_->interfaces[0]->name; }
 
-    /// Whether the bus is still there.
+    /// Whether the connection is still open.
     bool IsConnected() const { return !g_dbus_connection_is_closed(connection_.get()); }
 
-    /// Does what is due between two rounds of the main loop. @return whether to go on serving
+    /// Does work that is due between two rounds of the main loop. @return whether to go on serving
     virtual bool GoOn() { return true; }
 
-    /// The party's own connection, by which others know it; borrowed.
+    /// Returns the party's own connection; borrowed.
     GDBusConnection* Connection() const { return connection_.get(); }
 
     /// Calls a method of the bus itself.

@@ -10,11 +10,12 @@ namespace kiv
 namespace
 {
 
-/// The calls that wait, of all connections of the process. Never destroyed: the threads that read the connections may outlive it.
+/// The waiting calls on all connections of the process. Never destroyed, since the threads that read the connections may outlive
+/// it.
 struct Waiting
 {
     std::mutex mutex;
-    std::map<std::string, unsigned> calls; ///< by the caller's unique name; without zeros
+    std::map<std::string, unsigned> calls; ///< number by the caller's unique name; without zeros
 };
 
 Waiting& AllWaiting()
@@ -33,7 +34,7 @@ void GiveUpPlace(gpointer sender)
         waiting.calls.erase(count);
 }
 
-/// Counts the call as long as its message lives, which is until it is answered, by whomever.
+/// Counts the call while its message lives, which is until the call is answered.
 bool TakePlace(GDBusMessage* call)
 {
     const char* const sender = g_dbus_message_get_sender(call);

@@ -6,13 +6,13 @@
 namespace kiv
 {
 
-/// Bounds what the callers of a connection can make wait there: calls that are one too many, or too large, are refused with
-/// org.freedesktop.DBus.Error.LimitsExceeded when they arrive, before they take a place in the queue.
+/// Limits the waiting calls of each caller on a connection. Calls that are too many or too large are refused with
+/// org.freedesktop.DBus.Error.LimitsExceeded when they arrive, before they are queued.
 class CallLimit
 {
 public:
-    static constexpr unsigned kMostWaiting = 100; ///< calls of one caller
-    static constexpr gsize kMostBytes = 4096;     ///< of a call's arguments
+    static constexpr unsigned kMostWaiting = 100; ///< calls per caller
+    static constexpr gsize kMostBytes = 4096;     ///< bytes of a call's arguments
 
     /// @param connection  borrowed; outlives the limit
     explicit CallLimit(GDBusConnection* connection);

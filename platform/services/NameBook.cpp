@@ -56,7 +56,7 @@ void NameBook::Save() const
     g_autoptr(GError) error = nullptr;
     const g_autofree char* text = g_key_file_to_data(file_.get(), &size, nullptr);
     const g_autofree char* directory = g_path_get_dirname(path_.c_str());
-    g_mkdir_with_parents(directory, 0700); // without it the file cannot be written, which says why
+    g_mkdir_with_parents(directory, 0700); // if this fails, writing the file fails with the reason
     constexpr int kForTheUserAlone = 0600;
     if (g_file_set_contents_full(
             path_.c_str(), text, static_cast<gssize>(size), G_FILE_SET_CONTENTS_CONSISTENT, kForTheUserAlone, &error) == FALSE)

@@ -10,26 +10,26 @@
 namespace kiv
 {
 
-/// What the subscription service knows of the bus names in the subscriber store, in a small file beside the store: on which bus the
-/// unique names are, and which user subscribed under each name. Both have to outlive the service, and the store has no place
-/// for them. A book that cannot be read is an empty one.
+/// The subscription service's notes on the bus names in the subscriber store: the bus of the unique names, and the user who
+/// subscribed with each name. They must outlive the service and the store has no place for them, so they are in a small file next
+/// to the store. A book that cannot be read counts as empty.
 class NameBook
 {
 public:
-    /// Opens the book beside that store.
+    /// Opens the book next to that store.
     explicit NameBook(const std::string& storePath);
 
-    /// The id of the bus on which the unique names are; empty when unknown.
+    /// Returns the id of the bus of the unique names; empty if unknown.
     std::string Bus() const;
 
-    /// Writes the id of the bus down. Throws CallError.
+    /// Records the id of the bus. Throws CallError.
     void SetBus(const std::string& id);
 
-    /// Whether the name was last subscribed under by this user.
+    /// Whether this user was the last to subscribe with that name.
     bool IsOf(const std::string& name, guint32 user) const;
 
-    /// Writes down that the user subscribed under the name, unless the book says so. Throws CallError.
-    /// @param isInUse  whether a name has records; those that have none are crossed out
+    /// Records that the user subscribed with the name, unless that is recorded. Throws CallError.
+    /// @param isInUse  whether a name has subscriptions; names without any are removed
     void SetUser(const std::string& name, guint32 user, const std::function<bool(const std::string&)>& isInUse);
 
 private:

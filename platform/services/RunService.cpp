@@ -34,7 +34,7 @@ try
 
     StopSignals signals;
     const std::unique_ptr<BusParty> service = start();
-    std::printf("ready bus_names=%s\n", service->Name().c_str()); // as kivctl services prints it
+    std::printf("ready bus_names=%s\n", service->Name().c_str()); // the same line as kivctl services prints
     std::fflush(stdout);
     if (signals.IterateWhile([&service] { return service->IsConnected() && service->GoOn(); }) || service->IsConnected())
         return 0;

@@ -9,10 +9,10 @@
 namespace kiv
 {
 
-/// The main() of a program that is one bus service: starts it, tells on standard output that it is ready, serves until SIGINT or
-/// SIGTERM, or until it has nothing more to do.
-/// @param options  of the command line, ended by an empty one; may be null
-/// @param start    makes the service once the command line is read; may throw std::exception
+/// The main() of a program for one bus service: starts the service, prints on standard output that it is ready, and serves until
+/// SIGINT, SIGTERM, or the end of its work.
+/// @param options  command-line options, ended by an empty one; may be null
+/// @param start    makes the service after the command line is read; may throw std::exception
 /// @return the exit code: 0, or 1 after a message on standard error
 int RunService(int argc, char** argv, const char* summary, const GOptionEntry* options,
     const std::function<std::unique_ptr<BusParty>()>& start) noexcept;

@@ -8,14 +8,15 @@
 namespace kiv
 {
 
-/// The platform's service manager, as the agent's events reach it: takes every one and tells it to whoever watches.
+/// The part of the platform's service manager that receives the agent's events. It accepts all events and passes them to an
+/// observer.
 class ServiceManager : public BusParty
 {
 public:
     static constexpr char kBusName[] = "org.tizen.servicemanager.service";
 
-    /// Serves from now on. Throws BusError.
-    /// @param onCall  hears of every call before it is answered
+    /// Starts to serve. Throws BusError.
+    /// @param onCall  called with every call before it is answered
     explicit ServiceManager(std::function<void(const BusCall&)> onCall);
 };
 

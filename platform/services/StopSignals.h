@@ -6,10 +6,9 @@
 namespace kiv
 {
 
-/// Turns SIGINT, SIGTERM and SIGHUP into something that a main loop can ask for, as long as the object lives.
-/// A reader of standard output that went away counts as a request to stop too, instead of killing the process with SIGPIPE: what
-/// a process has to take back when it ends is taken back then as well.
-/// One object at a time, in the thread that iterates the default main context.
+/// Turns SIGINT, SIGTERM and SIGHUP into a request to stop, which a main loop can query, while the object lives.
+/// When the reader of standard output closes it, this is a request to stop as well, and SIGPIPE does not kill the process. So the
+/// process can always clean up. One object at a time, in the thread that iterates the default main context.
 class StopSignals
 {
 public:
@@ -18,8 +17,8 @@ public:
     StopSignals& operator=(const StopSignals&) = delete;
     ~StopSignals();
 
-    /// Iterates the default main context until a request to stop has come, or until `goOn` gives false.
-    /// @return whether a request to stop has come
+    /// Iterates the default main context until there is a request to stop, or `goOn` returns false.
+    /// @return whether there was a request to stop
     template <typename GoOn>
     bool IterateWhile(GoOn goOn)
     {

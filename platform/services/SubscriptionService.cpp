@@ -13,8 +13,8 @@ namespace kiv
 namespace
 {
 
-/// Has the service rest as long as it worked, so that callers who keep it busy leave bus and store free half of the time for
-/// whoever notifies.
+/// Makes the service rest as long as it worked. So even if callers keep it busy, bus and store are free for notifications half of
+/// the time.
 class Work
 {
 public:
@@ -126,7 +126,7 @@ bool SubscriptionService::GoOn()
     }
     catch (const BusError&)
     {
-        return false; // a later call has started a successor, which watches all names
+        return false; // a later call started a successor, which watches all names
     }
 }
 
@@ -197,8 +197,8 @@ GVariant* SubscriptionService::List(const char* sender)
     return g_variant_new("(a(sssss))", &list);
 }
 
-/// Unique names are never given twice by one bus, but every bus starts with the same ones: what is recorded under those of another
-/// bus is nobody's any more.
+/// A bus never uses a unique name twice, but every bus starts with the same ones. So subscriptions with unique names of another bus
+/// belong to nobody any more.
 void SubscriptionService::Sweep()
 {
     if (!isSweepDue_)
@@ -230,7 +230,7 @@ SubscriptionService::Records SubscriptionService::ReadStore()
     return records;
 }
 
-/// Whether the store has a name to watch. One that cannot be used has none; whoever calls is told.
+/// Whether the store has a name to watch. An unusable store has none; callers receive the error.
 bool SubscriptionService::HasUniqueNames()
 {
     try
@@ -254,7 +254,7 @@ bool SubscriptionService::Apply(Change change, const DASubscription& subscriptio
     return outcome == DASubscriberStore::Outcome::Done;
 }
 
-/// The store may keep a change waiting, and the name may change hands meanwhile: then the change is taken back.
+/// Applies a change, and undoes it if the name got another owner while the store made the change wait.
 bool SubscriptionService::ApplyAsOwner(Change change, Change inverse, const DASubscription& subscription, const char* sender)
 {
     if (!Apply(change, subscription))

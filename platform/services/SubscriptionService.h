@@ -11,25 +11,25 @@
 namespace kiv
 {
 
-/// Writes the subscriber store on behalf of the client services, which call it as dbus/org.kiv.Subscriptions1.xml describes.
+/// Writes to the subscriber store for client services, which call it as dbus/org.kiv.Subscriptions1.xml describes.
 ///
-/// Nobody subscribes for someone else: the bus says who the caller is and who owns a name. Whatever has to survive a kill is in the
-/// store and in the NameBook beside it, so that a service that starts has nothing to restore.
+/// Nobody can subscribe for others: the bus identifies the caller and the owner of a name. All state that must survive a kill is in
+/// the store and in the NameBook next to it, so a new process has nothing to restore.
 class SubscriptionService : public BusParty
 {
 public:
     static constexpr char kBusName[] = "org.kiv.Subscriptions";
-    static constexpr int kMostRecords = 1000; ///< of one user
+    static constexpr int kMostRecords = 1000; ///< per user
     static constexpr double kIdleSeconds = 60;
 
-    /// Serves from now on, as long as the owner calls GoOn(). Throws BusError.
-    /// @param idleSeconds     after which GoOn() ends the service when nobody calls and no unique name has a subscription
-    /// @param administrators  user ids that may list and remove what is others'
+    /// Starts to serve; the owner must call GoOn() regularly. Throws BusError.
+    /// @param idleSeconds     GoOn() ends the service after this time without calls and without subscriptions of unique names
+    /// @param administrators  user ids that may list and remove the subscriptions of others
     SubscriptionService(double idleSeconds, std::set<guint32> administrators);
     ~SubscriptionService() override;
 
-    /// Removes what names have left behind that are gone from the bus. A call that arrives while the service ends is answered, or
-    /// has the bus start a successor.
+    /// Removes the subscriptions of unique names that left the bus. A call that arrives while the service ends is answered, or
+    /// makes the bus start a successor.
     bool GoOn() override;
 
 private:
@@ -64,7 +64,7 @@ private:
     guint departures_ = 0;   ///< signal subscription
     bool isIdle_ = false;    ///< the idle time is over
     bool isSweepDue_ = true; ///< a name may have left the bus
-    gint64 restUntil_ = 0;   ///< on the monotonic clock
+    gint64 restUntil_ = 0;   ///< time of the monotonic clock
 };
 
 } // namespace kiv

@@ -92,7 +92,7 @@ TEST_F(ConnectionTrouble, IsAvoidedByAPrivateConnection)
         ASSERT_NE(nullptr, taken);
         EXPECT_FALSE(g_dbus_connection_is_closed(taken.get()));
         EXPECT_NE(nullptr, g_dbus_connection_get_unique_name(taken.get()));
-        EXPECT_EQ(77, error) << "which is left alone";
+        EXPECT_EQ(77, error) << "unchanged on success";
         EXPECT_THAT(log.TakeErrors(), testing::IsEmpty());
         EXPECT_EQ(0, manager.SendActivatedNotification(imsi, 1));
         EXPECT_THAT(log.TakeErrors(), testing::Contains(testing::EndsWith("Unable to create proxy: no reason given")))
@@ -116,7 +116,7 @@ TEST_F(ConnectionTrouble, DoesNotEndTheProcess)
         gio.closesAtOnce = closesAtOnce;
         int error = 77;
         EXPECT_EQ(agents, Connection(manager.InitDbusConnection(&error)));
-        EXPECT_EQ(77, error) << "which is left alone";
+        EXPECT_EQ(77, error) << "unchanged on success";
         EXPECT_FALSE(g_dbus_connection_get_exit_on_close(agents.get()));
     }
 }

@@ -78,7 +78,7 @@ struct EarlyChild
     pid_t child;
 } const early;
 
-TEST(Fork, AllowsTheBusOnlyToProcessesThatUseItAfterwards)
+TEST(Fork, DeniesTheBusOnlyToChildrenOfItsUsers)
 {
     const PrivateBus bus;
     const Peer client(bus), daemon(bus, kBoardDaemon, Peer::Reply("('KIV1',)")), serviceManager(bus, kServiceManager);

@@ -96,7 +96,8 @@ TEST_F(Notification, IsRefusedWithAnUnknownTypeOrABadText)
         lines.push_back(line);
     }
     EXPECT_EQ(lines, log.TakeErrors());
-    EXPECT_EQ(0, facade.SendNotiToServiceManager(KIV_NOTI_TYPE_AUTH_FAIL, nullptr, 7, "a", "b", "c", "d")) << "which is not told";
+    EXPECT_EQ(0, facade.SendNotiToServiceManager(KIV_NOTI_TYPE_AUTH_FAIL, nullptr, 7, "a", "b", "c", "d"))
+        << "the result of the calls is not returned";
     EXPECT_THAT(log.TakeErrors(), ElementsAre(Line("IMSI is null", "E", "SendAuthNotification")));
     EXPECT_THAT(store.asked, IsEmpty());
     EXPECT_THAT(serviceManager.Calls(), IsEmpty());

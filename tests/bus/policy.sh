@@ -70,8 +70,8 @@ subscribe Mail --key 7 --kind policy --kind status --kind auth --kind activated 
 while read -r event options; do
     read -ra words <<<"$event $options"
     [[ $event == number-changed ]] || "$kivctl" notify "${words[@]}" --to manager >/dev/null ||
-        fail "not told to the manager: $event"
-    [[ $("$kivctl" notify "${words[@]}") == "sent subscribers=1 delivered=1" ]] || fail "not told to the subscriber: $event"
+        fail "the manager was not notified: $event"
+    [[ $("$kivctl" notify "${words[@]}") == "sent subscribers=1 delivered=1" ]] || fail "the subscriber was not notified: $event"
 done <<EVENTS
 auth-success
 on              --service 7
@@ -85,9 +85,9 @@ EVENTS
 # Without a rule for it, a client service is neither notified nor started. The others are.
 subscribe Other --kind auth
 "$kivctl" subscribers add auth all org.example.Gone /org/example org.example.Gone >/dev/null
-[[ $("$kivctl" notify auth-success 2>&1) == *"subscribers=3 delivered=1"* ]] || fail "not told to exactly one of three"
-[[ $(wc --lines <"$scratch/Other.log") == 1 ]] || fail "told to the wrong one"
-! grep "Rejected.*StartServiceByName" "$scratch/bus.log" || fail "a subscriber can not be started"
+[[ $("$kivctl" notify auth-success 2>&1) == *"subscribers=3 delivered=1"* ]] || fail "not exactly one of three was notified"
+[[ $(wc --lines <"$scratch/Other.log") == 1 ]] || fail "the wrong subscriber was notified"
+! grep "Rejected.*StartServiceByName" "$scratch/bus.log" || fail "a subscriber cannot be started"
 
 call() # destination path member
 {

@@ -64,7 +64,7 @@ TEST_F(ConnectionTest, ListenerReceivesFiveKindsOfChangeWhateverFails)
     EXPECT_CALL(listener, OnPacketDataChanged(false, &first));
     EXPECT_CALL(listener, OnWifiConnectedChanged(true, &first));
     kiv::platform::SetDevice(after);
-    EXPECT_EQ(6U + 3U, TakeCalls()) << "the registrations, and one read for each value to tell";
+    EXPECT_EQ(6U + 3U, TakeCalls()) << "the registrations, and one read per reported value";
 
     for (int i = 0; i < 2; ++i) // also when there is nothing to unregister
     {

@@ -46,7 +46,7 @@ TEST_F(DeviceFacts, OfAPackageNeedItsExactName)
     for (const char* const package : {static_cast<const char*>(nullptr), "", "org.example.mai"})
         EXPECT_FALSE(facade.IsPackageInstalled(const_cast<char*>(package)));
     EXPECT_THAT(log.Take(), ElementsAre(place + empty, place + empty, place + "No Such Package [org.example.mai]"));
-    EXPECT_EQ(1U, TakeCalls()) << "an empty name is not asked for";
+    EXPECT_EQ(1U, TakeCalls()) << "an empty name is not looked up";
 }
 
 TEST_F(DeviceFacts, CompareFreeStorageStrictlyInMebibytes)

@@ -12,7 +12,7 @@ done < <(sed --quiet 's/^DASystem::\([A-Z]\w*\)(.*/\1/p' lib/DASystem/exported_s
     grep --invert-match --line-regexp -e DASystem -e GetInstance)
 
 tests=$(ctest --test-dir "$build" --show-only --label-exclude '^check$' | sed --quiet 's/^Total Tests: //p')
-grep --quiet "tests failed out of $tests\$" README.md || { echo "README.md tells another number of tests than $tests"; failed=1; }
+grep --quiet "tests failed out of $tests\$" README.md || { echo "README.md shows another number of tests than $tests"; failed=1; }
 
 while IFS=: read -r page link; do
     [[ -e $(dirname "$page")/$link ]] || { echo "$page links to $link, which is not there"; failed=1; }

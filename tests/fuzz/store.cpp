@@ -40,7 +40,7 @@ void Take(const std::string& step, bool& isWhole)
 
     std::list<_SubscriberInfo> found;
     const bool isAsked = DASubscribeDataManager().GetSubscriber(fields[1].c_str(), fields[2].c_str(), found);
-    Require(isAsked || found.empty(), "a store that fails gives nothing");
+    Require(isAsked || found.empty(), "a store that fails returns nothing");
     Require(!isWhole || (isAsked && outcome != Outcome::Failed), "a store that is whole does not fail");
     const auto count = std::count_if(found.begin(), found.end(),
         [&fields](const _SubscriberInfo& other)

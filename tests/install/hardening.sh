@@ -14,7 +14,7 @@ for file in "$@"; do
     segments=$("$readelf" --wide --program-headers "$file")
     dynamic=$("$readelf" --wide --dynamic "$file")
     symbols=$("$readelf" --wide --dyn-syms "$file")
-    must "a stack that can not be executed" "$file" 'GNU_STACK .* RW +0x' "$segments"
+    must "a stack that cannot be executed" "$file" 'GNU_STACK .* RW +0x' "$segments"
     must "a read-only relocation segment" "$file" GNU_RELRO "$segments"
     must "binding of all symbols at loading" "$file" 'BIND_NOW|\(FLAGS_1\).*NOW' "$dynamic"
     must "the stack protector" "$file" ' UND +__stack_chk_fail' "$symbols"

@@ -198,7 +198,7 @@ std::string Objection(const DASubscription& subscription)
     constexpr const char* kName = "two or more elements joined by dots are needed, such as org.example.Client";
     constexpr const char* kPath =
         "elements of letters, digits and underscores, a slash before each, are needed, such as /org/example/Client";
-    constexpr const char* kReserved = "the bus reserves names that begin like this, and disconnects whoever calls them";
+    constexpr const char* kReserved = "the bus reserves names that begin like this and disconnects their callers";
 
     if (!IsKind(subscription.kind))
         return Refusal("kind", subscription.kind, KindWanted());
