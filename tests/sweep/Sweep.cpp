@@ -121,6 +121,10 @@ testing::AssertionResult Sweep::MayBe(const Operation& operation, const Story& s
         words.insert({mcc, mnc, mcc + mnc + slot.msin.value_or(""), slot.number.value_or(""), slot.imei.value_or("")});
     }
     const bool isPartial = operation.kind != Kind::Single && std::includes(words.begin(), words.end(), told.begin(), told.end());
+    const bool hasCount = operation.name.find("vector") != std::string::npos; // of its texts, each after a space, like itself
+    const auto texts = std::count(story[0].begin(), story[0].end(), ' ') - 1;
+    if (hasCount && story[0].substr(story[0].rfind(' ') + 1) != std::to_string(texts))
+        return testing::AssertionFailure() << operation.name << " miscounts " << story[0];
     if (results.count(story[0]) == 0 && !isPartial)
         return testing::AssertionFailure() << operation.name << " gave " << story[0] << ", untouched " << untouched[0];
     for (std::size_t i = 1; i < story.size(); ++i)
