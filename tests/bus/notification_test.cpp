@@ -224,9 +224,11 @@ TEST_F(Notification, ToTheServiceManagerReturnsWhetherItWasAnswered)
 
 TEST_F(BusTest, RequestsTheSerialNumberAnewOnEachCall)
 {
-    const auto sent = [](const char* message) { return StartsWith(Line(message, "E", "SendDbusMethodNReceiveDID")); };
-    const Lines refused = {StartsWith(Line("g_dbus_message_to_gerror() failed:[", "E", "ParseDeviceUniqueID"))};
-    const Lines failed = {sent("reply is NULL"), sent("g_dbus_connection_send_message_with_reply_sync() failed:["),
+    const auto sent = [](const char* message) { return Line(message, "E", "SendDbusMethodNReceiveDID"); };
+    const Lines refused = {
+        Line("g_dbus_message_to_gerror() failed:[36:GDBus.Error:org.example.Refused: not today]", "E", "ParseDeviceUniqueID")};
+    const Lines failed = {sent("reply is NULL"),
+        sent("g_dbus_connection_send_message_with_reply_sync() failed:[18:The connection is closed]"),
         sent("[dbus] CORE_DBUS_ERROR_REPLY_FAIL"), Line("dbus error occured", "E", "GetDeviceUniqueID")};
     const std::tuple<Peer::Answer, int, const char*, Lines> cases[] = {
         {Peer::Reply("('R58M123', 'more')"), 0, "R58M123", {}},

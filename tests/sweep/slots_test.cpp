@@ -65,7 +65,8 @@ TEST_F(Slots, AreJudgedByTheModemsAnswers)
                kBoth[] = "DASystem::IsDualSimAvailable()", kRoaming[] = "DASystem::GetRoamingStatus(int, bool*)",
                kSms[] = "DASystem::IsAvaliableSendSMS(int, TelSimCardStatus_t*, int*)";
     const std::string state = kManager + "IsSimExist > SIM STATE[1] : ", service = kManager + "IsAvaliableSendSMS > NetworkSvc",
-                      notAvailable = kManager + "IsSimAvailable > Sim is not available";
+                      notAvailable = kManager + "IsSimAvailable > Sim is not available",
+                      notOpened = kManager + "SuccessToInitTelephonyHandle > telephony_init Failed.";
     const std::tuple<const char*, void (*)(Of&), Story> cases[] = {
         {kExist, [](Of& slots) { slots[1].simState = 0; }, {"true", state + "TELEPHONY_SIM_STATE_UNAVAILABLE"}},
         {kExist, [](Of& slots) { slots[1].simState = 1; }, {"true", state + "TELEPHONY_SIM_STATE_LOCKED"}},
@@ -73,6 +74,7 @@ TEST_F(Slots, AreJudgedByTheModemsAnswers)
         {kExist, [](Of& slots) { slots[1].simState = 4; }, {"true", state + "-"}},
         {kAny, [](Of& slots) { slots[0].simState = 3; }, {"true", notAvailable}},
         {kBoth, [](Of& slots) { slots[1].simState = 1; }, {"false", notAvailable}},
+        {kBoth, [](Of& slots) { slots.clear(); }, {"false", notOpened}},
         {kBoth, [](Of& slots) { slots.resize(1); },
             {"false", "E DASystem.cpp IsDualSimAvailable > [Single Sim Device] Not support Dual Sim."}},
         {kRoaming, [](Of& slots) { slots[1].serviceState = 2; }, {"false true"}},

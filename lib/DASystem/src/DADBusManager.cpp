@@ -87,7 +87,7 @@ char* DADBusManager::ParseDeviceUniqueID(GDBusMessage* reply, int* error)
         return g_strdup(g_dbus_message_get_arg0(reply));
 
     g_autoptr(GError) failure = nullptr;
-    if (g_dbus_message_to_gerror(reply, &failure) && failure != nullptr)
+    if (g_dbus_message_to_gerror(reply, &failure))
         KIV_ERROR("g_dbus_message_to_gerror() failed:[%d:%s]", failure->code, Reason(failure));
     *error = KIV_RESULT_NO_REPLY;
     return nullptr;
