@@ -1,4 +1,4 @@
-// The library's reaction to answers of GIO that no real bus gives on demand. Doubles replace two functions of GIO.
+// The library's reaction to answers of GIO that no real bus gives on demand. Doubles replace three functions of GIO.
 #include "bus/BusTest.h"
 
 namespace
@@ -25,6 +25,11 @@ extern "C" GDBusConnection* g_bus_get_sync(GBusType, GCancellable*, GError** err
 
 extern "C" GDBusProxy* g_dbus_proxy_new_sync(
     GDBusConnection*, GDBusProxyFlags, GDBusInterfaceInfo*, const gchar*, const gchar*, const gchar*, GCancellable*, GError**)
+{
+    return nullptr;
+}
+
+extern "C" GDBusMessage* g_dbus_message_new_method_call(const gchar*, const gchar*, const gchar*, const gchar*)
 {
     return nullptr;
 }
@@ -130,6 +135,17 @@ TEST_F(ConnectionTrouble, OfAnAgentsOtherConnectionKeepsItsEffect)
     g_dbus_connection_set_exit_on_close(other.get(), TRUE);
     g_signal_emit_by_name(other.get(), "closed", FALSE, nullptr);
     EXPECT_TRUE(g_dbus_connection_get_exit_on_close(other.get()));
+}
+
+TEST_F(ConnectionTrouble, IsCode2WithoutARequest)
+{
+    const Connection agents = bus.Connect();
+    gio.connection = agents.get();
+    const char* id = "stale";
+    EXPECT_EQ(2, manager.GetDeviceUniqueID(id));
+    EXPECT_EQ(nullptr, id);
+    EXPECT_THAT(log.TakeErrors(), testing::ElementsAre(Line("g_dbus_message_new_method_call err", "E", "SendDbusMethodNReceiveDID"),
+                                      Line("dbus error occured", "E", "GetDeviceUniqueID")));
 }
 
 TEST_F(ConnectionTrouble, IsCode5WithoutAProxy)
