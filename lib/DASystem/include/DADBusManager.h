@@ -14,7 +14,8 @@
 /// for a push). Texts are borrowed for the call. Any thread; no lock is held while an operation waits.
 ///
 /// Connecting takes at most 25 seconds, but has no time limit on a bus that accepts connections and never answers. A call works
-/// even if the process's shared connection is dead. In a child made by fork, bus calls fail at once if the parent used the bus.
+/// even if the process's shared connection is dead. In a child made by fork, bus calls fail at once if the parent used the bus
+/// through the library; if the parent used GDBus only by itself, they wait for an answer that never comes.
 class KIV_SYSTEM_API DADBusManager
 {
 public:
@@ -90,7 +91,8 @@ public:
     /// @param noti_time           any 64-bit value, passed on unchanged
     /// @return 0, also when a text is refused; only the log shows how a delivery ended
     /// Blocks on the subscriber store; does not wait for the bus. The deliveries continue in the calling thread's thread-default
-    /// main context, which must be iterated.
+    /// main context, which must be iterated until they end. Until a push has connected, no connection that closes ends the process;
+    /// if the context is destroyed before that, this remains so, and the push stays in memory.
     int DeliverPushMessage(const char* service_id, const char* noti_data, const char* noti_msg, long long noti_time);
 
     static DADBusManager* __pInstance; ///< the instance; null until it is made
