@@ -127,6 +127,8 @@ TEST_F(Notification, OfSeveralServicesIsOneStatusCallEach)
     EXPECT_EQ(0, facade.SendMultiOnOffNotiToServiceManager(imsi, 3, ids, statuses));
     EXPECT_THAT(store.asked, ElementsAre("status 214748364", "status -21474836"));
     EXPECT_THAT(client.Calls(), ElementsAre(Status("2147483647, 'on'"), Status("-2147483648, 'any text'")));
+    EXPECT_EQ(0, facade.SendMultiOnOffNotiToServiceManager(imsi, 1, ids, statuses));
+    EXPECT_THAT(client.Calls(), SizeIs(3));
 
     log.Take();
     EXPECT_EQ(0, facade.SendMultiOnOffNotiToServiceManager(imsi, 0, ids, statuses));

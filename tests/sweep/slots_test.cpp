@@ -50,6 +50,8 @@ TEST_F(Slots, WithANegativeNumberDoNotExist)
     EXPECT_FALSE(DASimManager::GetInstance()->IsSimAvailable(session.given, -1));
     EXPECT_FALSE(facade.GetRoamingStatus(-1, &isRoaming));
     EXPECT_TRUE(isRoaming);
+    EXPECT_TRUE(facade.GetRoamingStatus(0, &isRoaming)) << "the first slot is";
+    EXPECT_FALSE(isRoaming);
     EXPECT_THAT(platform::TakeMisuses(), testing::IsEmpty());
 }
 
@@ -73,6 +75,7 @@ TEST_F(Slots, AreJudgedByTheModemsAnswers)
         {kExist, [](Of& slots) { slots[1].simState = 3; }, {"true", state + "TELEPHONY_SIM_STATE_UNKNOWN"}},
         {kExist, [](Of& slots) { slots[1].simState = 4; }, {"true", state + "-"}},
         {kAny, [](Of& slots) { slots[0].simState = 3; }, {"true", notAvailable}},
+        {kAny, [](Of& slots) { slots[0].simState = slots[1].simState = 1; }, {"false", notAvailable, notAvailable}},
         {kBoth, [](Of& slots) { slots[1].simState = 1; }, {"false", notAvailable}},
         {kBoth, [](Of& slots) { slots.clear(); }, {"false", notOpened}},
         {kBoth, [](Of& slots) { slots.resize(1); },
