@@ -28,7 +28,7 @@ std::string Describe(std::int64_t /*type*/, const Limits& limits)
     std::vector<std::string> choices;
     for (std::size_t i = 0; i < limits.wordCount; ++i)
         choices.push_back(std::string(limits.words[i].text) + " (" + std::to_string(limits.words[i].number) + ")");
-    if (limits.high - limits.low + 1 != static_cast<std::int64_t>(limits.wordCount))
+    if (limits.high - limits.low != static_cast<std::int64_t>(limits.wordCount) - 1)
         choices.push_back("a number from " + std::to_string(limits.low) + " to " + std::to_string(limits.high));
 
     std::string text = choices.front();

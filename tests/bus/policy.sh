@@ -107,12 +107,27 @@ org.freedesktop.DBus             /               org.freedesktop.DBus.ListNames
 org.example.Other                /               org.kiv.ClientService.auth
 CALLS
 
+[[ $("$kivctl" doctor) == *"which forbids this user to ask whether it answers"* ]] || fail "the doctor does not see the manager"
+change() # pattern replacement: of the policy
+{
+    sed --in-place "s|$1|$2|" "$scratch/bus.conf"
+    kill -HUP "${pids[0]}"
+}
+
 # If the bus denies even the query for the owner of a name, no service can be called.
 deny='<deny send_interface="org.freedesktop.DBus" send_member="GetNameOwner"/>'
-sed --in-place "s|</busconfig>|<policy context=\"mandatory\">$deny</policy>&|" "$scratch/bus.conf"
-kill -HUP "${pids[0]}"
+change '</busconfig>' "<policy context=\"mandatory\">$deny</policy>&"
 deadline=$((SECONDS + 20)) code=0
 while ((code != 5)); do
     ((SECONDS < deadline)) || fail "exit code $code, not 5"
     "$kivctl" notify auth-success --to manager >/dev/null 2>"$scratch/last.log" && code=0 || code=$?
+done
+
+# "Start it" is no advice where the bus gives this user no name.
+kill "${pids[1]}"
+wait "${pids[1]}" || true
+change '<allow own="org.tizen.system.deviced"/>' ''
+deadline=$((SECONDS + 20))
+until [[ $("$kivctl" doctor) == *"deviced is not on the bus, and the bus forbids this user to own it"* ]]; do
+    ((SECONDS < deadline)) || fail "the doctor does not see what the bus forbids"
 done

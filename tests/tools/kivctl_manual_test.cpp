@@ -47,7 +47,7 @@ TEST_F(KivctlTest, PrintsWhatThePagesShow)
     }
 
     const Words rows = All("\n(\\| `kivctl [^`]*` \\| (?:object|array) \\| .*) \\|", pages); // of the fields in JSON
-    EXPECT_EQ(15U, rows.size());
+    EXPECT_EQ(18U, rows.size());
     for (const std::string& row : rows)
     {
         const std::string out = Kivctl("--json --profile single " + *All("`kivctl (.*?)`", row).begin()).out;
@@ -82,7 +82,7 @@ TEST_F(KivctlTest, PagesAndCompletionListAllThatTheHelpLists)
         described.insert({"-h", "--help"}); // told once for all verbs
         EXPECT_THAT(described, testing::IsSupersetOf(All(inHelp, help))) << verb;
     }
-    EXPECT_EQ(21U, verbs.size());
+    EXPECT_EQ(24U, verbs.size());
 
     const Words variables = All("\n  ([A-Z_]{6,})  ", general);
     EXPECT_EQ(5U, variables.size());
@@ -107,6 +107,10 @@ TEST_F(KivctlTest, CompletesWhatFitsTheWordsBefore)
         {"device set runtime.flight-mode=t", "runtime.flight-mode=true\n"},
         {"device set -p ./x network.wifi-device=", "network.wifi-device=off\nnetwork.wifi-device=on\n"},
         {"device set sim1.sms", "sim1.sms-status=\twhether the modem is ready for text messages\n"},
+        {"device get sim1.imei", "sim1.imei\tnumber of the modem\n"},
+        {"device unset runtime.fl", "runtime.flight-mode\twhether flight mode is on\n"},
+        {"device set --from sl", "slow-sim\tone slot, its SIM ready at the fourth look\n"},
+        {"profiles show roa", "roaming\tone slot, its SIM in a foreign network with data allowed\n"},
         {"network --profile=ro", "--profile=roaming\tone slot, its SIM in a foreign network with data allowed\n:files\n"},
         {"-p nothing", ":files\n"},
         {"notify on --to ''", "subscribers\nmanager\n"},

@@ -98,23 +98,44 @@ Candidates Recorded(const std::vector<std::string>& operands, bool isNew)
     return candidates;
 }
 
-/// "GROUP.KEY=" for every key, or the values behind it.
-Candidates Assignments(const std::string& typed)
+/// The keys of a device file, with `end` behind each; those of a slot under the group of the one that is typed.
+Candidates Keys(const std::string& typed, const char* end)
 {
-    const std::string key = typed.substr(0, typed.find('='));
-    const bool isOfSlot = key.rfind("sim", 0) == 0 && key.find('.') == 4;
+    const bool isOfSlot = typed.rfind("sim", 0) == 0 && typed.find('.') == 4;
     Candidates candidates;
     for (const kiv::platform::FieldInfo& field : kiv::platform::ListFields())
     {
         std::string name = field.group + "." + field.key;
         if (isOfSlot && name.rfind("sim0.", 0) == 0)
-            name[3] = key[3];
-        if (key.size() == typed.size())
-            candidates.push_back({name + "=", field.meaning});
-        else if (name == key)
-            for (const std::string& word : field.words)
-                candidates.push_back({name + "=" + word});
+            name[3] = typed[3];
+        candidates.push_back({name + end, field.meaning});
     }
+    return candidates;
+}
+
+/// "GROUP.KEY=" for every key, or the values behind it.
+Candidates Assignments(const std::string& typed)
+{
+    const std::string key = typed.substr(0, typed.find('='));
+    if (key.size() == typed.size())
+        return Keys(typed, "=");
+    const std::string general = key.rfind("sim", 0) == 0 && key.find('.') == 4 ? "sim0" + key.substr(4) : key;
+    Candidates candidates;
+    for (const kiv::platform::FieldInfo& field : kiv::platform::ListFields())
+    {
+        if (field.group + "." + field.key != general)
+            continue;
+        for (const std::string& word : field.words)
+            candidates.push_back({key + "=" + word});
+    }
+    return candidates;
+}
+
+Candidates Profiles()
+{
+    Candidates candidates;
+    for (const kiv::platform::Profile& profile : kiv::platform::ListProfiles())
+        candidates.push_back({profile.name, profile.description});
     return candidates;
 }
 
@@ -124,12 +145,13 @@ Candidates ValuesOf(const OptionManual& option)
     Candidates candidates;
     if (option.names.back() == "--profile")
     {
-        for (const kiv::platform::Profile& profile : kiv::platform::ListProfiles())
-            candidates.push_back({profile.name, profile.description});
+        candidates = Profiles();
         const kiv::platform::Profile host = kiv::platform::HostProfile();
         candidates.push_back({host.name, host.description});
         candidates.push_back({kFiles});
     }
+    if (option.names.back() == "--from" || option.names.back() == "PROFILE")
+        return Profiles();
     for (const std::string& word : option.words)
         candidates.push_back({word});
     return candidates;
@@ -150,6 +172,8 @@ Candidates Operands(const Place& place, const std::string& typed)
     const OptionManual& operand = *operands[std::min(index, operands.size() - 1)];
     if (operand.names.back() == "GROUP.KEY=VALUE")
         return Assignments(typed);
+    if (operand.names.back() == "GROUP.KEY")
+        return Keys(typed, "");
     const bool isNew = place.verb->path == "subscribers add";
     if ((!isNew && place.verb->path != "subscribers remove") || (isNew && index == 0))
         return ValuesOf(operand);

@@ -1,16 +1,17 @@
+#include "Nearest.h"
 #include "Verbs.h"
 
+#include <DeviceControl.h>
 #include <SourceControl.h>
+#include <Visible.h>
 
-std::vector<std::string> DeviceFileKeys()
+#include <algorithm>
+
+namespace
 {
-    std::vector<std::string> keys;
-    for (const kiv::platform::FieldInfo& field : kiv::platform::ListFields())
-        keys.push_back(field.group + "." + field.key);
-    return keys;
-}
 
-Exit SetInDeviceFile(const std::vector<std::string>& assignments, const Command& command)
+/// The file that is to be changed. Ends the verb when the device comes from elsewhere.
+std::string RequireFile(const Command& command)
 {
     const std::string file = DeviceAskedFor(command);
     if (IsHost(file))
@@ -22,12 +23,97 @@ Exit SetInDeviceFile(const std::vector<std::string>& assignments, const Command&
     if (IsProfileName(file))
     {
         throw Failure(
-            Exit::Usage, "a device that comes from a profile can not be changed; name a file with --profile, such as ./my.profile");
+            Exit::Usage, "a device that comes from a profile cannot be changed; name a file with --profile, such as ./my.profile");
     }
-    const std::string trouble = kiv::platform::SetInDeviceFile(file, assignments);
+    return file;
+}
+
+void RequireNone(const std::string& trouble)
+{
     if (!trouble.empty())
         throw Failure(Exit::BadDevice, trouble);
+}
+
+/// What identifies a person or a device, and how many characters of it stay at the end where it is masked.
+struct Identifier
+{
+    const char* key;
+    size_t shown;
+};
+constexpr Identifier kIdentifiers[] = {{"device.tizen-id", 4}, {"device.serial", 4}, {"msin", 0}, {"number", 2}, {"imei", 4}};
+
+Field ValueField(const kiv::platform::FieldValue& value, Identifiers identifiers)
+{
+    if (!value.value)
+        return Missing("value", kiv::platform::ReasonFor(value.key));
+    Field field{"value", *value.value};
+    const bool isOfSlot = value.key.rfind("sim", 0) == 0;
+    for (const Identifier& identifier : kIdentifiers)
+    {
+        if (value.key == identifier.key || (isOfSlot && value.key.substr(value.key.find('.') + 1) == identifier.key))
+            field = Masked(field, 0, identifier.shown, identifiers);
+    }
+    return field;
+}
+
+std::vector<Record> ValueRows(Identifiers identifiers)
+{
+    std::vector<Record> rows;
+    for (const kiv::platform::FieldValue& value : kiv::platform::ListValues())
+        rows.push_back({{"key", value.key}, ValueField(value, identifiers)});
+    return rows;
+}
+
+} // namespace
+
+Exit SetInDeviceFile(const DeviceFileOptions& options, const Command& command)
+{
+    const std::string file = RequireFile(command);
+    if (!options.from.empty())
+    {
+        RequireNone(kiv::platform::MakeDeviceFile(file, options.from, options.words));
+        return Exit::Done;
+    }
+    if (options.words.empty())
+        throw Failure(Exit::Usage, "nothing to change; GROUP.KEY=VALUE is needed, such as runtime.flight-mode=true");
+    std::string madeFrom;
+    RequireNone(kiv::platform::SetInDeviceFile(file, options.words, &madeFrom));
+    if (!madeFrom.empty())
+        Note("created " + file + " from the profile " + madeFrom);
     return Exit::Done;
+}
+
+Exit UnsetInDeviceFile(const DeviceFileOptions& options, const Command& command)
+{
+    RequireNone(kiv::platform::UnsetInDeviceFile(RequireFile(command), options.words));
+    return Exit::Done;
+}
+
+Exit ShowDeviceValues(const DeviceValueOptions& options, const Command& command)
+{
+    if (options.key.empty())
+    {
+        PrintTable(ValueRows(command.identifiers), command.form);
+        return Exit::Done;
+    }
+    std::vector<std::string> keys;
+    for (const kiv::platform::FieldValue& value : kiv::platform::ListValues())
+    {
+        keys.push_back(value.key);
+        if (value.key != options.key)
+            continue;
+        const Field field = ValueField(value, Identifiers::Shown);
+        const bool isBare = command.form.notation == Form::Notation::Text && command.form.fields.empty();
+        if (!isBare)
+            Print({{"key", value.key}, field}, command.form);
+        else if (value.value)
+            Write(kiv::platform::Visible(*value.value) + '\n');
+        else
+            Note(value.key + " has no value" + (field.note.empty() ? "" : ": " + field.note));
+        return value.value ? Exit::Done : Exit::No;
+    }
+    throw Failure(Exit::Usage,
+        '"' + options.key + "\" is no key of this device" + DidYouMean(options.key, keys) + "; kivctl device get lists them");
 }
 
 Exit ShowDeviceKeys(const Command& command)
@@ -50,5 +136,23 @@ Exit ShowProfiles(const Command& command)
     for (const kiv::platform::Profile& profile : profiles)
         rows.push_back({{"name", profile.name}, {"description", profile.description}});
     PrintTable(rows, command.form);
+    return Exit::Done;
+}
+
+Exit ShowProfile(const ProfileOptions& options, const Command& command)
+{
+    const auto text = kiv::platform::TextOfProfile(options.name);
+    if (IsHost(options.name))
+        throw Failure(Exit::BadDevice, "the machine itself has no text; kivctl device get --profile host shows its values");
+    if (!text)
+        throw Failure(Exit::BadDevice,
+            '"' + options.name + "\" is no profile" + DidYouMean(options.name, ProfileNames()) + "; kivctl profiles lists them");
+    if (command.form.notation == Form::Notation::Text && command.form.fields.empty())
+    {
+        Write(*text);
+        return Exit::Done;
+    }
+    RequireNone(kiv::platform::UseProfile(options.name));
+    PrintTable(ValueRows(Identifiers::Shown), command.form);
     return Exit::Done;
 }

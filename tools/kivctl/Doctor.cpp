@@ -1,5 +1,6 @@
 #include "LibraryLog.h"
 #include "Progress.h"
+#include "StaleRecord.h"
 #include "Verbs.h"
 
 #include <BoardDaemon.h>
@@ -13,6 +14,7 @@
 #include <dlfcn.h>
 
 #include <cstdlib>
+#include <set>
 
 namespace
 {
@@ -23,6 +25,7 @@ struct Finding
     std::string text;
     std::string remedy = {};
 };
+using Findings = std::vector<Finding>;
 
 constexpr int kPatienceMs = 3000; ///< with a service that runs, but may be stuck
 
@@ -38,31 +41,70 @@ Finding LookAtBus(const Command&)
     return {where + ": " + MeaningOf(code), "start dbus-daemon, and have DBUS_SYSTEM_BUS_ADDRESS tell where it listens"};
 }
 
-Finding LookAtService(const char* busName, const std::string& program)
+/// A method of the bus itself. @return the reply; null when the bus refuses
+GVariant* AskBus(GDBusConnection* connection, const char* method, GVariant* arguments, GError** error = nullptr)
+{
+    return g_dbus_connection_call_sync(connection, "org.freedesktop.DBus", "/org/freedesktop/DBus", "org.freedesktop.DBus", method,
+        arguments, nullptr, G_DBUS_CALL_FLAGS_NONE, kPatienceMs, nullptr, error);
+}
+
+/// Whether the bus would let this user own a name that nobody owns. There is no other way to know than to take it for a moment.
+bool MayOwn(GDBusConnection* connection, const char* busName)
+{
+    constexpr guint kDoNotQueue = 4;
+    g_autoptr(GError) error = nullptr;
+    g_autoptr(GVariant) taken = AskBus(connection, "RequestName", g_variant_new("(su)", busName, kDoNotQueue), &error);
+    g_autoptr(GVariant) released = taken ? AskBus(connection, "ReleaseName", g_variant_new("(s)", busName)) : nullptr;
+    return !g_error_matches(error, G_DBUS_ERROR, G_DBUS_ERROR_ACCESS_DENIED);
+}
+
+/// A service of the device, and a call of it that changes nothing.
+struct Service
+{
+    const char* busName;
+    const char* path;
+    const char* interface;
+    const char* method;
+    bool isMadeByAgents; ///< the call
+    std::string program;
+};
+
+Finding LookAtService(const Service& service)
 {
     g_autoptr(GDBusConnection) connection = g_bus_get_sync(G_BUS_TYPE_SYSTEM, nullptr, nullptr);
     if (!connection)
-        return {"not asked without a bus", "mend the bus first"};
+        return {"not asked without a bus", "start the bus first"};
+    const std::string name = service.busName;
     g_autoptr(GError) error = nullptr;
-    g_autoptr(GVariant) reply = g_dbus_connection_call_sync(connection, busName, "/", "org.freedesktop.DBus.Peer", "Ping", nullptr,
-        nullptr, G_DBUS_CALL_FLAGS_NONE, kPatienceMs, nullptr, &error);
+    g_autoptr(GVariant) reply = g_dbus_connection_call_sync(connection, service.busName, service.path, service.interface,
+        service.method, nullptr, nullptr, G_DBUS_CALL_FLAGS_NONE, kPatienceMs, nullptr, &error);
     if (reply)
-        return {std::string(busName) + " answers"};
-    if (g_error_matches(error, G_DBUS_ERROR, G_DBUS_ERROR_SERVICE_UNKNOWN) ||
-        g_error_matches(error, G_DBUS_ERROR, G_DBUS_ERROR_NAME_HAS_NO_OWNER))
-        return {std::string(busName) + " is not on the bus", "start it: " + program + ", or kivctl services for both"};
+        return {name + " answers"};
+    g_autoptr(GVariant) owner = AskBus(connection, "GetNameOwner", g_variant_new("(s)", service.busName));
+    if (!owner && !MayOwn(connection, service.busName))
+        return {name + " is not on the bus, and the bus forbids this user to own it",
+            "start " + service.program + " as the user who may own it, or allow this user to own it in a bus policy"};
+    if (!owner)
+        return {name + " is not on the bus", "start it: " + service.program + ", or kivctl services for both"};
+    const bool isForbidden = g_error_matches(error, G_DBUS_ERROR, G_DBUS_ERROR_ACCESS_DENIED) != FALSE;
+    if (isForbidden && service.isMadeByAgents)
+        return {name + " is on the bus, but the bus forbids this user to call it",
+            "allow the calls of an agent in a bus policy, as the example kiv-agent.conf does"};
+    if (isForbidden)
+        return {name + " is on the bus, which forbids this user to ask whether it answers"};
     g_dbus_error_strip_remote_error(error);
-    return {std::string(busName) + " does not answer: " + error->message, "look at its process, and start it again"};
+    return {name + " does not answer: " + error->message, "look at its process, and start it again"};
 }
 
 Finding LookAtDeviceDaemon(const Command&)
 {
-    return LookAtService(kiv::BoardDaemon::kBusName, "kiv-board-daemon");
+    return LookAtService({kiv::BoardDaemon::kBusName, "/Org/Tizen/System/DeviceD/Board", "org.tizen.system.deviced.Board",
+        "GetSerial", true, "kiv-board-daemon"});
 }
 
 Finding LookAtServiceManager(const Command&)
 {
-    return LookAtService(kiv::ServiceManager::kBusName, "kiv-service-manager");
+    return LookAtService({kiv::ServiceManager::kBusName, "/", "org.freedesktop.DBus.Peer", "Ping", false, "kiv-service-manager"});
 }
 
 /// A daemon that the machine itself is known from. Asking does not start it.
@@ -70,7 +112,7 @@ Finding LookAtHostDaemon(const char* name, const std::string& unit, const char* 
 {
     g_autoptr(GDBusConnection) connection = g_bus_get_sync(G_BUS_TYPE_SYSTEM, nullptr, nullptr);
     if (!connection)
-        return {"not asked without a bus", "mend the bus first"};
+        return {"not asked without a bus", "start the bus first"};
     g_autoptr(GError) error = nullptr;
     g_autoptr(GVariant) reply = g_dbus_connection_call_sync(connection, interface, path, "org.freedesktop.DBus.Properties", "Get",
         g_variant_new("(ss)", interface, "Version"), G_VARIANT_TYPE("(v)"), G_DBUS_CALL_FLAGS_NO_AUTO_START, kPatienceMs, nullptr,
@@ -112,6 +154,43 @@ Finding LookAtStore(const Command&)
     return {reason.substr(0, end), reason.substr(end + 2)};
 }
 
+/// Adds the names that a method of the bus lists. @return whether the bus lets it
+bool AddNames(GDBusConnection* connection, const char* method, std::set<std::string>& names)
+{
+    g_autoptr(GVariant) reply = AskBus(connection, method, nullptr);
+    if (!reply)
+        return false;
+    g_autofree const char** list = nullptr;
+    g_variant_get(reply, "(^a&s)", &list);
+    for (const char** name = list; *name != nullptr; ++name)
+        names.insert(*name);
+    return true;
+}
+
+/// One finding for each record that reaches nobody. None without a bus and a store, of which there are others.
+Findings LookAtSubscribers(const Command&)
+{
+    std::vector<DASubscription> subscriptions;
+    std::string reason;
+    g_autoptr(GDBusConnection) connection = g_bus_get_sync(G_BUS_TYPE_SYSTEM, nullptr, nullptr);
+    if (!connection || DASubscriberStore().List(subscriptions, reason) != DASubscriberStore::Outcome::Done)
+        return {};
+    std::set<std::string> names;
+    if (!AddNames(connection, "ListNames", names) || !AddNames(connection, "ListActivatableNames", names))
+        return {{"not known: the bus forbids this user to list its names"}};
+    Findings findings;
+    for (const DASubscription& subscription : subscriptions)
+    {
+        const std::string& name = subscription.subscriber.busname;
+        if (names.count(name) == 0)
+            findings.push_back({subscription.kind + " " + subscription.key + ": nobody owns " + name + ", and nothing starts it",
+                "start the service, or remove its record: " + RemovalOf(subscription)});
+    }
+    if (findings.empty())
+        findings.push_back({subscriptions.empty() ? "none" : "each is on the bus, or is started by it"});
+    return findings;
+}
+
 Finding LookAtDevice(const Command& command)
 {
     const std::string trouble = UseDevice(command);
@@ -150,23 +229,30 @@ Finding LookAtPlatformLibrary(const Command&)
     return LookAtLibrary(&telephony_init);
 }
 
+template <Finding (*look)(const Command&)>
+Findings One(const Command& command)
+{
+    return {look(command)};
+}
+
 struct Check
 {
     const char* name;
-    Finding (*look)(const Command&);
+    Findings (*look)(const Command&);
     bool isForHost = false; ///< looked at only when the device is the machine itself
 };
 
 constexpr Check kChecks[] = {
-    {"bus", LookAtBus},
-    {"device daemon", LookAtDeviceDaemon},
-    {"service manager", LookAtServiceManager},
-    {"subscriber store", LookAtStore},
-    {"device", LookAtDevice},
-    {"ModemManager", LookAtModemManager, true},
-    {"NetworkManager", LookAtNetworkManager, true},
-    {"library", LookAtSystemLibrary},
-    {"platform", LookAtPlatformLibrary},
+    {"bus", One<LookAtBus>},
+    {"device daemon", One<LookAtDeviceDaemon>},
+    {"service manager", One<LookAtServiceManager>},
+    {"subscriber store", One<LookAtStore>},
+    {"subscribers", LookAtSubscribers},
+    {"device", One<LookAtDevice>},
+    {"ModemManager", One<LookAtModemManager>, true},
+    {"NetworkManager", One<LookAtNetworkManager>, true},
+    {"library", One<LookAtSystemLibrary>},
+    {"platform", One<LookAtPlatformLibrary>},
 };
 
 } // namespace
@@ -182,12 +268,14 @@ Exit Examine(const Command& command)
         if (check.isForHost && !isHost)
             continue;
         progress.Show(std::string("looking at the ") + check.name);
-        const Finding finding = check.look(command);
-        const bool isWell = finding.remedy.empty();
-        if (!isWell)
-            exit = Exit::No;
-        rows.push_back({{"check", check.name}, {"ok", isWell, "", isWell ? Tone::Good : Tone::Bad}, {"finding", finding.text},
-            isWell ? Missing("remedy", "") : Field{"remedy", finding.remedy}});
+        for (const Finding& finding : check.look(command))
+        {
+            const bool isWell = finding.remedy.empty();
+            if (!isWell)
+                exit = Exit::No;
+            rows.push_back({{"check", check.name}, {"ok", isWell, "", isWell ? Tone::Good : Tone::Bad}, {"finding", finding.text},
+                isWell ? Missing("remedy", "") : Field{"remedy", finding.remedy}});
+        }
     }
     progress.Show("");
     PrintTable(rows, command.form);

@@ -1,6 +1,5 @@
 #include "StaleRecord.h"
 
-#include <DASubscriberStore.h>
 #include <glib.h>
 
 #include <vector>
@@ -20,6 +19,15 @@ std::string ShellWord(const std::string& text)
 
 } // namespace
 
+std::string RemovalOf(const DASubscription& subscription)
+{
+    const _SubscriberInfo& who = subscription.subscriber;
+    std::string command = "kivctl subscribers remove";
+    for (const std::string& field : {subscription.kind, subscription.key, who.busname, who.objectpath, who.interface})
+        command += ' ' + ShellWord(field);
+    return command;
+}
+
 std::string DeliveryTrouble(const std::string& trouble, const std::string& kind, const std::string& key, const std::string& busName)
 {
     if (trouble.find("org.freedesktop.DBus.Error.ServiceUnknown") == trouble.npos &&
@@ -35,10 +43,8 @@ std::string DeliveryTrouble(const std::string& trouble, const std::string& kind,
             busName.empty() ? trouble.find("The name " + who.busname + " ") != trouble.npos : who.busname == busName;
         if (subscription.kind != kind || subscription.key != key || !isNamed)
             continue;
-        std::string command = "kivctl subscribers remove";
-        for (const std::string& field : {kind, key, who.busname, who.objectpath, who.interface})
-            command += ' ' + ShellWord(field);
-        return "nobody on the bus owns the name, and nothing starts it; start the service, or remove its record: " + command;
+        return "nobody on the bus owns the name, and nothing starts it; start the service, or remove its record: " +
+               RemovalOf(subscription);
     }
     return trouble;
 }

@@ -1,7 +1,12 @@
 #ifndef STALERECORD_H
 #define STALERECORD_H
 
+#include <DASubscriberStore.h>
+
 #include <string>
+
+/// The command that removes a subscription, for a shell.
+std::string RemovalOf(const DASubscription& subscription);
 
 /// Why a call to a subscriber failed, in words for the user: for a bus name that nobody owns, with the command that removes the
 /// record, which the store is asked for.

@@ -95,16 +95,20 @@ std::pair<CLI::App*, std::shared_ptr<Options>> AddVerb(CLI::App& app, Command& c
 }
 
 /// The same for a verb without options.
-void AddVerb(CLI::App& app, Command& command, const char* name, const char* help, Exit (*run)(const Command&), Traits traits = {})
+CLI::App* AddVerb(
+    CLI::App& app, Command& command, const char* name, const char* help, Exit (*run)(const Command&), Traits traits = {})
 {
-    AddToHelp(app, name, help)
-        ->callback(
-            [=, &command]
-            {
-                command.deviceUse = traits.deviceUse;
-                command.prints = traits.prints;
-                command.verb = [run, &command] { return run(command); };
-            });
+    CLI::App* verb = AddToHelp(app, name, help);
+    verb->callback(
+        [=, &command]
+        {
+            if (!verb->get_subcommands().empty())
+                return;
+            command.deviceUse = traits.deviceUse;
+            command.prints = traits.prints;
+            command.verb = [run, &command] { return run(command); };
+        });
+    return verb;
 }
 
 void AddShowIds(CLI::App* verb, Command& command, const char* help)
@@ -133,11 +137,26 @@ void AddDevice(CLI::App& app, Command& command)
         ->check(IsNumber);
     AddVerb(*device, command, "id", "Ask the device daemon on the bus for the device unique ID", ShowDeviceId);
 
-    const auto [set, assignments] = AddVerb(*device, command, "set", "Change values in the device file that --profile names",
-        SetInDeviceFile, {DeviceUse::Leaves, Prints::Events});
-    set->add_option("GROUP.KEY=VALUE", *assignments, "What to change, all of it or nothing (keys: kivctl device keys)")->required();
+    constexpr Traits kChangesFile{DeviceUse::Leaves, Prints::Events};
+    const auto [set, changes] =
+        AddVerb(*device, command, "set", "Change values in the device file that --profile names", SetInDeviceFile, kChangesFile);
+    set->add_option("GROUP.KEY=VALUE", changes->words, "What to change, all of it or nothing (keys: kivctl device keys)");
+    set->add_option("--from", changes->from, "Create the file from this profile (default: from the one in use)")
+        ->type_name("PROFILE");
+    const auto [unset, removals] = AddVerb(*device, command, "unset",
+        "Remove keys from the device file that --profile names, so that they have their defaults", UnsetInDeviceFile, kChangesFile);
+    unset->add_option("GROUP.KEY", removals->words, "What to remove, all of it or nothing")->required();
+    const auto [get, value] =
+        AddVerb(*device, command, "get", "Show the device's values as a device file holds them", ShowDeviceValues);
+    get->add_option("GROUP.KEY", value->key, "Print only this value");
+    AddShowIds(get, command, "List identifying values unmasked; with GROUP.KEY they always are");
     AddVerb(*device, command, "keys", "List what a device file may contain", ShowDeviceKeys, kWithoutDevice);
-    AddVerb(app, command, "profiles", "List the devices that --profile knows by name", ShowProfiles, kWithoutDevice);
+
+    CLI::App* const profiles =
+        AddVerb(app, command, "profiles", "List the devices that --profile knows by name", ShowProfiles, kWithoutDevice);
+    const auto [show, profile] =
+        AddVerb(*profiles, command, "show", "Print a profile in the form of a device file", ShowProfile, kWithoutDevice);
+    show->add_option("PROFILE", profile->name, "Name of the profile")->required();
 }
 
 void AddSim(CLI::App& app, Command& command)

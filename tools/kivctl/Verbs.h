@@ -35,10 +35,25 @@ Exit ShowDeviceId(const Command& command);
 
 /// @name DeviceFile.cpp
 /// @{
-Exit SetInDeviceFile(const std::vector<std::string>& assignments, const Command& command);
+struct DeviceFileOptions
+{
+    std::vector<std::string> words; ///< GROUP.KEY=VALUE to set, GROUP.KEY to unset
+    std::string from;               ///< profile that a new file starts from; empty for the one in use
+};
+struct DeviceValueOptions
+{
+    std::string key; ///< empty for all
+};
+struct ProfileOptions
+{
+    std::string name;
+};
+Exit SetInDeviceFile(const DeviceFileOptions& options, const Command& command);
+Exit UnsetInDeviceFile(const DeviceFileOptions& options, const Command& command);
+Exit ShowDeviceValues(const DeviceValueOptions& options, const Command& command);
 Exit ShowDeviceKeys(const Command& command);
 Exit ShowProfiles(const Command& command);
-std::vector<std::string> DeviceFileKeys(); ///< "GROUP.KEY", of the first slot where every slot has it
+Exit ShowProfile(const ProfileOptions& options, const Command& command);
 /// @}
 
 /// @name Doctor.cpp
