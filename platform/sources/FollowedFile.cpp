@@ -39,7 +39,7 @@ std::shared_ptr<LoopThread> FollowedFile::Follow()
     const auto watch = std::make_shared<std::unique_ptr<FileWatch>>();
     const auto setUp = [source = shared_from_this(), watch]
     { *watch = std::make_unique<FileWatch>(source->path_, [source](FileWatch::Look look) { return source->ReadAgain(look); }); };
-    return LoopThread::Start(setUp, [watch] { watch->reset(); });
+    return LoopThread::Start({setUp, [watch] { watch->reset(); }});
 }
 
 bool FollowedFile::ReadAgain(FileWatch::Look look)

@@ -7,17 +7,21 @@
 namespace kiv::platform
 {
 
-std::shared_ptr<LoopThread> LoopThread::Start(std::function<void()> setUp, std::function<void()> tearDown)
+std::shared_ptr<LoopThread> LoopThread::Start(Work work)
 {
     const auto loop = std::make_shared<LoopThread>();
     loop->thread_ = std::thread(
-        [loop, setUp = std::move(setUp), tearDown = std::move(tearDown)]
+        [loop, work = std::move(work)]
         {
             g_main_context_push_thread_default(loop->context_.get());
-            setUp();
+            work.setUp();
             while (!loop->ended_)
+            {
+                if (loop->poked_.exchange(false))
+                    work.poked();
                 g_main_context_iteration(loop->context_.get(), TRUE);
-            tearDown();
+            }
+            work.tearDown();
             while (g_main_context_iteration(loop->context_.get(), FALSE)) // what was cancelled comes to its end
                 continue;
             g_main_context_pop_thread_default(loop->context_.get());
@@ -40,16 +44,10 @@ void LoopThread::End()
         thread_.join();
 }
 
-void LoopThread::Invoke(std::function<void()> work)
+void LoopThread::Poke()
 {
-    using Work = std::function<void()>;
-    const auto run = [](gpointer held)
-    {
-        (*static_cast<Work*>(held))();
-        return G_SOURCE_REMOVE;
-    };
-    const auto release = [](gpointer held) { delete static_cast<Work*>(held); };
-    g_main_context_invoke_full(context_.get(), G_PRIORITY_DEFAULT, run, new Work(std::move(work)), release);
+    poked_ = true;
+    g_main_context_wakeup(context_.get());
 }
 
 } // namespace kiv::platform

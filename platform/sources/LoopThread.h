@@ -16,15 +16,21 @@ namespace kiv::platform
 class LoopThread
 {
 public:
-    /// Starts a thread that runs `setUp`, then iterates its context, which is its thread-default one, until End(), then runs
-    /// `tearDown`. What the functions hold lives until the thread is gone.
-    static std::shared_ptr<LoopThread> Start(std::function<void()> setUp, std::function<void()> tearDown);
+    /// What the thread does besides iterating its context, which is its thread-default one. What the functions hold lives until the
+    /// thread is gone.
+    struct Work
+    {
+        std::function<void()> setUp;
+        std::function<void()> tearDown;
+        std::function<void()> poked = [] {}; ///< once or more after each Poke()
+    };
+    static std::shared_ptr<LoopThread> Start(Work work);
 
     /// Ends the thread and waits until it is gone; within a callback of the device it does not wait. The last call.
     void End();
 
-    /// Has the thread run the function, soon. Any thread.
-    void Invoke(std::function<void()> work);
+    /// Has the thread do its work for that, soon. Any thread.
+    void Poke();
 
     /// False in a child of fork(), which has no copy of the thread.
     bool IsHere() const { return getpid() == process_; }
@@ -32,7 +38,7 @@ public:
 private:
     const std::unique_ptr<GMainContext, decltype(&g_main_context_unref)> context_{g_main_context_new(), g_main_context_unref};
     const pid_t process_ = getpid();
-    std::atomic<bool> ended_{false};
+    std::atomic<bool> ended_{false}, poked_{false};
     std::thread thread_;
 };
 

@@ -115,7 +115,7 @@ class Modem:
             self.radio_is_on = command == "AT+CFUN=1"
         if command == "AT+CFUN?":
             return f"\r\n+CFUN: {1 if self.radio_is_on else 4}\r\n\r\nOK\r\n"
-        if command.startswith("AT+CGDCONT=") or command.startswith("AT+CGACT="):
+        if command.startswith(("AT+CGDCONT=", "AT+CGACT=")) and not command.endswith("?"):
             return "\r\nOK\r\n"
         if command.startswith("ATD*99"):
             return "\r\nCONNECT\r\n"

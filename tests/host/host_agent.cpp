@@ -3,7 +3,7 @@
 //        host_agent SECONDS IMSI...  asks everything from six threads; fails when an answer is none that may be
 #include <DASystem.h>
 #include <DeviceControl.h>
-#include <IDAConnectionStateListener.h>
+#include <runtime_info.h>
 
 #include <algorithm>
 #include <atomic>
@@ -11,22 +11,12 @@
 #include <cstdio>
 #include <cstdlib>
 #include <iostream>
-#include <mutex>
 #include <sstream>
 #include <thread>
 #include <vector>
 
 namespace
 {
-
-struct Listener : IDAConnectionStateListener
-{
-    void OnWifiDeviceStateChanged(wifi_device_state_e, void*) override {}
-    void OnWifiConnectionStateChanged(wifi_connection_state_e, void*, void*) override {}
-    void OnFlightModeChanged(bool, void*) override {}
-    void OnPacketDataChanged(bool, void*) override {}
-    void OnWifiConnectedChanged(bool, void*) override {}
-};
 
 std::vector<std::string> Imsis()
 {
@@ -54,12 +44,10 @@ std::string Describe()
 
 int Stress(std::chrono::seconds duration, const std::vector<std::string>& imsis)
 {
-    static std::mutex registering; // the library asks for that much of an agent
     std::atomic<unsigned> wrong{0}, asked{0}, found{0};
     const auto end = std::chrono::steady_clock::now() + duration;
     const auto ask = [&](int thread)
     {
-        static Listener listener;
         DASystem* const system = DASystem::GetInstance();
         while (std::chrono::steady_clock::now() < end)
         {
@@ -76,11 +64,11 @@ int Stress(std::chrono::seconds duration, const std::vector<std::string>& imsis)
                 ++wrong;
             asked += 1;
             found += answers.empty() ? 0 : 1;
-            if (thread == 0)
+            if (thread == 0) // the platform's own registrations: the library's listener is for one thread
             {
-                const std::lock_guard lock(registering);
-                system->SetConnectionEventListener(&listener, nullptr);
-                system->SetConnectionEventListener(nullptr, nullptr);
+                runtime_info_set_changed_cb(
+                    RUNTIME_INFO_KEY_PACKET_DATA_ENABLED, [](runtime_info_key_e, void*) {}, nullptr);
+                runtime_info_unset_changed_cb(RUNTIME_INFO_KEY_PACKET_DATA_ENABLED);
             }
         }
     };

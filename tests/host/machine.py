@@ -28,7 +28,16 @@ plugins=keyfile
 dns=none
 auth-polkit=root-only
 [keyfile]
-unmanaged-devices=interface-name:kiv1;interface-name:kiv2
+unmanaged-devices=interface-name:kiv1;interface-name:ppp0;interface-name:kiv2
+"""
+# Reports a connection that is there, as the plugin of a pppd does; kernels of build machines have no PPP.
+PPPD = """#!/bin/bash
+while (($#)); do [[ $1 == ipparam ]] && path=$2; shift; done
+call() { gdbus call --system -d org.freedesktop.NetworkManager -o "$path" -m "org.freedesktop.NetworkManager.PPP.$1" "$2"; }
+call SetIfindex "$(ip -o link show ppp0 | cut -d: -f1)"
+call SetIp4Config "{'interface': <'ppp0'>, 'address': <uint32 67109056>, 'prefix': <uint32 32>}"
+trap 'exit 0' TERM
+while :; do sleep 0.1; done
 """
 
 
@@ -71,6 +80,8 @@ class Agent:
 
 
 class Machine(unittest.TestCase):
+    maxDiff = None
+
     def setUp(self):
         self.folder = tempfile.mkdtemp(prefix="kiv-machine-")
         self.processes = {}
@@ -263,6 +274,19 @@ class Machine(unittest.TestCase):
         self.assertLessEqual(agent.descriptors(), descriptors)
         self.assertEqual(0, agent.end())
 
+    def test_daemon_that_is_stuck_counts_as_absent_until_it_answers(self):
+        self.start_modem_manager()
+        self.plug(Modem("one"))
+        self.await_slots(card=["ready"])
+        self.processes["ModemManager"].send_signal(signal.SIGSTOP)
+        agent = Agent()
+        begin = time.monotonic()
+        self.assertEqual("", agent.ask()["imsi"])
+        self.assertLess(time.monotonic() - begin, 10, "it does not wait for the daemon")
+        self.processes["ModemManager"].send_signal(signal.SIGCONT)
+        until(lambda: agent.ask()["imsi"] == "310150123456789,", "it answers")
+        self.assertEqual(0, agent.end())
+
     def test_network_manager_decides_about_radios_and_connections(self):
         self.start_network_manager()
         self.start_modem_manager()
@@ -284,8 +308,13 @@ class Machine(unittest.TestCase):
             run("nmcli", "connection", "add", "type", "gsm", "ifname", "*", "con-name", "mobile", "apn", "internet",
                 "autoconnect", "no", "gsm.home-only", answer, check=True)
             until(lambda: agent.ask()["roaming"] == roaming, f"home-only is {answer}")
-        run("nmcli", "connection", "modify", "mobile", "gsm.home-only", "yes", check=True)
+        run("nmcli", "connection", "modify", "mobile", "gsm.home-only", "yes", "ipv6.method", "disabled", check=True)
         until(lambda: agent.ask()["roaming"] == "0", "home-only was changed")
+        run("nmcli", "connection", "up", "mobile", check=True)
+        until(lambda: agent.ask()["cellular"] == "5", "a data connection")
+        self.assertTrue(self.json("network", code=0)["connected"])
+        run("nmcli", "connection", "down", "mobile", check=True)
+        until(lambda: agent.ask()["cellular"] == "4", "no data connection any more")
         self.kill("NetworkManager")
         until(lambda: agent.ask()["mobile"] == "0", "NetworkManager is gone", 1)
         self.start_network_manager()
@@ -329,7 +358,7 @@ class Machine(unittest.TestCase):
         self.assertTrue(self.json("network", "--wifi", code=0)["connected"])
         update(device, f"{NM}.Device", State="uint32 120")
         update(manager, NM, WirelessEnabled="false")
-        until(lambda: self.watched()[-1] == "wifi_connected value=no", "all radios are off")
+        until(lambda: len(self.watched()) >= 12, "all radios are off")
         self.assertEqual(
             ["ready", "wifi_device value='on'", "wifi_connected value=no", "wifi_connection value='associating'",
              "wifi_connection value='configuring'", "wifi_connection value='connected'", "wifi_connected value=yes",
@@ -374,13 +403,18 @@ def enter_namespace():
         set -e
         mount --make-rprivate /
         mount -t sysfs -o ro sysfs /sys
-        for folder in /etc/NetworkManager /var/lib/NetworkManager /run/NetworkManager; do
+        for folder in /etc/NetworkManager /var/lib/NetworkManager /run/NetworkManager /usr/local/sbin; do
             mkdir -p $folder
             mount -t tmpfs tmpfs $folder
         done
         ip link set lo up
         ip link add kiv0 type veth peer name kiv1
-        ip link set kiv1 up"""
+        ip link add ppp0 type veth peer name kiv2
+        ip link set kiv1 up
+        ip link set kiv2 up
+        printf %s "$PPPD" >/usr/local/sbin/pppd
+        chmod +x /usr/local/sbin/pppd"""
+    os.environ["PPPD"] = PPPD
     if run("unshare", "-n", "-m", "bash", "-c", set_up).returncode == 0:
         os.environ[HOLDER] = "yes"
         os.execvp("unshare", ["unshare", "-n", "-m", "bash", "-c", set_up + '\nexec "$@"', "bash", sys.executable, *sys.argv])

@@ -2,7 +2,10 @@
 #include <ITapiSim.h>
 #include <net_connection.h>
 #include <package_info.h>
+#include <runtime_info.h>
+#include <sys/wait.h>
 #include <telephony.h>
+#include <unistd.h>
 #include <wifi.h>
 
 using namespace kiv::platform;
@@ -27,6 +30,55 @@ TEST(Handles, AreReportedWhileTheyAreOpen)
         {telephony_deinit(&list), tel_deinit(modem), package_info_destroy(package), connection_destroy(connection)})
         EXPECT_EQ(0, result);
     EXPECT_THAT(OpenHandles(), testing::IsEmpty());
+}
+
+TEST(Handles, FollowTheirModemToAnotherSlot)
+{
+    ResetDevice();
+    TapiHandle* const modem = tel_init("modem1");
+    const auto mcc = [modem]
+    {
+        TelSimImsiInfo_t record{};
+        return tel_get_sim_imsi(modem, &record) == 0 ? std::string(record.szMcc) : "none";
+    };
+    EXPECT_EQ("262", mcc());
+    for (const char* expected : {"262", "none"}) // unplugged, one after the other
+    {
+        ChangeDevice([](Device& device) { device.slots.erase(device.slots.begin()); });
+        EXPECT_EQ(expected, mcc());
+    }
+    EXPECT_EQ(0, tel_deinit(modem));
+    ResetDevice();
+}
+
+TEST(Fork, LeavesNoLockHeldInTheChild)
+{
+    constexpr auto kKey = RUNTIME_INFO_KEY_FLIGHT_MODE_ENABLED;
+    EXPECT_EQ(0, runtime_info_set_changed_cb(
+                     kKey, [](runtime_info_key_e, void*) { std::this_thread::yield(); }, nullptr));
+    std::atomic<bool> isOver{false};
+    std::thread changer(
+        [&]
+        {
+            while (!isOver)
+                ChangeDevice([](Device& device) { device.flightMode = !device.flightMode; });
+        });
+    for (int i = 0; i < 100; ++i)
+    {
+        const pid_t child = fork();
+        if (child == 0)
+        {
+            alarm(20); // which ends one that hangs
+            bool isOn = false;
+            _exit(runtime_info_get_value_bool(kKey, &isOn) == 0 && runtime_info_unset_changed_cb(kKey) == 0 ? 0 : 1);
+        }
+        int status = -1;
+        waitpid(child, &status, 0);
+        EXPECT_EQ(0, status);
+    }
+    isOver = true;
+    changer.join();
+    ResetDevice();
 }
 
 TEST(Wifi, RefusesCallbacksUntilItIsInitialized)

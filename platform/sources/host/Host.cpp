@@ -39,7 +39,7 @@ Origin Host::Open()
     const auto host = std::make_shared<Host>();
     host->files_.Read(host->latest_);
     Describe({}, host->latest_);
-    host->thread_ = LoopThread::Start([host] { host->Connect(); }, [host] { host->Disconnect(); });
+    host->thread_ = LoopThread::Start({[host] { host->Connect(); }, [host] { host->Disconnect(); }, [host] { host->Publish(); }});
 
     std::unique_lock lock(host->mutex_);
     host->isComplete_.wait_for(lock, kPatience, [&] { return host->complete_; });
@@ -55,7 +55,7 @@ try
     if (Locked(TheState())->source.get() == this)
     {
         if (!inUse_.exchange(true)) // what changed before that has not been put in place
-            thread_->Invoke([host = shared_from_this()] { host->Publish(); });
+            thread_->Poke();
         return;
     }
     g_cancellable_cancel(cancellable_);
@@ -98,17 +98,18 @@ void Host::Connect()
         bluetooth_ = std::make_unique<RemoteObjects>(connection_, kBluez, reports_.bluetooth, publish);
         return;
     }
-    retry_ = g_timeout_source_new(kReconnectMs);
-    g_source_set_callback(retry_, OnRetry, this, nullptr);
-    g_source_attach(retry_, g_main_context_get_thread_default());
+    const auto connect = [](gpointer self) -> gboolean
+    {
+        static_cast<Host*>(self)->Connect();
+        return G_SOURCE_REMOVE;
+    };
+    retry_ = StartTimer(kReconnectMs, connect, this);
     Publish();
 }
 
 void Host::Disconnect()
 {
-    if (retry_ != nullptr)
-        g_source_destroy(retry_);
-    g_clear_pointer(&retry_, g_source_unref);
+    retry_.reset();
     if (connection_ == nullptr)
         return;
     modems_.reset();
@@ -124,14 +125,6 @@ void Host::OnClosed(GDBusConnection* /*connection*/, gboolean /*byPeer*/, GError
     auto& host = *static_cast<Host*>(self);
     host.Disconnect();
     host.Connect();
-}
-
-gboolean Host::OnRetry(gpointer self)
-{
-    auto& host = *static_cast<Host*>(self);
-    g_clear_pointer(&host.retry_, g_source_unref);
-    host.Connect();
-    return G_SOURCE_REMOVE;
 }
 
 void Host::Publish()

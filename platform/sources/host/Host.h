@@ -20,7 +20,7 @@ constexpr char kHostDescription[] = "the machine itself: its modems, its connect
 
 /// Keeps the device as ModemManager, NetworkManager and BlueZ report it, on a thread of its own and over a bus connection of its
 /// own. A child of fork() has no copy of the thread: it answers from what was known at that moment.
-class Host : public Source, public std::enable_shared_from_this<Host>
+class Host : public Source
 {
 public:
     /// Waits until everything was read, at most two seconds: a service that has not answered by then counts as absent until it
@@ -40,7 +40,6 @@ private:
     void Disconnect();
     void Publish();
     static void OnClosed(GDBusConnection* connection, gboolean byPeer, GError* error, gpointer self);
-    static gboolean OnRetry(gpointer self);
 
     const HostFiles files_{""};
     std::shared_ptr<LoopThread> thread_;
@@ -50,7 +49,7 @@ private:
 
     // Of the thread alone.
     GDBusConnection* connection_ = nullptr;
-    GSource* retry_ = nullptr;
+    Timer retry_;
     Reports reports_;
     std::unique_ptr<RemoteObjects> modems_, network_, bluetooth_;
 

@@ -8,73 +8,77 @@ namespace kiv::platform
 namespace
 {
 
-constexpr char kManager[] = "org.freedesktop.DBus.ObjectManager";
-constexpr char kProperties[] = "org.freedesktop.DBus.Properties";
+constexpr char kBus[] = "org.freedesktop.DBus";
 constexpr guint kRetryMs = 250;
 constexpr int kPatienceMs = 10000; // with an answer
 
-Variant Own(GVariant* variant)
+Variant Child(GVariant* container, gsize index)
 {
-    return {variant, g_variant_unref};
+    return {g_variant_get_child_value(container, index), g_variant_unref};
+}
+
+const char* StringOf(const Variant& variant)
+{
+    return g_variant_get_string(variant.get(), nullptr);
 }
 
 } // namespace
 
-// One call that is under way; the owner of the name that it was sent to may change meanwhile.
+Timer StartTimer(guint milliseconds, GSourceFunc function, gpointer data)
+{
+    Timer timer(g_timeout_source_new(milliseconds));
+    g_source_set_callback(timer.get(), function, data, nullptr);
+    g_source_attach(timer.get(), g_main_context_get_thread_default());
+    return timer;
+}
+
+// One call that is under way; who asked may be gone when it was cancelled.
 struct RemoteObjects::Question
 {
     RemoteObjects* self;
     std::string path;
+    TakeReply take;
 };
 
+// GDBus complains about a match rule that it cannot send because the bus has just died; here, nothing comes of it.
 RemoteObjects::RemoteObjects(
     GDBusConnection* connection, const ServiceName& service, ServiceReport& report, std::function<void()> changed)
-    : connection_(connection), service_(service), report_(report), changed_(std::move(changed))
+    : connection_(connection),
+      service_(service),
+      report_(report),
+      changed_(std::move(changed)),
+      subscription_(g_dbus_connection_signal_subscribe(
+          connection, nullptr, nullptr, nullptr, nullptr, nullptr, G_DBUS_SIGNAL_FLAGS_NO_MATCH_RULE, OnSignal, this, nullptr)),
+      cancellable_(g_cancellable_new())
 {
-    watch_ = g_bus_watch_name_on_connection(
-        connection_, service_.name, G_BUS_NAME_WATCHER_FLAGS_NONE, OnAppeared, OnVanished, this, nullptr);
+    const std::string sender = std::string("sender='") + service_.name + "',";
+    for (const char* const* interface = service_.interfaces; *interface != nullptr; ++interface)
+        Match(sender + "member='PropertiesChanged',arg0='" + *interface + "'");
+    Match(sender + "interface='org.freedesktop.DBus.ObjectManager'");
+    Match(sender + "member='Updated'"); // settings of a connection
+    Match(std::string("sender='org.freedesktop.DBus',member='NameOwnerChanged',arg0='") + service_.name + "'");
+    Ask(kBus, "/", {kBus, "GetNameOwner", service_.name}, &RemoteObjects::TakeOwner);
 }
 
 RemoteObjects::~RemoteObjects()
 {
-    g_bus_unwatch_name(watch_);
+    g_dbus_connection_signal_unsubscribe(connection_, subscription_);
     Forget();
+    g_object_unref(cancellable_);
 }
 
-void RemoteObjects::OnAppeared(GDBusConnection* /*connection*/, const char* /*name*/, const char* owner, gpointer self)
+void RemoteObjects::Match(const std::string& rule)
 {
-    auto& objects = *static_cast<RemoteObjects*>(self);
-    objects.Forget();
-    objects.owner_ = owner;
-    objects.cancellable_ = g_cancellable_new();
-    for (const char* const* interface = objects.service_.interfaces; *interface != nullptr; ++interface)
-        objects.Subscribe(kProperties, "PropertiesChanged", nullptr, *interface);
-    objects.Subscribe(kManager, "InterfacesAdded", objects.service_.manager, nullptr);
-    objects.Subscribe(kManager, "InterfacesRemoved", objects.service_.manager, nullptr);
-    objects.Subscribe(nullptr, "Updated", nullptr, nullptr); // of a connection's settings
-    objects.Ask(objects.service_.manager, {kManager, "GetManagedObjects", nullptr});
+    g_dbus_connection_call(connection_, kBus, "/org/freedesktop/DBus", kBus, "AddMatch",
+        g_variant_new("(s)", ("type='signal'," + rule).c_str()), nullptr, G_DBUS_CALL_FLAGS_NONE, -1, nullptr, nullptr, nullptr);
 }
 
-void RemoteObjects::OnVanished(GDBusConnection* /*connection*/, const char* /*name*/, gpointer self)
-{
-    auto& objects = *static_cast<RemoteObjects*>(self);
-    objects.Forget();
-    objects.isKnown_ = true;
-    objects.changed_();
-}
-
-void RemoteObjects::Subscribe(const char* interface, const char* signal, const char* path, const char* argument)
-{
-    subscriptions_.push_back(g_dbus_connection_signal_subscribe(
-        connection_, owner_.c_str(), interface, signal, path, argument, G_DBUS_SIGNAL_FLAGS_NONE, OnSignal, this, nullptr));
-}
-
-void RemoteObjects::Ask(const std::string& path, const DetailCall& call)
+void RemoteObjects::Ask(const char* destination, const std::string& path, const DetailCall& call, TakeReply take)
 {
     ++pending_;
     GVariant* const arguments = call.argument != nullptr ? g_variant_new("(s)", call.argument) : nullptr;
-    g_dbus_connection_call(connection_, owner_.c_str(), path.c_str(), call.interface, call.method, arguments, nullptr,
-        G_DBUS_CALL_FLAGS_NO_AUTO_START, kPatienceMs, cancellable_, OnReply, new Question{this, path});
+    g_dbus_connection_call(connection_, destination, path.c_str(), call.interface, call.method, arguments, nullptr,
+        G_DBUS_CALL_FLAGS_NO_AUTO_START, kPatienceMs, cancellable_, OnReply, new Question{this, path, take});
 }
 
 void RemoteObjects::OnReply(GObject* connection, GAsyncResult* result, gpointer asked)
@@ -82,132 +86,132 @@ void RemoteObjects::OnReply(GObject* connection, GAsyncResult* result, gpointer 
     const std::unique_ptr<Question> question(static_cast<Question*>(asked));
     g_autoptr(GError) error = nullptr;
     g_autoptr(GVariant) reply = g_dbus_connection_call_finish(G_DBUS_CONNECTION(connection), result, &error);
-    if (g_error_matches(error, G_IO_ERROR, G_IO_ERROR_CANCELLED) != FALSE) // and who asked may be gone
+    if (g_error_matches(error, G_IO_ERROR, G_IO_ERROR_CANCELLED) != FALSE)
         return;
-
-    RemoteObjects& self = *question->self;
-    --self.pending_;
-    if (question->path != self.service_.manager)
-    {
-        if (self.wanted_.count(question->path) == 0)
-            return;
-        self.report_.objects[question->path]; // it was read, though perhaps with nothing in it
-        if (reply != nullptr)
-            self.Take(question->path, reply);
-    }
-    else if (reply != nullptr)
-    {
-        self.isKnown_ = true;
-        self.report_.presence = Presence::Present;
-        self.Take(question->path, reply);
-    }
-    else if (g_error_matches(error, G_DBUS_ERROR, G_DBUS_ERROR_ACCESS_DENIED) != FALSE)
-    {
-        self.isKnown_ = true;
-        self.report_.presence = Presence::Denied;
-    }
-    else // one that is about to be there, or to be gone
-    {
-        self.retry_ = g_timeout_source_new(kRetryMs);
-        g_source_set_callback(self.retry_, AskAgain, &self, nullptr);
-        g_source_attach(self.retry_, g_main_context_get_thread_default());
-        return;
-    }
-    self.changed_();
+    --question->self->pending_;
+    (question->self->*question->take)(question->path, reply, error);
 }
 
-gboolean RemoteObjects::AskAgain(gpointer self)
+void RemoteObjects::TakeOwner(const std::string& /*path*/, GVariant* reply, const GError* /*error*/)
 {
-    auto& objects = *static_cast<RemoteObjects*>(self);
-    g_source_unref(std::exchange(objects.retry_, nullptr));
-    objects.Ask(objects.service_.manager, {kManager, "GetManagedObjects", nullptr});
-    return G_SOURCE_REMOVE;
+    SetOwner(reply != nullptr ? StringOf(Child(reply, 0)) : "");
 }
 
-// Takes a reply over: the objects of a manager, the groups of a connection, or the properties of an interface.
-void RemoteObjects::Take(const std::string& path, GVariant* reply)
+void RemoteObjects::SetOwner(const std::string& owner)
 {
-    const Variant content = Own(g_variant_get_child_value(reply, 0));
-    GVariantIter entries;
-    const char* key = nullptr;
-    GVariant* value = nullptr;
-    g_variant_iter_init(&entries, content.get());
-    if (g_variant_is_of_type(content.get(), G_VARIANT_TYPE("a{oa{sa{sv}}}")) != FALSE)
+    Forget();
+    owner_ = owner;
+    if (!owner_.empty())
+        return AskForObjects();
+    isKnown_ = true;
+    changed_();
+}
+
+void RemoteObjects::AskForObjects()
+{
+    Ask(owner_.c_str(), service_.manager, {"org.freedesktop.DBus.ObjectManager", "GetManagedObjects", nullptr},
+        &RemoteObjects::TakeObjects);
+}
+
+void RemoteObjects::TakeObjects(const std::string& /*path*/, GVariant* reply, const GError* error)
+{
+    const bool isDenied = g_error_matches(error, G_DBUS_ERROR, G_DBUS_ERROR_ACCESS_DENIED) != FALSE;
+    if (reply == nullptr && !isDenied) // from one that is about to be there, or is stuck
     {
-        while (g_variant_iter_loop(&entries, "{&o@a{sa{sv}}}", &key, &value) != FALSE)
+        const auto askAgain = [](gpointer self) -> gboolean
         {
-            const Variant object = Own(g_variant_ref_sink(g_variant_new("(@a{sa{sv}})", value)));
-            Take(key, object.get());
-        }
+            static_cast<RemoteObjects*>(self)->AskForObjects();
+            return G_SOURCE_REMOVE;
+        };
+        retry_ = StartTimer(kRetryMs, askAgain, this);
+        return;
     }
-    else if (g_variant_is_of_type(content.get(), G_VARIANT_TYPE("a{sa{sv}}")) != FALSE)
+    isKnown_ = true;
+    report_.presence = isDenied ? Presence::Denied : Presence::Present;
+    const Variant objects = isDenied ? nullptr : Child(reply, 0);
+    for (gsize i = 0; objects != nullptr && i < g_variant_n_children(objects.get()); ++i)
     {
-        while (g_variant_iter_loop(&entries, "{&s@a{sv}}", &key, &value) != FALSE)
-            if (Matters(key))
-                TakeProperties(path, key, value);
+        const Variant object = Child(objects.get(), i);
+        TakeInterfaces(StringOf(Child(object.get(), 0)), Child(object.get(), 1).get());
     }
-    else if (const auto call = wanted_.find(path); call != wanted_.end())
+    changed_();
+}
+
+void RemoteObjects::TakeDetail(const std::string& path, GVariant* reply, const GError* /*error*/)
+{
+    const auto call = wanted_.find(path);
+    if (call == wanted_.end())
+        return;
+    report_.objects[path]; // it was read, though perhaps with nothing in it
+    if (reply != nullptr && call->second.argument != nullptr)
+        TakeProperties(path, call->second.argument, Child(reply, 0).get());
+    else if (reply != nullptr)
+        TakeInterfaces(path, Child(reply, 0).get());
+    changed_();
+}
+
+void RemoteObjects::TakeInterfaces(const std::string& path, GVariant* interfaces)
+{
+    for (gsize i = 0; i < g_variant_n_children(interfaces); ++i)
     {
-        TakeProperties(path, call->second.argument, content.get());
+        const Variant entry = Child(interfaces, i);
+        const Variant name = Child(entry.get(), 0);
+        if (g_strv_contains(service_.interfaces, StringOf(name)) != FALSE)
+            TakeProperties(path, StringOf(name), Child(entry.get(), 1).get());
     }
 }
 
 void RemoteObjects::TakeProperties(const std::string& path, const char* interface, GVariant* properties)
 {
     Properties& known = report_.objects[path][interface];
-    GVariantIter entries;
-    const char* name = nullptr;
-    GVariant* value = nullptr;
-    g_variant_iter_init(&entries, properties);
-    while (g_variant_iter_next(&entries, "{&sv}", &name, &value) != FALSE)
-        known[name] = Own(value);
+    for (gsize i = 0; i < g_variant_n_children(properties); ++i)
+    {
+        const Variant entry = Child(properties, i);
+        const Variant name = Child(entry.get(), 0);
+        if (g_strv_contains(kUsedProperties, StringOf(name)) != FALSE)
+            known[StringOf(name)] = Variant(g_variant_get_variant(Child(entry.get(), 1).get()), g_variant_unref);
+    }
 }
 
-void RemoteObjects::OnSignal(GDBusConnection* /*connection*/, const char* /*sender*/, const char* path, const char* /*interface*/,
-    const char* name, GVariant* arguments, gpointer self)
+void RemoteObjects::OnSignal(GDBusConnection* /*connection*/, const char* sender, const char* path, const char* /*interface*/,
+    const char* signal, GVariant* arguments, gpointer self)
 {
     auto& objects = *static_cast<RemoteObjects*>(self);
-    const std::string signal = name;
-    const auto hasType = [arguments](const char* type) { return g_variant_is_of_type(arguments, G_VARIANT_TYPE(type)) != FALSE; };
-    Objects& known = objects.report_.objects;
-    const char* object = nullptr;
-    if (objects.report_.presence != Presence::Present) // what changed is in the answer that is on its way
-        return;
+    if (sender == objects.owner_)
+        return objects.TakeSignal(signal, path, arguments);
+    const bool isOfBus = g_str_equal(sender, kBus) && g_str_equal(signal, "NameOwnerChanged");
+    if (isOfBus && g_str_equal(StringOf(Child(arguments, 0)), objects.service_.name))
+        objects.SetOwner(StringOf(Child(arguments, 2)));
+}
 
-    if (signal == "PropertiesChanged" && hasType("(sa{sv}as)") && known.count(path) != 0)
+void RemoteObjects::TakeSignal(const std::string& signal, const std::string& path, GVariant* arguments)
+{
+    const auto hasType = [arguments](const char* type) { return g_variant_is_of_type(arguments, G_VARIANT_TYPE(type)) != FALSE; };
+    Objects& objects = report_.objects;
+    if (report_.presence != Presence::Present) // what changed is in the answer that is on its way
+        return;
+    if (signal == "PropertiesChanged" && hasType("(sa{sv}as)") && objects.count(path) != 0)
     {
-        const char* interface = nullptr;
-        GVariant* changed = nullptr;
-        g_autofree const char** invalidated = nullptr;
-        g_variant_get(arguments, "(&s@a{sv}^a&s)", &interface, &changed, &invalidated);
-        const Variant owner = Own(changed);
-        objects.TakeProperties(path, interface, changed);
-        for (const char** each = invalidated; *each != nullptr; ++each)
-            known[path][interface].erase(*each);
+        TakeProperties(path, StringOf(Child(arguments, 0)), Child(arguments, 1).get());
     }
     else if (signal == "InterfacesAdded" && hasType("(oa{sa{sv}})"))
     {
-        GVariant* interfaces = nullptr;
-        g_variant_get(arguments, "(&o@a{sa{sv}})", &object, &interfaces);
-        const Variant wrapped = Own(g_variant_ref_sink(g_variant_new("(@a{sa{sv}})", interfaces)));
-        g_variant_unref(interfaces);
-        objects.Take(object, wrapped.get());
+        TakeInterfaces(StringOf(Child(arguments, 0)), Child(arguments, 1).get());
     }
     else if (signal == "InterfacesRemoved" && hasType("(oas)"))
     {
-        g_autofree const char** interfaces = nullptr;
-        g_variant_get(arguments, "(&o^a&s)", &object, &interfaces);
-        for (const char** each = interfaces; *each != nullptr; ++each)
-            known[object].erase(*each);
-        if (known[object].empty())
-            known.erase(object);
+        const auto object = objects.find(StringOf(Child(arguments, 0)));
+        const Variant interfaces = Child(arguments, 1);
+        for (gsize i = 0; object != objects.end() && i < g_variant_n_children(interfaces.get()); ++i)
+            object->second.erase(StringOf(Child(interfaces.get(), i)));
+        if (object != objects.end() && object->second.empty())
+            objects.erase(object);
     }
-    else if (const auto call = objects.wanted_.find(path); signal == "Updated" && call != objects.wanted_.end())
+    else if (const auto call = wanted_.find(path); signal == "Updated" && call != wanted_.end())
     {
-        objects.Ask(path, call->second);
-        return;
+        return Ask(owner_.c_str(), path, call->second, &RemoteObjects::TakeDetail);
     }
-    objects.changed_();
+    changed_();
 }
 
 void RemoteObjects::Want(Calls details)
@@ -218,29 +222,18 @@ void RemoteObjects::Want(Calls details)
             report_.objects.erase(path);
     for (const auto& [path, call] : wanted_)
         if (before.count(path) == 0)
-            Ask(path, call);
+            Ask(owner_.c_str(), path, call, &RemoteObjects::TakeDetail);
 }
 
 void RemoteObjects::Forget()
 {
-    for (const guint subscription : std::exchange(subscriptions_, {}))
-        g_dbus_connection_signal_unsubscribe(connection_, subscription);
-    if (cancellable_ != nullptr)
-        g_cancellable_cancel(cancellable_);
-    g_clear_object(&cancellable_);
-    if (retry_ != nullptr)
-        g_source_destroy(retry_);
-    g_clear_pointer(&retry_, g_source_unref);
+    g_cancellable_cancel(cancellable_);
+    g_object_unref(std::exchange(cancellable_, g_cancellable_new()));
+    retry_.reset();
     report_ = {};
     wanted_.clear();
-    owner_.clear();
     isKnown_ = false;
     pending_ = 0;
-}
-
-bool RemoteObjects::Matters(const char* interface) const
-{
-    return g_strv_contains(service_.interfaces, interface) != FALSE;
 }
 
 } // namespace kiv::platform

@@ -10,7 +10,6 @@
 #include <map>
 #include <memory>
 #include <string>
-#include <vector>
 
 namespace kiv::platform
 {
@@ -23,9 +22,22 @@ struct ServiceName
     const char* interfaces[5]; ///< those whose properties matter, and a null
 };
 
-/// Of one service, over one connection; for one thread, whose thread-default main context it uses. Never blocks, and never starts
-/// the service. (GDBusObjectManagerClient reads the objects of a service that came back in a call that blocks, for up to 25
-/// seconds, and prints a warning when that fails.)
+struct EndOfTimer
+{
+    void operator()(GSource* source) const
+    {
+        g_source_destroy(source);
+        g_source_unref(source);
+    }
+};
+using Timer = std::unique_ptr<GSource, EndOfTimer>;
+
+/// Has the thread's default context call the function once.
+Timer StartTimer(guint milliseconds, GSourceFunc function, gpointer data);
+
+/// Of one service, over one connection; for one thread, whose default context it uses. Never blocks, never starts the service, and
+/// goes on when the connection dies. (GDBusObjectManagerClient reads the objects of a service that came back in a call that blocks
+/// for up to 25 seconds, and prints a warning when that fails or the bus is gone.)
 class RemoteObjects
 {
 public:
@@ -46,35 +58,37 @@ public:
     void Want(Calls details);
 
 private:
+    using TakeReply = void (RemoteObjects::*)(const std::string& path, GVariant* reply, const GError* error);
     struct Question;
 
-    static void OnAppeared(GDBusConnection* connection, const char* name, const char* owner, gpointer self);
-    static void OnVanished(GDBusConnection* connection, const char* name, gpointer self);
     static void OnSignal(GDBusConnection* connection, const char* sender, const char* path, const char* interface,
         const char* signal, GVariant* arguments, gpointer self);
     static void OnReply(GObject* connection, GAsyncResult* result, gpointer question);
-    static gboolean AskAgain(gpointer self);
 
-    void Subscribe(const char* interface, const char* signal, const char* path, const char* argument);
-    void Ask(const std::string& path, const DetailCall& call);
-    void Take(const std::string& path, GVariant* reply);
+    void Match(const std::string& rule);
+    void Ask(const char* destination, const std::string& path, const DetailCall& call, TakeReply take);
+    void AskForObjects();
+    void SetOwner(const std::string& owner);
+    void TakeOwner(const std::string& path, GVariant* reply, const GError* error);
+    void TakeObjects(const std::string& path, GVariant* reply, const GError* error);
+    void TakeDetail(const std::string& path, GVariant* reply, const GError* error);
+    void TakeInterfaces(const std::string& path, GVariant* interfaces);
     void TakeProperties(const std::string& path, const char* interface, GVariant* properties);
+    void TakeSignal(const std::string& signal, const std::string& path, GVariant* arguments);
     void Forget();
-    bool Matters(const char* interface) const;
 
     GDBusConnection* const connection_;
     const ServiceName& service_;
     ServiceReport& report_;
     const std::function<void()> changed_;
+    const guint subscription_;
 
     std::string owner_; // unique name on the bus; empty while there is none
     bool isKnown_ = false;
     unsigned pending_ = 0;
     Calls wanted_;
-    GCancellable* cancellable_ = nullptr; // of the questions to the owner
-    GSource* retry_ = nullptr;
-    std::vector<guint> subscriptions_;
-    guint watch_ = 0;
+    GCancellable* cancellable_ = nullptr; // of what was asked of the owner
+    Timer retry_;
 };
 
 } // namespace kiv::platform

@@ -472,6 +472,11 @@ void GiveReasons(const Reports& reports, Device& device)
 
 } // namespace
 
+const char* const kUsedProperties[] = {"AccessTechnologies", "ActiveConnection", "AvailableConnections", "Connection", "Device",
+    "DeviceType", "EquipmentIdentifier", "Imsi", "OperatorCode", "OperatorIdentifier", "OwnNumbers", "PowerState", "Powered",
+    "PrimaryConnectionType", "PrimaryPort", "RegistrationState", "Sim", "State", "StateFailedReason", "Udi", "UnlockRequired",
+    "WirelessEnabled", "WirelessHardwareEnabled", "WwanEnabled", "WwanHardwareEnabled", "home-only", nullptr};
+
 std::map<std::string, DetailCall> DetailsOfModems(const Objects& modems)
 {
     std::map<std::string, DetailCall> calls;

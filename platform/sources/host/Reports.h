@@ -36,6 +36,9 @@ struct Reports
     ServiceReport modems, network, bluetooth; ///< of ModemManager, NetworkManager, BlueZ
 };
 
+/// Names of the properties that anything here reads, and a null; others need not be kept.
+extern const char* const kUsedProperties[];
+
 /// A method call that reads an object.
 struct DetailCall
 {
