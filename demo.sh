@@ -1,6 +1,7 @@
 #!/bin/bash
 # Builds the library with the simulated device, and shows both at work on a message bus of its own: the device, its SIMs, countries,
-# notifications, push messages, and a change of the network that a watcher hears of. Whatever it starts it stops.
+# notifications, push messages, and a change of the network that a watcher hears of; then the machine itself. Whatever it starts it
+# stops.
 set -euo pipefail
 here=$(dirname "$(readlink -f "$0")")
 cd "$here"
@@ -201,6 +202,15 @@ show_watch()
     saw watcher
 }
 
+# The machine that this runs on: its own bus, and the daemons of it, if there are any.
+show_machine()
+{
+    title "This machine"
+    unset DBUS_SYSTEM_BUS_ADDRESS
+    show device --profile host
+    show network --profile host
+}
+
 .ci/install-missing build
 build
 work=$(mktemp -d)
@@ -213,3 +223,4 @@ show_countries
 show_notifications
 show_push
 show_watch
+show_machine
