@@ -19,7 +19,7 @@ Process StartProgram(std::vector<const char*> command)
     command.push_back(nullptr);
     Process process(g_subprocess_launcher_spawnv(launcher, command.data(), &error));
     char ready = 0;
-    if (!process || g_input_stream_read(g_subprocess_get_stdout_pipe(process.get()), &ready, 1, nullptr, &error) != 1)
+    if (process == nullptr || g_input_stream_read(g_subprocess_get_stdout_pipe(process.get()), &ready, 1, nullptr, &error) != 1)
         throw std::runtime_error(std::string(command[0]) + ": " + (error == nullptr ? "ended" : error->message));
     return process;
 }
@@ -64,7 +64,7 @@ Connection BusDaemon::Connect() const
         G_DBUS_CONNECTION_FLAGS_AUTHENTICATION_CLIENT | G_DBUS_CONNECTION_FLAGS_MESSAGE_BUS_CONNECTION);
     g_autoptr(GError) error = nullptr;
     Connection connection(g_dbus_connection_new_for_address_sync(address_.c_str(), kFlags, nullptr, nullptr, &error));
-    if (!connection)
+    if (connection == nullptr)
         throw std::runtime_error(error->message);
     return connection;
 }

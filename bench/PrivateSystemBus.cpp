@@ -77,7 +77,7 @@ PrivateSystemBus::PrivateSystemBus()
     service_ = StartProgram({"/proc/self/exe", kServe});
     g_autoptr(GError) error = nullptr;
     shared_.reset(g_bus_get_sync(G_BUS_TYPE_SYSTEM, nullptr, &error));
-    if (!shared_)
+    if (shared_ == nullptr)
         throw std::runtime_error(error->message);
     g_dbus_connection_set_exit_on_close(shared_.get(), FALSE);
 }

@@ -33,7 +33,7 @@ std::string OutputOf(const std::vector<const char*>& command)
     g_autoptr(GError) error = nullptr;
     const std::unique_ptr<GSubprocess, Unref> program(g_subprocess_launcher_spawnv(launcher.get(), arguments.data(), &error));
     g_autofree char* output = nullptr;
-    if (!program || g_subprocess_communicate_utf8(program.get(), nullptr, nullptr, &output, nullptr, &error) == FALSE)
+    if (program == nullptr || g_subprocess_communicate_utf8(program.get(), nullptr, nullptr, &output, nullptr, &error) == FALSE)
         throw std::runtime_error(error->message);
     if (g_subprocess_get_successful(program.get()) == FALSE)
         throw std::runtime_error(std::string(command[0]) + " fails");

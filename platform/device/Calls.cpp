@@ -46,7 +46,7 @@ Calls& TheCalls()
     return *calls;
 }
 
-// Changes the handling of calls.
+/// Changes the handling of calls.
 template <class Change>
 void Set(Change change)
 {

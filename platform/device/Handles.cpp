@@ -18,7 +18,7 @@ const char* NameOf(HandleKind kind)
     return kKinds[static_cast<std::size_t>(kind)];
 }
 
-// Returns "libx.so+0x1f2 (near Function)", for addr2line and for readers.
+/// Returns "libx.so+0x1f2 (near Function)", for addr2line and for readers.
 std::string Place(const void* address)
 {
     Dl_info info{};

@@ -14,7 +14,7 @@ namespace kiv::platform
 namespace
 {
 
-// Runs `change` under the lock, and delivers the changes that it returns without the lock.
+/// Runs `change` under the lock, and delivers the changes that it returns without the lock.
 template <class Make>
 void Apply(Make change)
 {

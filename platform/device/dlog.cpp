@@ -24,7 +24,7 @@ using Sink = std::function<void(const LogLine&)>;
 
 constexpr int kNobody = DLOG_FATAL + 1;
 
-// Lines with a lower priority than this number are not even formatted, since nobody wants them.
+/// Lines with a lower priority than this number are not even formatted, since nobody wants them.
 constexpr int kNotSettled = -1;
 std::atomic<int> wantedFrom{kNotSettled};
 
@@ -55,7 +55,7 @@ struct Log
     void Settle() { wantedFrom = keeping || sink ? DLOG_VERBOSE : printedFrom; }
 };
 
-// Never destroyed: threads may log while the process exits.
+/// Never destroyed: threads may log while the process exits.
 Log& TheLog()
 {
     static Log* const log = new Log;

@@ -7,7 +7,7 @@ using namespace kiv::platform;
 namespace
 {
 
-// Reads the version of a package; returns an error code if it is not installed.
+/// Reads the version of a package; returns an error code if it is not installed.
 int FindPackage(State& state, const std::string& id, const std::string*& version)
 {
     if (state.source != nullptr && !state.source->RefreshPackage(state.device, id))

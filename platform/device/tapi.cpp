@@ -19,7 +19,7 @@ int AnswerForModem(Call call, TapiHandle* handle, Work work)
     return AnswerForSlot(call, HandleKind::Tapi, handle, work);
 }
 
-// Reads a value of the whole device, which every modem returns.
+/// Reads a value of the whole device, which every modem returns.
 template <class Out>
 int GiveRole(Call call, TapiHandle* handle, Out* out, int Device::*role)
 {

@@ -9,7 +9,7 @@ using namespace kiv::platform;
 namespace
 {
 
-// Returns the SIM state that follows from the last card status read, or from the first one.
+/// Returns the SIM state that follows from the last card status read, or from the first one.
 int SimStateOf(const SimSlot& sim)
 {
     if (sim.simState)

@@ -17,17 +17,17 @@ GDBusConnection* Connect()
     g_autoptr(GError) error = nullptr;
     g_autofree char* address = g_dbus_address_get_for_bus_sync(G_BUS_TYPE_SYSTEM, nullptr, &error);
     GDBusConnection* connection = nullptr;
-    if (address)
+    if (address != nullptr)
     {
         const auto flags = static_cast<GDBusConnectionFlags>(
             G_DBUS_CONNECTION_FLAGS_AUTHENTICATION_CLIENT | G_DBUS_CONNECTION_FLAGS_MESSAGE_BUS_CONNECTION);
         connection = g_dbus_connection_new_for_address_sync(address, flags, nullptr, nullptr, &error);
     }
-    if (!connection)
+    if (connection == nullptr)
     {
-        throw BusError(BusError::Reason::NoBus, std::string("the system bus at \"") + (address ? address : "?") +
-                                                    "\" can not be reached: " + error->message +
-                                                    "; DBUS_SYSTEM_BUS_ADDRESS tells where it is");
+        throw BusError(BusError::Reason::NoBus, std::string("the system bus at \"") + (address == nullptr ? "?" : address) +
+                                                    "\" cannot be reached: " + error->message +
+                                                    "; set DBUS_SYSTEM_BUS_ADDRESS to its address");
     }
     return connection;
 }
@@ -57,7 +57,7 @@ void BusParty::OwnName(const std::string& name)
     g_autoptr(GError) error = nullptr;
     const VariantPtr reply = CallBus("RequestName", g_variant_new("(su)", name.c_str(), kDoNotQueue), "(u)", &error);
     if (reply == nullptr)
-        throw BusError(BusError::Reason::NameRefused, "the bus does not give the name \"" + name + "\": " + error->message);
+        throw BusError(BusError::Reason::NameRefused, "the bus refuses the name \"" + name + "\": " + error->message);
 
     guint answer = 0;
     g_variant_get(reply.get(), "(u)", &answer);

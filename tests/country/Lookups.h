@@ -8,7 +8,7 @@
 namespace kiv::test
 {
 
-// The rows of the tables, written independently of the library's.
+/// The rows of the tables, written independently of the library's.
 inline const Rows kCountry = Read("country.tsv"); // mcc, alpha-2, name
 inline const Rows kService = Read("service.tsv"); // mcc, service country code
 inline const Rows kCodes = Read("codes.tsv");     // mcc, alpha-3, calling code or "-"

@@ -30,7 +30,7 @@ void AskDevice(const kiv::platform::Device& device)
     Require(kiv::platform::OpenHandles().empty() && kiv::platform::TakeMisuses().empty(), "each handle is closed once");
 }
 
-// Calls fail here and there; those that release something do their work, without which it could not be released.
+/// Calls a device with faults, except for faults of functions that release something, which nothing else could release.
 void AskBrokenDevice(kiv::platform::Device device)
 {
     const auto isRelease = [](const kiv::platform::BrokenCall& fault)
@@ -47,7 +47,7 @@ void AskBrokenDevice(kiv::platform::Device device)
         Require(fault.code != 0, "a fault has a code");
 }
 
-// What the device shows of itself makes the same device.
+/// The device's own listing makes the same device.
 void AskForValues(const kiv::platform::Device& device)
 {
     std::vector<std::string> assignments;

@@ -68,7 +68,7 @@ bool Fails(const void* caller)
 
 } // namespace
 
-// The library calls these, also in code of the standard library. Sanitizers allow to replace them.
+// The library calls these, also in code of the standard library. Sanitizers allow replacing them.
 extern "C" char* strdup(const char* text) noexcept
 {
     const std::size_t size = std::strlen(text) + 1;

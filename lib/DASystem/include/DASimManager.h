@@ -142,7 +142,7 @@ public:
     /// Checks whether an SMS can be sent on a slot.
     /// @param slot         0-based
     /// @param status       receives the card status, which does not affect the result
-    /// @param serviceType  receives the network service type: 0 unknown, 1 none, 2 emergency only, 3 searching, 4 and above real
+    /// @param serviceType  receives the network service type: 0 unknown, 1 none, 2 emergency only, 3 searching, 4 and above normal
     /// @return whether the card status was read and the service type is above 3. Holds the lock.
     bool IsAvaliableSendSMS(int slot, TelSimCardStatus_t* status, int* serviceType);
 

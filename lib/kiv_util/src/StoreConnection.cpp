@@ -27,7 +27,7 @@ constexpr const char* kSchema =
     "PRAGMA user_version = 1;"
     "COMMIT";
 
-// With that index, a search reads only the rows that it returns, in their order.
+/// With that index, a search reads only the rows that it returns, in their order.
 constexpr const char* kFind = "SELECT busname, objectpath, interface FROM subscription INDEXED BY subscription_by_event"
                               " WHERE kind = ?1 AND key = ?2 ORDER BY id";
 constexpr const char* kList = "SELECT kind, key, busname, objectpath, interface FROM subscription ORDER BY id";
