@@ -111,11 +111,11 @@ private:
     int descriptor_ = -1;
 };
 
-const EmbeddedProfile& ProfileInUse()
+const EmbeddedProfile* ProfileInUse()
 {
     const Locked state(TheState());
     const auto* const source = state->Ready() ? dynamic_cast<EmbeddedSource*>(state->source.get()) : nullptr;
-    return source != nullptr ? source->profile : *Find(kDefaultProfile);
+    return source != nullptr ? &source->profile : Find(kDefaultProfile);
 }
 
 // Replaces the file by what `change` makes.
@@ -179,7 +179,7 @@ std::string SetInDeviceFile(const std::string& path, const std::vector<std::stri
     return Rewrite(path,
         [&]
         {
-            const EmbeddedProfile* const profile = Exists(path) ? nullptr : &ProfileInUse();
+            const EmbeddedProfile* const profile = Exists(path) ? nullptr : ProfileInUse();
             if (madeFrom != nullptr)
                 *madeFrom = profile != nullptr ? profile->name : "";
             return ChangeText(profile != nullptr ? profile->text : ReadFile(path), path, assignments);

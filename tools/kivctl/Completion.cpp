@@ -126,7 +126,7 @@ Candidates Assignments(const std::string& typed)
         if (field.group + "." + field.key != general)
             continue;
         for (const std::string& word : field.words)
-            candidates.push_back({key + "=" + word});
+            candidates.push_back({std::string(key).append("=").append(word)});
     }
     return candidates;
 }

@@ -13,7 +13,7 @@ namespace
 /// The file that is to be changed. Ends the verb when the device comes from elsewhere.
 std::string RequireFile(const Command& command)
 {
-    const std::string file = DeviceAskedFor(command);
+    std::string file = DeviceAskedFor(command);
     if (IsHost(file))
     {
         throw Failure(Exit::Usage,
@@ -133,6 +133,7 @@ Exit ShowProfiles(const Command& command)
     std::vector<Record> rows;
     std::vector<kiv::platform::Profile> profiles = kiv::platform::ListProfiles();
     profiles.push_back(kiv::platform::HostProfile());
+    rows.reserve(profiles.size());
     for (const kiv::platform::Profile& profile : profiles)
         rows.push_back({{"name", profile.name}, {"description", profile.description}});
     PrintTable(rows, command.form);
