@@ -5,8 +5,10 @@
 
 #include "platform_decls.h"
 
-#include <assert.h>
 #include <sys/statvfs.h>
+#ifndef __cplusplus
+#include <assert.h>
+#endif
 
 // The platform writes the record with 64-bit counts, on a processor of 32 bits too.
 static_assert(sizeof(fsblkcnt_t) == 8, "compile with -D_FILE_OFFSET_BITS=64: storage.h needs 64-bit counts in struct statvfs");

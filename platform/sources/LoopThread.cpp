@@ -9,7 +9,7 @@ namespace kiv::platform
 
 std::shared_ptr<LoopThread> LoopThread::Start(Work work)
 {
-    const auto loop = std::make_shared<LoopThread>();
+    auto loop = std::make_shared<LoopThread>();
     loop->thread_ = std::thread(
         [loop, work = std::move(work)]
         {

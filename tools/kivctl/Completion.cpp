@@ -108,7 +108,8 @@ Candidates Keys(const std::string& typed, const char* end)
         std::string name = field.group + "." + field.key;
         if (isOfSlot && name.rfind("sim0.", 0) == 0)
             name[3] = typed[3];
-        candidates.push_back({name + end, field.meaning});
+        name += end;
+        candidates.push_back({std::move(name), field.meaning});
     }
     return candidates;
 }

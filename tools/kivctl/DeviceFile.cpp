@@ -58,8 +58,10 @@ Field ValueField(const kiv::platform::FieldValue& value, Identifiers identifiers
 
 std::vector<Record> ValueRows(Identifiers identifiers)
 {
+    const std::vector<kiv::platform::FieldValue> values = kiv::platform::ListValues();
     std::vector<Record> rows;
-    for (const kiv::platform::FieldValue& value : kiv::platform::ListValues())
+    rows.reserve(values.size());
+    for (const kiv::platform::FieldValue& value : values)
         rows.push_back({{"key", value.key}, ValueField(value, identifiers)});
     return rows;
 }
@@ -130,9 +132,9 @@ Exit ShowDeviceKeys(const Command& command)
 
 Exit ShowProfiles(const Command& command)
 {
-    std::vector<Record> rows;
     std::vector<kiv::platform::Profile> profiles = kiv::platform::ListProfiles();
     profiles.push_back(kiv::platform::HostProfile());
+    std::vector<Record> rows;
     rows.reserve(profiles.size());
     for (const kiv::platform::Profile& profile : profiles)
         rows.push_back({{"name", profile.name}, {"description", profile.description}});

@@ -54,7 +54,11 @@ bool MayOwn(GDBusConnection* connection, const char* busName)
     constexpr guint kDoNotQueue = 4;
     g_autoptr(GError) error = nullptr;
     g_autoptr(GVariant) taken = AskBus(connection, "RequestName", g_variant_new("(su)", busName, kDoNotQueue), &error);
-    g_autoptr(GVariant) released = taken ? AskBus(connection, "ReleaseName", g_variant_new("(s)", busName)) : nullptr;
+    if (taken != nullptr)
+    {
+        g_autoptr(GVariant) released = AskBus(connection, "ReleaseName", g_variant_new("(s)", busName));
+        static_cast<void>(released);
+    }
     return !g_error_matches(error, G_DBUS_ERROR, G_DBUS_ERROR_ACCESS_DENIED);
 }
 

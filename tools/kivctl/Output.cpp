@@ -288,6 +288,7 @@ void Print(const Record& record, const Form& form)
 void PrintTable(const std::vector<Record>& records, const Form& form)
 {
     std::vector<Record> chosen;
+    chosen.reserve(records.size());
     for (const Record& record : records)
         chosen.push_back(Chosen(record, form));
     if (form.notation == Form::Notation::Json)

@@ -91,12 +91,12 @@ Fact PlatformId(const std::string& root)
 {
     constexpr char kPurpose[] = "org.kiv.platform-id";
     Fact id = ReadFile(root + "/etc/machine-id");
-    if (id.text)
-    {
-        const auto* const key = reinterpret_cast<const guchar*>(id.text->data());
-        const Owned hash(g_compute_hmac_for_string(G_CHECKSUM_SHA256, key, id.text->size(), kPurpose, -1), g_free);
-        id.text = std::string(hash.get(), 32);
-    }
+    if (!id.text)
+        return id;
+    const std::string key = *id.text;
+    const auto* const bytes = reinterpret_cast<const guchar*>(key.data());
+    const Owned hash(g_compute_hmac_for_string(G_CHECKSUM_SHA256, bytes, key.size(), kPurpose, -1), g_free);
+    id.text = std::string(hash.get(), 32);
     return id;
 }
 
