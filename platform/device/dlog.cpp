@@ -47,7 +47,7 @@ struct Log
         else if (g_strcmp0(wish, "journal") == 0)
             printedFrom = DLOG_VERBOSE;
         else if (wish != nullptr && *wish != '\0')
-            kiv::platform::Report(std::string("KIV_LOG: \"") + wish + "\" is wrong; error, info or journal would be right");
+            kiv::platform::Report(std::string("KIV_LOG: \"") + wish + "\" is invalid; expected error, info or journal");
         goesToJournal = printedFrom == DLOG_VERBOSE;
         Settle();
     }

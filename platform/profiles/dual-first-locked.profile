@@ -1,5 +1,5 @@
 [profile]
-description=two slots, the first SIM wants its PIN, the second is ready
+description=two slots, the first SIM needs its PIN, the second is ready
 
 [telephony]
 available=true

@@ -1,5 +1,5 @@
 [profile]
-description=one slot, its SIM wants its PIN
+description=one slot, its SIM needs its PIN
 
 [telephony]
 available=true

@@ -1,5 +1,5 @@
 [profile]
-description=one slot, its SIM in a foreign network with data allowed
+description=one slot, its SIM roaming, with data allowed
 
 [telephony]
 available=true

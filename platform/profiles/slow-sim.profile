@@ -1,5 +1,5 @@
 [profile]
-description=one slot, its SIM ready at the fourth look
+description=one slot, its SIM ready at the fourth read
 
 [telephony]
 available=true

@@ -63,8 +63,8 @@ void BusParty::OwnName(const std::string& name)
     g_variant_get(reply.get(), "(u)", &answer);
     if (answer != kPrimaryOwner)
     {
-        throw BusError(BusError::Reason::NameRefused,
-            "the bus name \"" + name + "\" is taken: another process on this bus has it and must stop first");
+        throw BusError(
+            BusError::Reason::NameRefused, "the bus name \"" + name + "\" is taken; stop the process that owns it first");
     }
     name_ = name;
 }

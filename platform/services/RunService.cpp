@@ -1,5 +1,6 @@
 #include "RunService.h"
 
+#include "StandardOutput.h"
 #include "StopSignals.h"
 
 #include <cstdio>
@@ -30,15 +31,18 @@ try
     if (!g_option_context_parse(context, &argc, &argv, &error))
         return Fail(error->message);
     if (argc > 1)
-        return Fail("takes no arguments but its options; --help lists them");
+        return Fail("unexpected argument; --help lists the options");
 
     StopSignals signals;
     const std::unique_ptr<BusParty> service = start();
-    std::printf("ready bus_names=%s\n", service->Name().c_str()); // the same line as kivctl services prints
-    std::fflush(stdout);
-    if (signals.IterateWhile([&service] { return service->IsConnected() && service->GoOn(); }) || service->IsConnected())
-        return 0;
-    return Fail("the bus went away");
+    StandardOutput::Write("ready bus_names=" + service->Name() + '\n'); // the same line as kivctl services prints
+    const bool wasStopped = signals.IterateWhile([&service] { return service->IsConnected() && service->GoOn(); });
+    StandardOutput::EndStream();
+    if (StandardOutput::Error() != 0)
+        return Fail((std::string("cannot write to standard output: ") + g_strerror(StandardOutput::Error())).c_str());
+    if (!wasStopped && !service->IsConnected())
+        return Fail("the connection to the bus was lost");
+    return 0;
 }
 catch (const std::exception& failure)
 {

@@ -7,8 +7,8 @@ namespace kiv
 {
 
 /// Turns SIGINT, SIGTERM and SIGHUP into a request to stop, which a main loop can query, while the object lives.
-/// When the reader of standard output closes it, this is a request to stop as well, and SIGPIPE does not kill the process. So the
-/// process can always clean up. One object at a time, in the thread that iterates the default main context.
+/// A failure to write to standard output, which its reader may have closed, is such a request too, and SIGPIPE does not kill the
+/// process. So the process can always clean up. One object at a time, in the thread that iterates the default main context.
 class StopSignals
 {
 public:

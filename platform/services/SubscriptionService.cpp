@@ -160,7 +160,7 @@ bool SubscriptionService::Subscribe(const DASubscription& wanted, const char* se
     if (std::count_if(records.begin(), records.end(), isOfUser) >= kMostRecords)
     {
         throw CallError(G_DBUS_ERROR_LIMITS_EXCEEDED,
-            "user " + std::to_string(user) + " has " + std::to_string(kMostRecords) + " subscriptions, which is the most");
+            "user " + std::to_string(user) + " has " + std::to_string(kMostRecords) + " subscriptions, which is the limit");
     }
     const auto isInUse = [&](const std::string& known)
     { return std::any_of(records.begin(), records.end(), [&](const auto& record) { return record.subscriber.busname == known; }); };
@@ -269,8 +269,8 @@ void SubscriptionService::RequireOwner(const std::string& name, const char* send
 {
     if (!IsOwner(name, sender))
     {
-        throw CallError(G_DBUS_ERROR_ACCESS_DENIED,
-            "\"" + name + "\" is not a name of the caller " + sender + ", who may use this one or a well-known name that it owns");
+        throw CallError(G_DBUS_ERROR_ACCESS_DENIED, "\"" + name + "\" is not a name of the caller " + sender +
+                                                        "; a caller may use its unique name and the well-known names that it owns");
     }
 }
 

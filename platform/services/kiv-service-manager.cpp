@@ -1,18 +1,13 @@
 #include "RunService.h"
 #include "ServiceManager.h"
-
-#include <cstdio>
+#include "StandardOutput.h"
 
 int main(int argc, char** argv)
 {
-    return kiv::RunService(argc, argv, "Takes the agent's events on the system bus and prints them, one a line.", nullptr,
+    return kiv::RunService(argc, argv, "Receive the agent's events on the system bus and print one per line.", nullptr,
         []
         {
             return std::make_unique<kiv::ServiceManager>(
-                [](const kiv::BusCall& call)
-                {
-                    std::puts(call.Line().c_str());
-                    std::fflush(stdout);
-                });
+                [](const kiv::BusCall& call) { kiv::StandardOutput::Write(call.Line() + '\n'); });
         });
 }

@@ -52,8 +52,8 @@ constexpr Limits kAnyText{0, 255};
 constexpr Limits kSlotNumber = UpTo(7, kSlot);
 
 const Field<Device> kDeviceFields[] = {
-    {"profile",   "description",      &Device::description,         {1, 120},                "the device in one line"},
-    {"telephony", "available",        &Device::telephony,           kYesNo,                  "whether there are modems at all"},
+    {"profile",   "description",      &Device::description,         {1, 120},                "description of the device in one line"},
+    {"telephony", "available",        &Device::telephony,           kYesNo,                  "whether the device has modems"},
     {"telephony", "default-network",  &Device::defaultNetwork,      kSlotNumber,             "slot of the main SIM"},
     {"telephony", "preferred-voice",  &Device::preferredVoice,      kSlotNumber,             "slot for outgoing calls"},
     {"telephony", "default-data",     &Device::defaultData,         kSlotNumber,             "slot for mobile data"},
@@ -63,43 +63,43 @@ const Field<Device> kDeviceFields[] = {
     {"device",    "model-name",       &Device::modelName,           kAnyText,                "model"},
     {"device",    "sales-code",       &Device::salesCode,           kAnyText,                "sales code"},
     {"device",    "serial",           &Device::serial,              kAnyText,                "serial number of the board"},
-    {"device",    "current-time",     &Device::currentTime,         {0, 253402300799},       "seconds since 1970, for a stopped clock"},
+    {"device",    "current-time",     &Device::currentTime,         {0, 253402300799},       "time of a stopped clock, in seconds since 1970"},
     {"settings",  "device-name",      &Device::deviceName,          kAnyText,                "name that the user gave the device"},
     {"settings",  "language",         &Device::language,            kAnyText,                "language and region, such as en_US"},
-    {"settings",  "font-size",        &Device::fontSize,            OneOf(kFontSizes),       "size of the font"},
+    {"settings",  "font-size",        &Device::fontSize,            OneOf(kFontSizes),       "font size"},
     {"settings",  "mobile-data",      &Device::mobileData,          kYesNo,                  "whether mobile data is allowed"},
     {"runtime",   "flight-mode",      &Device::flightMode,          kYesNo,                  "whether flight mode is on"},
     {"runtime",   "packet-data",      &Device::packetData,          kYesNo,                  "whether packet data is on"},
-    {"runtime",   "data-roaming",     &Device::dataRoaming,         kYesNo,                  "whether data is allowed abroad"},
-    {"runtime",   "wifi-status",      &Device::wifiStatus,          OneOf(kConnection),      "Wi-Fi, for runtime_info"},
-    {"network",   "cellular",         &Device::cellularState,       OneOf(kCellular),        "the cellular network"},
-    {"network",   "wifi",             &Device::wifiState,           OneOf(kConnection),      "Wi-Fi, for net_connection"},
-    {"network",   "bluetooth",        &Device::bluetoothState,      OneOf(kConnection),      "Bluetooth"},
-    {"network",   "wifi-device",      &Device::wifiDeviceState,     OneOf(kSwitch),          "the Wi-Fi device, for wifi"},
-    {"network",   "wifi-connection",  &Device::wifiConnectionState, OneOf(kWifiConnection),  "the Wi-Fi connection, for wifi"},
-    {"storage",   "block-size",       &Device::blockSize,           {1, 4294967295},         "bytes in a block"},
+    {"runtime",   "data-roaming",     &Device::dataRoaming,         kYesNo,                  "whether data is allowed while roaming"},
+    {"runtime",   "wifi-status",      &Device::wifiStatus,          OneOf(kConnection),      "Wi-Fi state in runtime_info"},
+    {"network",   "cellular",         &Device::cellularState,       OneOf(kCellular),        "state of the cellular network"},
+    {"network",   "wifi",             &Device::wifiState,           OneOf(kConnection),      "Wi-Fi state in net_connection"},
+    {"network",   "bluetooth",        &Device::bluetoothState,      OneOf(kConnection),      "Bluetooth state"},
+    {"network",   "wifi-device",      &Device::wifiDeviceState,     OneOf(kSwitch),          "state of the Wi-Fi device in wifi"},
+    {"network",   "wifi-connection",  &Device::wifiConnectionState, OneOf(kWifiConnection),  "state of the Wi-Fi connection in wifi"},
+    {"storage",   "block-size",       &Device::blockSize,           {1, 4294967295},         "bytes per block"},
     {"storage",   "blocks-available", &Device::blocksAvailable,     {0, kMost},              "blocks free for the user"},
 };
 
 const Field<SimSlot> kSlotFields[] = {
     {kSlotGroup, "cp-name",       &SimSlot::cpName,       {1, 63},                "name of the modem"},
-    {kSlotGroup, "card-status",   &SimSlot::cardStatus,   UpTo(255, kCard),       "the card; several for successive reads, the last one stays"},
-    {kSlotGroup, "sim-state",     &SimSlot::simState,     OneOf(kSimState),       "the SIM (without this key: as the card has it)"},
+    {kSlotGroup, "card-status",   &SimSlot::cardStatus,   UpTo(255, kCard),       "status of the card; several for successive reads, of which the last one stays"},
+    {kSlotGroup, "sim-state",     &SimSlot::simState,     OneOf(kSimState),       "state of the SIM (default: as the card status implies)"},
     {kSlotGroup, "mcc",           &SimSlot::mcc,          {3, 3, true},           "mobile country code"},
     {kSlotGroup, "mnc",           &SimSlot::mnc,          {2, 3, true},           "mobile network code"},
-    {kSlotGroup, "msin",          &SimSlot::msin,         {1, 10, true},          "subscriber within the network"},
+    {kSlotGroup, "msin",          &SimSlot::msin,         {1, 10, true},          "number of the subscriber within the network"},
     {kSlotGroup, "number",        &SimSlot::number,       {0, 31},                "subscriber number"},
-    {kSlotGroup, "imei",          &SimSlot::imei,         {15, 15, true},         "number of the modem"},
-    {kSlotGroup, "service-state", &SimSlot::serviceState, OneOf(kService),        "the modem's registration, for telephony"},
-    {kSlotGroup, "roaming",       &SimSlot::roaming,      kYesNo,                 "whether the network is a foreign one"},
-    {kSlotGroup, "service-type",  &SimSlot::serviceType,  UpTo(15, kServiceType), "the modem's service, 4 and above in generations"},
+    {kSlotGroup, "imei",          &SimSlot::imei,         {15, 15, true},         "IMEI of the modem"},
+    {kSlotGroup, "service-state", &SimSlot::serviceState, OneOf(kService),        "registration of the modem in telephony"},
+    {kSlotGroup, "roaming",       &SimSlot::roaming,      kYesNo,                 "whether the SIM is roaming"},
+    {kSlotGroup, "service-type",  &SimSlot::serviceType,  UpTo(15, kServiceType), "service of the modem; from 4 on, the generation of the network"},
     {kSlotGroup, "sms-status",    &SimSlot::smsStatus,    OneOf(kReady),          "whether the modem is ready for text messages"},
 };
 // clang-format on
 
 constexpr int kMostSlots = 8;
 constexpr const char* kPackages = "packages"; // a key for each package ID
-constexpr const char* kFaults = "faults";     // a key for each function, perhaps with "@" and the number of a call
+constexpr const char* kFaults = "faults";     // a key for each function, optionally with "@" and the number of a call
 constexpr Limits kFaultCode{std::numeric_limits<int>::min(), std::numeric_limits<int>::max()};
 
 constexpr Call kCalls[] = {
@@ -134,9 +134,9 @@ std::vector<std::string> WordsOf(const Limits& limits)
     return words;
 }
 
-std::string Wrong(const std::string& value, const std::string& right, const std::vector<std::string>& words = {})
+std::string Wrong(const std::string& value, const std::string& expected, const std::vector<std::string>& words = {})
 {
-    return "\"" + value + "\" is wrong; " + right + " would be right" + DidYouMean(value, words);
+    return "\"" + value + "\" is invalid; expected " + expected + DidYouMean(value, words);
 }
 
 template <class Owner>
@@ -151,7 +151,7 @@ Text Format(const Owner& owner, const Field<Owner>& field)
     return std::visit([&](auto member) { return platform::Format(owner.*member, field.limits); }, field.member);
 }
 
-/// What the device has when the file leaves the key out.
+/// The value without the key.
 template <class Owner>
 std::string DefaultOf(const Field<Owner>& field)
 {
@@ -245,7 +245,7 @@ void AddGroup(Device& device, const std::string& file, const std::string& group)
     const std::string number = group.substr(prefix.size());
     if (!Parse(number, {0, kMostSlots - 1}, slot) || number != std::to_string(slot))
         Fail(file, group, "", "no such group; slots are sim0 to sim" + std::to_string(kMostSlots - 1));
-    // The slots make room for themselves; whether one is missing shows in its CP name.
+    // A slot may come before lower ones; a missing slot is found later, because it has no CP name.
     if (slot >= device.slots.size())
         device.slots.resize(slot + 1U);
 }
@@ -269,7 +269,7 @@ std::vector<FieldInfo> ListFields()
     List(kSlotFields, "0", all);
     all.push_back({kPackages, "PACKAGE-ID", "text", "none", "version of an installed package", {}});
     all.push_back({kFaults, "FUNCTION", "an error code", "none",
-        "what the platform's function returns instead of doing its work; FUNCTION@2 for its second call alone", {}});
+        "result of this platform function, which then does nothing else; FUNCTION@2: only of its second call", {}});
     return all;
 }
 

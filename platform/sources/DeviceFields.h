@@ -11,7 +11,7 @@
 namespace kiv::platform
 {
 
-/// Says what is wrong with a device file and what would be right.
+/// Says what is wrong with a device file and what is expected.
 class DeviceFileError : public std::runtime_error
 {
     using std::runtime_error::runtime_error;
@@ -24,7 +24,7 @@ class DeviceFileError : public std::runtime_error
 
 inline constexpr const char* kSlotGroup = "sim"; ///< and the number of the slot
 
-/// Prepares the device for the keys of a group: makes room for a slot. Fails when there is no such group.
+/// Prepares the device for the keys of a group, for example adds a slot. Fails when there is no such group.
 void AddGroup(Device& device, const std::string& file, const std::string& group);
 
 /// Stores a value in a device that has the group. Fails when there is no such key, or the value is wrong.

@@ -39,7 +39,7 @@ public:
                 Store(device, name_, *group, *key, Value(*group, *key));
         }
         if (device.description.empty())
-            Fail(name_, "profile", "description", "missing; it describes the device in one line");
+            Fail(name_, "profile", "description", "missing; expected a description of the device in one line");
         for (std::size_t slot = 0; slot < device.slots.size(); ++slot)
             Check(device.slots, slot);
         return device;
@@ -51,7 +51,7 @@ private:
         g_autoptr(GError) error = nullptr; // may come with a value
         const Owned value(g_key_file_get_string(file_, group.c_str(), key.c_str(), &error), g_free);
         if (error)
-            Fail(name_, group, key, "not UTF-8, or a backslash that escapes nothing; \\\\ is a backslash");
+            Fail(name_, group, key, "not UTF-8, or a backslash that escapes nothing; write \\\\ for a backslash");
         return value.get();
     }
 
@@ -60,19 +60,15 @@ private:
         const std::string group = kSlotGroup + std::to_string(slot);
         const SimSlot& sim = slots[slot];
         if (sim.cpName.empty())
-            Fail(name_, group, "cp-name", "missing; every slot up to the last one has a name of its own");
+            Fail(name_, group, "cp-name", "missing; every slot up to the last one needs a name");
         for (std::size_t other = 0; other < slot; ++other)
             if (slots[other].cpName == sim.cpName)
                 Fail(name_, group, "cp-name",
-                    "\"" + sim.cpName + "\" is that of sim" + std::to_string(other) + "; every slot has its own");
+                    "\"" + sim.cpName + "\" is the name of sim" + std::to_string(other) + "; every slot needs a name of its own");
         if (sim.mcc.has_value() != sim.mnc.has_value() || sim.mcc.has_value() != sim.msin.has_value())
-            Fail(name_, group,
-                !sim.mcc   ? "mcc"
-                : !sim.mnc ? "mnc"
-                           : "msin",
-                "missing; mcc, mnc and msin stand together or not at all");
+            Fail(name_, group, !sim.mcc ? "mcc" : !sim.mnc ? "mnc" : "msin", "missing; expected all of mcc, mnc and msin, or none");
         if (sim.mcc && sim.mcc->size() + sim.mnc->size() + sim.msin->size() > 15)
-            Fail(name_, group, "msin", "too long; mcc, mnc and msin are 15 digits at most");
+            Fail(name_, group, "msin", "too long; mcc, mnc and msin together have at most 15 digits");
     }
 
     GKeyFile* file_;
@@ -94,7 +90,7 @@ void Assign(GKeyFile* file, const std::string& name, const std::string& assignme
     const std::size_t dot = assignment.find('.');
     if (equals == std::string::npos || dot == std::string::npos || dot == 0 || dot + 1 >= equals)
         throw DeviceFileError(
-            name + ": \"" + assignment + "\" sets nothing; GROUP.KEY=VALUE is needed, such as runtime.flight-mode=true");
+            name + ": \"" + assignment + "\" sets nothing; expected GROUP.KEY=VALUE, such as runtime.flight-mode=true");
 
     const std::string group = assignment.substr(0, dot);
     const std::string key = assignment.substr(dot + 1, equals - dot - 1);
@@ -103,8 +99,7 @@ void Assign(GKeyFile* file, const std::string& name, const std::string& assignme
     const auto isControl = [](char ch) { return g_ascii_iscntrl(ch) != FALSE; };
     if (both.find_first_of("[]") != std::string::npos || key.find(' ') != std::string::npos ||
         std::any_of(both.begin(), both.end(), isControl))
-        throw DeviceFileError(
-            name + ": \"" + assignment + "\" has a group or a key with a bracket, a blank or a control character in it");
+        throw DeviceFileError(name + ": \"" + assignment + "\" has a bracket, a blank or a control character in its group or key");
     if (!g_utf8_validate(assignment.data(), static_cast<gssize>(assignment.size()), nullptr))
         throw DeviceFileError(name + ": [" + group + "] " + key + ": the value is not UTF-8");
     g_key_file_set_string(file, group.c_str(), key.c_str(), value.c_str());
@@ -114,7 +109,7 @@ void Remove(GKeyFile* file, const std::string& name, const std::string& what)
 {
     const std::size_t dot = what.find('.');
     if (dot == std::string::npos)
-        throw DeviceFileError(name + ": \"" + what + "\" names no key; GROUP.KEY is needed, such as runtime.flight-mode");
+        throw DeviceFileError(name + ": \"" + what + "\" is not a key; expected GROUP.KEY, such as runtime.flight-mode");
     const std::string group = what.substr(0, dot);
     const std::string key = what.substr(dot + 1);
     if (g_key_file_remove_key(file, group.c_str(), key.c_str(), nullptr) == FALSE)

@@ -1,5 +1,5 @@
 /// @file
-/// The device in text: a key file, in GLib's form, with one group for each service and one, sim0, sim1, ..., for each slot.
+/// The device as text: a GLib key file with one group per service and one group per slot (sim0, sim1, ...).
 #ifndef KIV_SOURCES_DEVICEFILE_H
 #define KIV_SOURCES_DEVICEFILE_H
 
@@ -11,17 +11,18 @@
 namespace kiv::platform
 {
 
+/// Reads a device.
 /// @param name  of the file, for the error's text
-/// Throws DeviceFileError for anything that is not as it should be: there is no half device.
+/// Throws DeviceFileError for anything wrong: a device is never read in part.
 Device ReadDevice(const std::string& text, const std::string& name);
 
-/// The text with values changed, comments kept. Throws DeviceFileError, also when the result would not be a device.
+/// Changes values in a text and keeps its comments. Throws DeviceFileError, also when the result is not a device.
 /// @param assignments  "GROUP.KEY=VALUE"
-/// @param removals     "GROUP.KEY"; each has to be there
+/// @param removals     "GROUP.KEY"; each must be in the text
 std::string ChangeText(const std::string& text, const std::string& name, const std::vector<std::string>& assignments,
     const std::vector<std::string>& removals = {});
 
-/// Throws DeviceFileError, also for what is no regular file.
+/// Reads a file. Throws DeviceFileError, also when it is not a regular file.
 std::string ReadFile(const std::string& path);
 
 } // namespace kiv::platform

@@ -1,5 +1,5 @@
 /// @file
-/// The values of a device file as text: what each type may hold, and how it is read and written.
+/// The values of a device file as text: the possible values of each type, and how they are read and written.
 #ifndef KIV_SOURCES_FIELDVALUES_H
 #define KIV_SOURCES_FIELDVALUES_H
 
@@ -32,7 +32,7 @@ struct Limits
     std::size_t wordCount = 0;
 };
 
-/// A number that has a word.
+/// A number that always has a word.
 template <std::size_t count>
 constexpr Limits OneOf(const Word (&words)[count])
 {
@@ -46,19 +46,19 @@ constexpr Limits UpTo(std::int64_t high, const Word (&words)[count])
     return {words[0].number, high, false, words, count};
 }
 
-/// What may be there, in words: "true or false".
+/// Describes the possible values, such as "true or false".
 std::string Describe(bool type, const Limits& limits);
 std::string Describe(std::int64_t type, const Limits& limits);
 std::string Describe(const std::string& type, const Limits& limits);
 std::string Describe(const std::vector<int>& type, const Limits& limits);
 
-/// Reads a value. @return whether the text is one
+/// Reads a value. @return whether the text is a value
 bool Parse(const std::string& text, const Limits& limits, bool& value);
 bool Parse(const std::string& text, const Limits& limits, std::int64_t& value);
 bool Parse(const std::string& text, const Limits& limits, std::string& value);
 bool Parse(const std::string& text, const Limits& limits, std::vector<int>& value);
 
-/// Writes a value as a device file holds it, with words where there are any. None where the value is missing.
+/// Writes a value as in a device file, as a word if it has one. None when the value is missing.
 Text Format(bool value, const Limits& limits);
 Text Format(std::int64_t value, const Limits& limits);
 Text Format(const std::string& value, const Limits& limits);

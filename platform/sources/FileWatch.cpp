@@ -14,14 +14,14 @@ namespace
 
 namespace fs = std::filesystem;
 
-constexpr guint kPatienceMs = 300; ///< with a program that replaces the file
-constexpr int kMostLinks = 40;     ///< that the kernel follows, too
+constexpr guint kPatienceMs = 300; ///< how long a program may take to replace the file
+constexpr int kMostLinks = 40;     ///< as many as the kernel follows
 
-/// Each symbolic link on the way to the file, and then the file itself: whichever of them is replaced, the file is another one.
+/// Each symbolic link on the way to the file, and then the file itself. When one of them is replaced, the file is a different one.
 std::vector<std::string> PathsTo(const std::string& path)
 {
     std::vector<std::string> paths;
-    std::error_code error; // what cannot be read is no link
+    std::error_code error; // a path that cannot be read is not a link
     fs::path whole = fs::absolute(path, error);
     while (paths.size() < kMostLinks)
     {
@@ -84,7 +84,7 @@ void FileWatch::Observe()
 
 void FileWatch::OnEvent(GFileMonitor* /*monitor*/, GFile* file, GFile* /*other*/, GFileMonitorEvent event, gpointer self)
 {
-    // A file that is created is not written yet: a hint follows when the writer has closed it, and after one was renamed over it.
+    // A new file is not written yet: a "changes done" event follows when its writer has closed it, or after a rename.
     const bool isNewLink = event == G_FILE_MONITOR_EVENT_CREATED && fs::is_symlink(g_file_peek_path(file));
     if (!isNewLink && event != G_FILE_MONITOR_EVENT_CHANGES_DONE_HINT && event != G_FILE_MONITOR_EVENT_DELETED)
         return;

@@ -1,5 +1,5 @@
 /// @file
-/// Changes of one file, however it is written and whatever symbolic links lead to it.
+/// Reports changes of one file, however it is written and through whatever symbolic links it is reached.
 #ifndef KIV_SOURCES_FILEWATCH_H
 #define KIV_SOURCES_FILEWATCH_H
 
@@ -12,7 +12,7 @@
 namespace kiv::platform
 {
 
-/// Works on one thread, in the main context that is the thread's default where it is made.
+/// Works on the thread that creates it, in the thread-default main context.
 class FileWatch
 {
 public:
@@ -22,8 +22,8 @@ public:
         Last
     };
 
-    /// @param look  reads the file: once at the start, and after each change. Where it returns false, the file was wrong, perhaps
-    ///              because a program is replacing it: then it runs once more a moment later, as Look::Last.
+    /// @param look  reads the file: once at the start, and after each change. It returns false when the file is wrong. As a
+    ///              program may be replacing the file then, it is called once more a moment later, with Look::Last.
     FileWatch(std::string path, std::function<bool(Look)> look);
     FileWatch(const FileWatch&) = delete;
     FileWatch& operator=(const FileWatch&) = delete;

@@ -14,11 +14,11 @@
 namespace kiv::platform
 {
 
-/// Follows the file on a thread of its own while it is in use and somebody registered for changes.
+/// Follows the file on a thread of its own while it is in use and there is a listener for changes.
 class FollowedFile : public Source, public std::enable_shared_from_this<FollowedFile>
 {
 public:
-    /// @param text  what the device was read from
+    /// @param text  the text that the device was read from
     FollowedFile(std::string path, std::string text);
 
     void Settle() noexcept override;
@@ -28,10 +28,10 @@ private:
     bool ReadAgain(FileWatch::Look look);
 
     const std::string path_;
-    std::string text_; ///< what the device was last read from; guarded by the lock of the state
+    std::string text_; ///< the text that the device was last read from; guarded by the lock of the state
 
     std::mutex reading_;     ///< held while the file is read again, so that an older text never replaces a newer one
-    std::string lastReport_; ///< what was wrong with the file that was read again; guarded by `reading_`
+    std::string lastReport_; ///< what was wrong when the file was last read again; guarded by `reading_`
 
     std::mutex mutex_; ///< guards the follower
     std::shared_ptr<LoopThread> follower_;

@@ -1,6 +1,6 @@
 /// @file
-/// Where the device's state comes from: profiles, which the library carries, device files, and the machine itself. For tests and
-/// tools; the product never calls it. Any thread may call anything here.
+/// The sources of the device's state: profiles, which are part of the library, device files, and the machine itself. For tests and
+/// tools; the product never calls these functions. Any thread may call them.
 #ifndef KIV_SOURCES_SOURCECONTROL_H
 #define KIV_SOURCES_SOURCECONTROL_H
 
@@ -13,8 +13,8 @@
 namespace kiv::platform
 {
 
-/// Replaces the device by a profile or a device file, which it follows as it does one that KIV_PROFILE names.
-/// @return what was wrong, naming file, group and key, and what would be right; empty when done. On trouble nothing changes.
+/// Replaces the device by a profile, a device file or the machine itself, as KIV_PROFILE does.
+/// @return empty on success; otherwise what is wrong, with file, group and key, and what is expected. On an error nothing changes.
 std::string UseProfile(const std::string& nameOrPath);
 
 struct Profile
@@ -26,50 +26,51 @@ struct Profile
 /// The simulated devices that UseProfile() and KIV_PROFILE know by name.
 std::vector<Profile> ListProfiles();
 
-/// The text of such a profile, in the form of a device file; none when there is no such profile.
+/// The text of a profile, in the form of a device file; none when there is no such profile.
 std::optional<std::string> TextOfProfile(const std::string& name);
 
-/// The machine itself, which they know too: ModemManager, NetworkManager and its files tell what it is.
+/// The machine itself, under its name for UseProfile() and KIV_PROFILE. ModemManager, NetworkManager and files provide its state.
 Profile HostProfile();
 
-/// What one key of a device file is.
+/// The description of one key of a device file.
 struct FieldInfo
 {
-    std::string group; ///< "sim0" stands for that of every slot
+    std::string group; ///< "sim0" for the groups of all slots
     std::string key;
-    std::string values;   ///< what it may hold
-    std::string fallback; ///< what it is without the key: "none" for a value that is missing, "required" where there is no device
+    std::string values;   ///< the possible values
+    std::string fallback; ///< the value without the key; "none" for a missing value, "required" when the key must be there
     std::string meaning;
     std::vector<std::string> words; ///< the values that are words
 };
 
-/// Every key that a device file may hold.
+/// Every key that a device file may have.
 std::vector<FieldInfo> ListFields();
 
 struct FieldValue
 {
     std::string key;                  ///< "GROUP.KEY"
-    std::optional<std::string> value; ///< as a device file holds it; none where the device has no value
+    std::optional<std::string> value; ///< as in a device file; none when the device has no value
 };
 
 /// The values of the device in use, in the order of ListFields().
 std::vector<FieldValue> ListValues();
 
-/// @name Changes of a device file: all of one call or none
-/// Whoever reads the file meanwhile sees the old one or the new one, and two writers at once lose nothing.
+/// @name Changes of a device file
+/// Each call makes all of its changes or none. A reader sees either the old or the new file, and concurrent writers do not lose
+/// changes.
 /// @return as UseProfile()
 /// @{
 
-/// Sets values. A file that is not there is made from the profile in use (from "dual" if a file is in use).
+/// Sets values. If there is no such file, creates it from the profile in use, or from "dual" when no profile is in use.
 /// @param assignments  "GROUP.KEY=VALUE"
-/// @param madeFrom     receives the name of that profile, and nothing when the file was there; may be null
+/// @param madeFrom     receives the name of that profile, or an empty text when the file existed; may be null
 std::string SetInDeviceFile(const std::string& path, const std::vector<std::string>& assignments, std::string* madeFrom = nullptr);
 
-/// Makes a file from a profile, and sets values. A file that is there is left alone, and an error.
+/// Creates a file from a profile, and sets values. It is an error when the file exists.
 std::string MakeDeviceFile(const std::string& path, const std::string& profile, const std::vector<std::string>& assignments);
 
-/// Removes keys, so that they have their defaults, and groups that lose their last key.
-/// @param keys  "GROUP.KEY"; each has to be in the file
+/// Removes keys, so that they have their defaults. Removes groups without keys, too.
+/// @param keys  "GROUP.KEY"; each must be in the file
 std::string UnsetInDeviceFile(const std::string& path, const std::vector<std::string>& keys);
 
 /// @}

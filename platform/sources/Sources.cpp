@@ -53,7 +53,7 @@ const EmbeddedProfile* Find(const std::string& name)
     throw DeviceFileError("\"" + name + "\" is " + what + "; profiles are " + list + DidYouMean(name, names));
 }
 
-// A profile never changes.
+// A source that never changes.
 class EmbeddedSource : public Source
 {
 public:
@@ -76,13 +76,13 @@ Origin Open(const std::string& nameOrPath)
         return {ReadDevice(profile->text, "profile " + nameOrPath), std::make_shared<EmbeddedSource>(*profile)};
 
     if (nameOrPath.find('/') == std::string::npos && !Exists(nameOrPath))
-        FailUnknown(nameOrPath, "no profile and no file", {kHost});
+        FailUnknown(nameOrPath, "neither a profile nor a file", {kHost});
     std::string text = ReadFile(nameOrPath);
     Device device = ReadDevice(text, nameOrPath);
     return {std::move(device), std::make_shared<FollowedFile>(nameOrPath, std::move(text))};
 }
 
-// Locks the directory, so that two writers go one after the other and no lock file is left behind.
+// Locks the directory: concurrent writers wait for each other, and no lock file is needed.
 class DirectoryLock
 {
 public:
@@ -118,7 +118,7 @@ const EmbeddedProfile* ProfileInUse()
     return source != nullptr ? &source->profile : Find(kDefaultProfile);
 }
 
-// Replaces the file by what `change` makes.
+// Replaces the text of the file by the result of `change`.
 std::string Rewrite(const std::string& path, const std::function<std::string()>& change)
 try
 {
@@ -193,9 +193,9 @@ std::string MakeDeviceFile(const std::string& path, const std::string& profile, 
         {
             const EmbeddedProfile* const found = Find(profile);
             if (found == nullptr)
-                FailUnknown(profile, "no profile");
+                FailUnknown(profile, "not a profile");
             if (Exists(path))
-                throw DeviceFileError(path + ": is there already; a file is made from a profile only where there is none");
+                throw DeviceFileError(path + ": exists already; expected the name of a new file");
             return ChangeText(found->text, path, assignments);
         });
 }

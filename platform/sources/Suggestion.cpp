@@ -16,7 +16,7 @@ char Lower(char letter)
     return static_cast<char>(std::tolower(static_cast<unsigned char>(letter)));
 }
 
-/// Letters to insert, to leave out or to replace on the way from one word to the other; capitals do not count.
+/// Number of letters to insert, remove or replace to turn one word into the other. Ignores case.
 size_t Distance(const std::string& from, const std::string& to)
 {
     std::vector<size_t> row(to.size() + 1);

@@ -1,5 +1,5 @@
 /// @file
-/// The word that somebody meant.
+/// Suggests the word that was probably meant.
 #ifndef KIV_SOURCES_SUGGESTION_H
 #define KIV_SOURCES_SUGGESTION_H
 
@@ -11,7 +11,7 @@
 namespace kiv::platform
 {
 
-/// The nearest of the words as a question that follows a complaint: ` (did you mean "single"?)`; empty when none is near.
+/// A question about the nearest of the words, to follow an error message: ` (did you mean "single"?)`; empty when none is near.
 std::string DidYouMean(const std::string& typed, const std::vector<std::string>& words);
 
 } // namespace kiv::platform

@@ -120,7 +120,7 @@ TEST_F(Changes, ThatCannotBeUsedAreReportedOnce)
     };
     for (const char* comment : {"# one\n", "# two\n", "# three\n"})
         Write(comment + good + "[runtime]\nflight-mode=maybe\n");
-    awaitReport("[runtime] flight-mode: \"maybe\" is wrong; true or false would be right");
+    awaitReport("[runtime] flight-mode: \"maybe\" is invalid; expected true or false");
     std::filesystem::remove(path);
     awaitReport("No such file or directory");
     Write(good + "[runtime]\nflight-mode=true\n");
@@ -201,8 +201,7 @@ TEST_F(Changes, StartFromTheProfileThatIsNamedOrInUse)
     EXPECT_EQ("", SetInDeviceFile(other, {}, &madeFrom));
     EXPECT_EQ("roaming", madeFrom);
     EXPECT_EQ(kiv::test::Contents(other), *TextOfProfile("roaming"));
-    EXPECT_EQ(
-        other + ": is there already; a file is made from a profile only where there is none", MakeDeviceFile(other, "none", {}));
+    EXPECT_EQ(other + ": exists already; expected the name of a new file", MakeDeviceFile(other, "none", {}));
     EXPECT_EQ("", SetInDeviceFile(other, {}, &madeFrom));
     EXPECT_EQ("", madeFrom);
     std::filesystem::remove(other);

@@ -14,17 +14,17 @@ namespace kiv::test
 using testing::AllOf;
 using testing::HasSubstr;
 
-/// The text without what differs from run to run and from machine to machine: times, addresses, directories, widths of columns.
+/// Removes what differs between runs and machines: times, addresses, directories, widths of columns.
 inline std::string Steady(const std::string& text)
 {
     const std::regex passing(R"(\d{4}-\d\d-\d\d \d\d:\d\d:\d\d|waited seconds +\d+|\d+(?= s:)|unix:[^ "]*|[^ "]*/)");
     return std::regex_replace(std::regex_replace(text, passing, ""), std::regex(" +"), " ");
 }
 
-/// A program that runs beside the test, in its directory, and is killed with its owner.
+/// A program that runs in parallel to the test, in its directory. It is killed when its owner is destroyed.
 struct Program
 {
-    /// @param command  as a shell takes it
+    /// @param command  for a shell
     explicit Program(const std::string& command)
     {
         const std::string line = "exec " + command + " >" + name + ".out 2>" + name + ".err";
@@ -35,14 +35,14 @@ struct Program
     std::string Out() const { return Contents(name + ".out"); }
     std::string Err() const { return Contents(name + ".err"); }
 
-    /// Waits until it printed that.
+    /// Waits until it has printed the text.
     void Await(const std::string& text) const
     {
         SCOPED_TRACE(text);
         IterateUntil([&] { return Out().find(text) != std::string::npos; });
     }
 
-    /// Waits for its end, which the signal brings about if there is one. @return the exit code; -1 when a signal ended it
+    /// Sends the signal, if there is one, and waits for the end. @return the exit code; -1 when a signal ended the program
     int End(int signal = 0)
     {
         g_subprocess_send_signal(process.get(), signal);
@@ -55,13 +55,13 @@ struct Program
     std::unique_ptr<GSubprocess, Unref> process;
 };
 
-/// One that says when it is ready.
+/// A program that prints when it is ready. The constructor waits for that.
 struct Service : Program
 {
     explicit Service(const std::string& command) : Program(command) { Await("ready"); }
 };
 
-/// One that has ended.
+/// A program that has ended. The constructor waits for that.
 struct Outcome : Program
 {
     explicit Outcome(const std::string& command) : Program(command) {}
@@ -75,7 +75,7 @@ inline Outcome Kivctl(const std::string& arguments)
     return Outcome(KIVCTL " " + arguments);
 }
 
-/// A bus, a subscriber store and a directory of its own for each test.
+/// Each test has its own bus, subscriber store and directory.
 struct KivctlTest : testing::Test
 {
     KivctlTest()

@@ -10,7 +10,7 @@ import tempfile
 import time
 
 KIVCTL = os.path.abspath(sys.argv[1])
-# What is typed before the tab, and the words of the line then.
+# The text typed before the tab, and the command line after it.
 CASES = [
     ("kivctl device set runtime.flight-mode=t", "kivctl device set runtime.flight-mode=true"),
     ("kivctl device set runtime.fl", "kivctl device set runtime.flight-mode="),
@@ -21,8 +21,9 @@ CASES = [
     ("kivctl subscribers remove st", "kivctl subscribers remove status"),
     ("kivctl subscribers remove status 7 org.a", "kivctl subscribers remove status 7 org.a.B"),
     ("kivctl completion z", "kivctl completion zsh"),
+    ("kivctl sim --fields slot,car", "kivctl sim --fields slot,card"),
 ]
-# How each is started, and what defines "show", which prints the words of a line.
+# How each shell is started, and a definition of "show", which prints the words of a line.
 SHELLS = {
     "bash": (["--noprofile", "--norc", "-i"], "show() { printf '<%s>' \"$@\"; echo; }; source <(kivctl completion bash)"),
     "zsh": (["-f", "-i"],
@@ -32,7 +33,7 @@ SHELLS = {
 
 
 class Terminal:
-    """A shell on a terminal of its own."""
+    """A shell on its own terminal."""
 
     def __init__(self, shell, arguments):
         self.process, self.descriptor = pty.fork()
@@ -67,7 +68,7 @@ def check(shell):
     failures = 0 if terminal.read_until("<ready>") else 1
     for typed, expected in CASES:
         terminal.type(typed + "\t")
-        time.sleep(0.3)  # shells drop what is typed while they complete
+        time.sleep(0.3)  # shells ignore input while they complete
         terminal.type("\x01show \r")
         words = "".join(f"<{word}>" for word in expected.split())
         if not terminal.read_until(words):

@@ -27,11 +27,11 @@ TEST_F(KivctlTest, CarriesEveryNotificationToItsReceivers)
             "policy imsi='1' service_id=7 service_status='w' policy_feature='x' policy_version='y' policy_doc_url='z'\n"},
         {"status --service 7", "status imsi='1' service_id=7 status='on'\n"},
     };
-    std::string types = "right are";
+    std::string types = "expected one of";
     for (const auto& [arguments, call] : cases)
     {
         const std::string type = arguments.substr(0, arguments.find(' '));
-        types += type == "number_changed" ? "" : ' ' + type + ','; // another spelling
+        types += type == "number_changed" ? "" : ' ' + type + ','; // the other spelling of a type
         const Outcome told = Kivctl("notify --imsi 1 " + arguments);
         EXPECT_EQ("sent subscribers=1 delivered=1\n", told.out) << arguments << "\n" << told.err;
         all.Await(call);
@@ -61,7 +61,7 @@ TEST_F(KivctlTest, CarriesEveryNotificationToItsReceivers)
     EXPECT_THAT(Steady(all.Out()), testing::ContainsRegex("message='now' time=[0-9]{10}\n")); // in seconds
 }
 
-TEST_F(KivctlTest, ServicesHoldTheirNamesAndSubscriptionsUntilTheyEnd)
+TEST_F(KivctlTest, ServicesKeepNamesAndSubscriptionsUntilTheyEnd)
 {
     const std::pair<int, std::string> services[] = {
         {SIGINT, KIVCTL " subscribe --name a.b --kind auth"}, {SIGTERM, KIV_BOARD_DAEMON}, {SIGHUP, KIV_SERVICE_MANAGER}};
@@ -89,12 +89,12 @@ TEST_F(KivctlTest, InstalledServicesAnswerAndPrintWhatTheyReceive)
     EXPECT_EQ("ready bus_names=org.tizen.servicemanager.service\nactivated imsi=\"'1\\u2028\" active=1\n", manager.Out());
 }
 
-TEST_F(KivctlTest, WaitsForAStuckServiceNoLongerThanAsked)
+TEST_F(KivctlTest, LimitsTheWaitForAServiceThatIsStuck)
 {
     Service board(KIV_BOARD_DAEMON), manager(KIV_SERVICE_MANAGER), client(KIVCTL " subscribe --kind auth --name a.b");
     for (Service* stuck : {&board, &manager, &client})
         g_subprocess_send_signal(stuck->process.get(), SIGSTOP);
-    const Program examined(KIVCTL " doctor --fields check,finding"); // whose own time limits are far below GDBus's
+    const Program examined(KIVCTL " doctor --fields check,finding"); // its time limits are far below GDBus's
     for (const auto& [receiver, trouble] : std::map<std::string, const char*>{
              {"subscribers", "kivctl: not delivered to a.b: no answer in time\n"}, {"manager", "did not answer in time"}})
     {
@@ -131,7 +131,7 @@ TEST_F(KivctlTest, WatchNamesEachChange)
     }
 }
 
-TEST_F(KivctlTest, SubscribesByTheServiceAsItDoesInTheFile)
+TEST_F(KivctlTest, SubscribesByTheServiceAsInTheFile)
 {
     Service service("env KIV_SUBSCRIBERS=" + directory + "/served.db " KIV_SUBSCRIPTION_SERVICE);
     const std::string file = "env KIV_SUBSCRIBERS=served.db " KIVCTL " subscribers list";
@@ -154,7 +154,7 @@ TEST_F(KivctlTest, SubscribesByTheServiceAsItDoesInTheFile)
     compare("subscribe --push a --name a.b", 6);
 }
 
-TEST_F(KivctlTest, TellsAMissingBusFromABrokenStore)
+TEST_F(KivctlTest, DistinguishesAMissingBusFromABrokenStore)
 {
     std::ofstream("subscribers.db") << std::string(4096, 'x');
     for (const char* arguments :
@@ -168,13 +168,13 @@ TEST_F(KivctlTest, TellsAMissingBusFromABrokenStore)
             HasSubstr("library yes")));
     std::filesystem::copy_file(KIV_SYSTEM_LIBRARY, "libkiv_system.so.9.9.9");
     std::filesystem::create_symlink("libkiv_system.so.9.9.9", "libkiv_system.so.1");
-    EXPECT_THAT(Outcome("env LD_LIBRARY_PATH=. " KIVCTL " doctor").out, HasSubstr("libkiv_system.so.9.9.9 is of version 9.9.9"));
+    EXPECT_THAT(Outcome("env LD_LIBRARY_PATH=. " KIVCTL " doctor").out, HasSubstr("libkiv_system.so.9.9.9 has version 9.9.9"));
     bus.Stop();
     EXPECT_THAT(Steady(Kivctl("doctor --profile nosuch").out), AllOf(HasSubstr("bus no"), HasSubstr("device no")));
     for (const char* arguments : {"device id", "notify --imsi 1 auth-fail", "notify --imsi 1 auth-fail --to manager",
              "push mail --data d --message m", "subscribe --push a", "services"})
         EXPECT_EQ(8, Kivctl(arguments).exit) << arguments;
-    // The library tells a bus that is too slow by the word in the reason, which names an unknown transport.
+    // The library recognises a slow bus by a word in the error text, which contains the unknown transport's name.
     EXPECT_EQ(9, Outcome("env DBUS_SYSTEM_BUS_ADDRESS=Time: " KIVCTL " device id").exit);
 }
 

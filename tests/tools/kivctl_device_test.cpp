@@ -8,13 +8,12 @@ namespace
 TEST_F(KivctlTest, ShowsAndChangesTheValuesOfADeviceFile)
 {
     const std::tuple<std::string, int, std::string, const char*> steps[] = {
-        {"-p ./x device set --from roamin", 10, "", "\"roamin\" is no profile; profiles are dual, "},
+        {"-p ./x device set --from roamin", 10, "", "\"roamin\" is not a profile; profiles are dual, "},
         {"-p ./x device unset runtime.flight-mode", 10, "", "./x: No such file"},
         {"-p ./x device set --from roaming runtime.wifi-status=2", 0, "", ""},
         {"-p ./x device get runtime.wifi-status", 0, "connected\n", ""},
-        {"-p ./x device get profile.description -t", 0,
-            "profile.description:one slot, its SIM in a foreign network with data allowed\n", ""},
-        {"-p ./x device set --from single", 10, "", "./x: is there already; "},
+        {"-p ./x device get profile.description -t", 0, "profile.description:one slot, its SIM roaming, with data allowed\n", ""},
+        {"-p ./x device set --from single", 10, "", "./x: exists already; "},
         {"-p ./x device unset runtime.wifi-status runtime.nothing", 10, "", "[runtime] nothing: not in the file"},
         {"-p ./x device get runtime.wifi-status", 0, "connected\n", ""},
         {"-p ./x device unset runtime.wifi-status sim0.number", 0, "", ""},
@@ -53,7 +52,7 @@ TEST_F(KivctlTest, NamesTheProfileThatANewDeviceFileStartsFrom)
     EXPECT_EQ("1\n", Kivctl("-p ./y device get telephony.preferred-voice").out);
 }
 
-TEST_F(KivctlTest, ExaminesWhetherEachRecordReachesSomebody)
+TEST_F(KivctlTest, DoctorListsRecordsThatReachNobody)
 {
     const auto examine = [] { return Kivctl("doctor -t --fields finding,remedy").out; };
     EXPECT_THAT(examine(), HasSubstr("\nnone:\n"));

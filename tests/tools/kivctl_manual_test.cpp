@@ -7,14 +7,14 @@ namespace
 
 using Words = std::set<std::string>;
 
-/// What the pattern's group holds at every place where the pattern fits.
+/// The texts of the pattern's group in all its matches.
 Words All(const char* pattern, const std::string& text)
 {
     const std::regex regex(pattern);
     return {std::sregex_token_iterator(text.begin(), text.end(), regex, 1), std::sregex_token_iterator()};
 }
 
-/// What a shell is offered, a line each, for the last of those words, which a shell reads.
+/// The completions of the last of those words, one per line. A shell reads the words.
 std::string Complete(const std::string& words)
 {
     return Kivctl("complete-words " + words).out;
@@ -22,7 +22,7 @@ std::string Complete(const std::string& words)
 
 TEST_F(KivctlTest, PrintsWhatThePagesShow)
 {
-    std::map<std::string, Service> beside; // by what each is to print
+    std::map<std::string, Service> beside; // by the expected output
     const std::string pages = Contents(KIV_DOCS "/profiles.md") + Contents(KIV_DOCS "/kivctl.md");
     g_auto(GStrv) examples = g_strsplit(pages.c_str(), "\n$ kivctl ", -1);
     EXPECT_LT(42U, g_strv_length(examples));
@@ -46,19 +46,25 @@ TEST_F(KivctlTest, PrintsWhatThePagesShow)
         EXPECT_EQ(printed, program.Out());
     }
 
-    const Words rows = All("\n(\\| `kivctl [^`]*` \\| (?:object|array) \\| .*) \\|", pages); // of the fields in JSON
+    const Words rows = All("\n(\\| `kivctl [^`]*` \\| (?:object|array) \\| .*) \\|", pages); // of the table of JSON fields
     EXPECT_EQ(18U, rows.size());
     for (const std::string& row : rows)
     {
-        const std::string out = Kivctl("--json --profile single " + *All("`kivctl (.*?)`", row).begin()).out;
+        const std::string verb = *All("`kivctl (.*?)`", row).begin();
+        const std::string out = Kivctl("--json --profile single " + verb).out;
         Words names = All("\"(\\w+)\": ?", out);
         names.erase("notes");
         EXPECT_EQ(All("`(\\w+)`", row), names) << row;
+        const bool isQuery = row.find("`event`") == row.npos && row.find("`result`") == row.npos;
+        if (isQuery)
+        {
+            EXPECT_THAT(All("(\\w+)\n", Complete(verb + " --fields ''")), testing::IsSupersetOf(names)) << row;
+        }
         EXPECT_EQ(row.find("| array |") != row.npos, out.front() == '[') << row;
     }
 }
 
-TEST_F(KivctlTest, PagesAndCompletionListAllThatTheHelpLists)
+TEST_F(KivctlTest, PagesAndCompletionCoverTheWholeHelp)
 {
     const std::string man = std::regex_replace(Kivctl("print-man-page").out, std::regex(R"(\\([-:]))"), "$1");
     const std::string general = Kivctl("--help").out, page = Contents(KIV_DOCS "/kivctl.md");
@@ -79,7 +85,7 @@ TEST_F(KivctlTest, PagesAndCompletionListAllThatTheHelpLists)
 
         const std::string below = man.substr(man.find(verb.empty() ? ".SH OPTIONS" : ".SS \"" + verb + " ["));
         Words described = All(R"((?:\\fB|, )(--?[a-z-]+))", below.substr(0, below.find("\n.S")));
-        described.insert({"-h", "--help"}); // told once for all verbs
+        described.insert({"-h", "--help"}); // described once for all verbs
         EXPECT_THAT(described, testing::IsSupersetOf(All(inHelp, help))) << verb;
     }
     EXPECT_EQ(24U, verbs.size());
@@ -98,7 +104,7 @@ TEST_F(KivctlTest, PagesAndCompletionListAllThatTheHelpLists)
     }
 }
 
-TEST_F(KivctlTest, CompletesWhatFitsTheWordsBefore)
+TEST_F(KivctlTest, CompletesByTheWordsBefore)
 {
     for (const char* record : {"status 7 org.a.B /x a.b", "auth all org.c.D /y c.d", "push mail org.a.B /x a.b"})
         Kivctl(std::string("subscribers add ") + record);
@@ -107,22 +113,25 @@ TEST_F(KivctlTest, CompletesWhatFitsTheWordsBefore)
         {"device set runtime.flight-mode=t", "runtime.flight-mode=true\n"},
         {"device set -p ./x network.wifi-device=", "network.wifi-device=off\nnetwork.wifi-device=on\n"},
         {"device set sim1.sms", "sim1.sms-status=\twhether the modem is ready for text messages\n"},
-        {"device get sim1.imei", "sim1.imei\tnumber of the modem\n"},
+        {"device get sim1.imei", "sim1.imei\tIMEI of the modem\n"},
         {"device unset runtime.fl", "runtime.flight-mode\twhether flight mode is on\n"},
-        {"device set --from sl", "slow-sim\tone slot, its SIM ready at the fourth look\n"},
-        {"profiles show roa", "roaming\tone slot, its SIM in a foreign network with data allowed\n"},
-        {"network --profile=ro", "--profile=roaming\tone slot, its SIM in a foreign network with data allowed\n:files\n"},
+        {"device set --from sl", "slow-sim\tone slot, its SIM ready at the fourth read\n"},
+        {"profiles show roa", "roaming\tone slot, its SIM roaming, with data allowed\n"},
+        {"network --profile=ro", "--profile=roaming\tone slot, its SIM roaming, with data allowed\n:files\n"},
         {"-p nothing", ":files\n"},
         {"notify on --to ''", "subscribers\nmanager\n"},
         {"notify on --service 7 po", "policy\n"},
         {"--color=a", "--color=auto\n--color=always\n"},
-        {"sim w", "wait\tWait until a SIM is usable, asking once a second\n"},
-        {"sim --sl", "--slot\tOnly this slot, counted from 0\n"},
+        {"sim w", "wait\tWait until a SIM is usable, checking once a second\n"},
+        {"sim --sl", "--slot\tUse only this slot, counted from 0\n"},
         {"subscribers remove ''", "auth\npush\nstatus\n"},
         {"subscribers remove status ''", "7\n"},
         {"subscribers remove push mail ''", "org.a.B\n"},
         {"subscribers add status ''", "7\nall\n"},
         {"completion ''", "bash\nzsh\nfish\n"},
+        {"sim wait --fields ''", "usable_slot\nwaited_seconds\n"},
+        {"device id --fields=d", "--fields=device_id\n"},
+        {"network --fields wifi,", "wifi,cellular\nwifi,bluetooth\nwifi,connected\n"},
     };
     for (const auto& [words, offered] : cases)
         EXPECT_EQ(offered, Complete(words)) << words;

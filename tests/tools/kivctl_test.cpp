@@ -13,54 +13,54 @@ TEST_F(KivctlTest, EndsWithTheDocumentedExitCode)
         {"sim --slott 1", 2, "", "did you mean \"--slot\"?"},
         {"sim --profile Singel", 10, "", "host (did you mean \"single\"?)"},
         {"device set --profile ./x sim1.mscn=1", 10, "", "did you mean \"msin\"?"},
-        {"device set --profile ./x sim0.mcc=45", 10, "", "./x: [sim0] mcc: \"45\" is wrong; 3 digits would be right"},
-        {"device set --profile ./x sim0.mnc=4x", 10, "", "[sim0] mnc: \"4x\" is wrong; 2 to 3 digits would be right"},
-        {"device set --profile ./x 'sim0.card-status=2;;3'", 10, "", "\"2;;3\" is wrong; card-error (0), no-card (1), "},
-        {"device set --profile ./x sim1.cp-name=modem0", 10, "", "[sim1] cp-name: \"modem0\" is that of sim0"},
+        {"device set --profile ./x sim0.mcc=45", 10, "", "./x: [sim0] mcc: \"45\" is invalid; expected 3 digits"},
+        {"device set --profile ./x sim0.mnc=4x", 10, "", "[sim0] mnc: \"4x\" is invalid; expected 2 to 3 digits"},
+        {"device set --profile ./x 'sim0.card-status=2;;3'", 10, "", "\"2;;3\" is invalid; expected card-error (0), no-card (1), "},
+        {"device set --profile ./x sim1.cp-name=modem0", 10, "", "[sim1] cp-name: \"modem0\" is the name of sim0"},
         {"device set --profile ./x sim4.cp-name=modem4", 10, "", "[sim2] cp-name: missing"},
         {"device set --profile ./x sim8.cp-name=modem8", 10, "", "[sim8]: no such group; slots are sim0 to sim7"},
         {"device set --profile ./x sim1.mnc=123", 10, "", "[sim1] msin: too long"},
-        {"device set --profile ./x 'network.cellular=5 bars'", 10, "", "available (4) or connected (5) would be right"},
-        {"device set --profile ./x network.wifi-connection=-2", 10, "", "\"-2\" is wrong; failure (-1), "},
-        {"device set --profile ./x storage.block-size=4294967296", 10, "", "[storage] block-size: \"4294967296\" is wrong"},
-        {"device set --profile ./x 'run\ttime.wifi=1'", 10, "", "a bracket, a blank or a control character in it"},
+        {"device set --profile ./x 'network.cellular=5 bars'", 10, "", "available (4) or connected (5)"},
+        {"device set --profile ./x network.wifi-connection=-2", 10, "", "\"-2\" is invalid; expected failure (-1), "},
+        {"device set --profile ./x storage.block-size=4294967296", 10, "", "[storage] block-size: \"4294967296\" is invalid"},
+        {"device set --profile ./x 'run\ttime.wifi=1'", 10, "", "a bracket, a blank or a control character in its group or key"},
         {"device set --profile ./x sim2.cp-name=modem2 sim2.mcc=450", 10, "",
-            "[sim2] mnc: missing; mcc, mnc and msin stand together"},
+            "[sim2] mnc: missing; expected all of mcc, mnc and msin, or none"},
         {"device set --profile ./x network.wifi=conected", 10, "", "(did you mean \"connected\"?)"},
         {"device set --profile ./x run-time.flight-mode=true", 10, "", "faults (did you mean \"runtime\"?)"},
         {"device set --profile ./x faults.tel_inti=-5", 10, "", "no such function of the platform (did you mean \"tel_init\"?)"},
-        {"device set --profile ./x faults.tel_init@0=-5", 10, "", "\"@0\" is wrong; @ and a number from 1 to 1000000"},
+        {"device set --profile ./x faults.tel_init@0=-5", 10, "", "\"@0\" is invalid; expected @ and a number from 1 to 1000000"},
         {"device set --profile ./x faults.tel_init=0", 10, "",
-            "\"0\" is wrong; a number from -2147483648 to 2147483647, but not 0"},
+            "\"0\" is invalid; expected a number from -2147483648 to 2147483647, but not 0"},
         {"network --profile ./fifo", 10, "", "./fifo: not a regular file"},
-        {"device set --profile ./x flight-mode=true", 10, "", "GROUP.KEY=VALUE is needed"},
+        {"device set --profile ./x flight-mode=true", 10, "", "expected GROUP.KEY=VALUE"},
         {"device set --profile ./broken runtime.flight-mode=true", 10, "", "./broken: [device] serial: not UTF-8, or a backslash"},
         {"device set --profile ./x device.serial=\xff", 10, "", "[device] serial: the value is not UTF-8"},
-        {"device set --profile host runtime.flight-mode=true", 2, "", "what can be changed here is a device file"},
+        {"device set --profile host runtime.flight-mode=true", 2, "", "only a device file can be changed"},
         {"sim --profile host", 1, "", "ModemManager does not run"},
         {"network --profile host", 1, "off (NetworkManager does not run)", ""},
         {"device --profile host", 0, "(not available on this machine)", ""},
         {"doctor --profile host", 1, "ModemManager      no   does not run", ""},
-        {"subscribers", 2, "", "a verb is needed: list, add, remove"},
-        {"country 450 kr", 2, "", "one word too many"},
-        {"sim --slot 1 wait", 2, "", "--slot belongs to \"sim\" alone"},
+        {"subscribers", 2, "", "missing verb; expected one of list, add, remove"},
+        {"country 450 kr", 2, "", "unexpected word \"kr\" after kivctl country; see kivctl country --help"},
+        {"sim --slot 1 wait", 2, "", "--slot is an option of \"sim\"; those of \"sim wait\" go after it"},
         {"country 352", 0, "Grenada", "--by calling"},
         {"country 352 --by calling", 0, "Luxembourg", ""},
         {"device --profile no-telephony", 0, "no modem answered", ""},
         {"device --package a.b --json", 0, "\"package_version\": null", ""},
         {"device set runtime.flight-mode=true", 2, "", "--profile"},
         {"sim --show-ids --json", 0, "\"450050123456789\"", ""},
-        {"sim --slot -1", 2, "", "a number from 0 up"},
-        {"sim --slot 2", 1, "", "slots count from 0"},
+        {"sim --slot -1", 2, "", "expected 0 or a positive whole number"},
+        {"sim --slot 2", 1, "", "slots are counted from 0"},
         {"notify on", 2, "", "--service"},
         {"notify policy --service 7", 2, "", "--texts"},
-        {"notify on --service 7", 1, "subscribers=0", "nobody has subscribed"},
+        {"notify on --service 7", 1, "subscribers=0", "there are no subscribers to this event"},
         {"notify on --service 7 --to manager", 1, "", "no call result"},
         {"notify auth-success --profile none", 1, "", "--imsi"},
         {"subscribe --kind status", 2, "", "--key"},
         {"subscribers add status 7 7up /a a.b", 4, "", "7up"},
         {"subscribers remove status 7 a.b /a a.b", 1, "", "no such subscription"},
-        {"sim wait --profile none", 1, "", "waiting makes no SIM usable"},
+        {"sim wait --profile none", 1, "", "waiting does not make a SIM usable"},
         {"sim wait --profile pin-required --timeout 0", 3, "", "no SIM is usable after 0 s"},
         {"network --profile no-telephony", 1, "out of service", ""},
         {"country +81", 0, "Japan", ""},
@@ -76,18 +76,19 @@ TEST_F(KivctlTest, EndsWithTheDocumentedExitCode)
         {"network -p './\x1b[31m\n'", 10, "", "./\\x1b[31m\\n"},
         {"device --fields nam,model", 2, "", "there is no field \"nam\" (did you mean \"name\"?); the fields are name, model,"},
         {"subscribers list --fields key,x", 2, "", "the fields are kind, key, bus_name, object_path, interface"},
+        {"sim wait -p none --fields slot", 2, "", "the fields are usable_slot, waited_seconds"}, // before it waits
         {"notify auth --fields event", 2, "", "--fields and --terse are for queries"},
         {"-j --fields slot,service-type,imsi sim -p single", 0,
             "{\n    \"slot\": 0,\n    \"service_type\": 6,\n    \"imsi\": \"45005**********\",\n    \"notes\": {\n"
             "      \"imsi\": \"masked; --show-ids shows all of it\"\n",
             ""},
-        {"push m --data d --message m --time now", 2, "", "--time: \"now\" is wrong; a whole number of 64 bits would be right"},
-        {"device --storage x", 2, "", "--storage: \"x\" is wrong; a number would be right"},
+        {"push m --data d --message m --time now", 2, "", "--time: \"now\" is invalid; expected a 64-bit whole number"},
+        {"device --storage x", 2, "", "--storage: \"x\" is invalid; expected a number"},
         {"country 450 --by", 2, "", "--by needs a value: mcc|alpha2|calling|service"},
         {"--color always -p single --fields slot sim", 0, "\033[1mslot\033[0m\n", ""},
-        {"subscribers list --json", 0, "[]", "nobody"},
+        {"subscribers list --json", 0, "[]", "there are no subscriptions in "},
         {"subscribers add auth all a.b /a a.b --json", 0, "\"result\": \"added\",\n  \"kind\": \"auth\"", ""},
-        {"subscribers add auth all a.b /a a.b --json", 0, "\"result\": \"unchanged\"", "was subscribed before"},
+        {"subscribers add auth all a.b /a a.b --json", 0, "\"result\": \"unchanged\"", "this subscription already exists"},
         {"subscribers remove auth all a.b /a a.b --json", 0, "\"result\": \"removed\"", ""},
     };
     EXPECT_EQ(0, mkfifo("fifo", 0600));
@@ -104,7 +105,7 @@ TEST_F(KivctlTest, EndsWithTheDocumentedExitCode)
     const Outcome mistyped("env KIV_PROFILE=tripel KIV_LOG=verbose " KIVCTL " network");
     EXPECT_EQ(10, mistyped.exit);
     EXPECT_EQ(2, std::count(mistyped.err.begin(), mistyped.err.end(), '\n')) << mistyped.err;
-    EXPECT_THAT(mistyped.err, HasSubstr("kivctl: KIV_LOG: \"verbose\" is wrong; error, info or journal would be right\n"));
+    EXPECT_THAT(mistyped.err, HasSubstr("kivctl: KIV_LOG: \"verbose\" is invalid; expected error, info or journal\n"));
 }
 
 TEST_F(KivctlTest, SaysThatTheOutputCannotBeWritten)
@@ -116,11 +117,17 @@ TEST_F(KivctlTest, SaysThatTheOutputCannotBeWritten)
         EXPECT_EQ(7, outcome.exit) << arguments;
         EXPECT_EQ("kivctl: cannot write to standard output: No space left on device\n", outcome.err) << arguments;
     }
-    // A reader that has gone ends a stream.
+    for (const char* service : {KIV_BOARD_DAEMON, KIV_SERVICE_MANAGER, KIV_SUBSCRIPTION_SERVICE})
+    {
+        const Outcome outcome("sh -c '" + std::string(service) + " >/dev/full'");
+        EXPECT_EQ(1, outcome.exit) << service;
+        EXPECT_THAT(outcome.err, HasSubstr(": cannot write to standard output: No space left on device\n"));
+    }
+    // A reader that closes a stream ends it without an error.
     EXPECT_EQ(0, Outcome("bash -c 'exec 3> >(:); wait $!; " KIVCTL " subscribe --kind auth >&3'").exit);
 }
 
-/// What the program prints on a terminal that is as wide.
+/// The lines that the program prints on a terminal of that width.
 std::vector<std::string> OnTerminal(const std::string& columns, const std::string& arguments)
 {
     const std::string out =
@@ -144,10 +151,10 @@ TEST_F(KivctlTest, PrintsNoLineThatIsWiderThanTheTerminal)
         OnTerminal("40", "--color never --fields slot,card sim"));
     EXPECT_EQ((std::vector<std::string>{"slot  card", "0     ready", "1     ready"}),
         OnTerminal("80", "--color never --fields slot,card sim"));
-    EXPECT_THAT(OnTerminal("40", "sim --help"), testing::IsSupersetOf({"  --slot N", "    Only this slot, counted from 0"}));
+    EXPECT_THAT(OnTerminal("40", "sim --help"), testing::IsSupersetOf({"  --slot N", "    Use only this slot, counted from 0"}));
 }
 
-TEST_F(KivctlTest, PausesBetweenTwoQuestionsWhileItWaitsForASim)
+TEST_F(KivctlTest, PausesBetweenTwoChecksWhileItWaitsForASim)
 {
     Kivctl("device set -p ./slow 'sim0.card-status=2;3' sim1.card-status=1");
     EXPECT_NE("0:0\n", Kivctl("sim wait -p ./slow -t --fields usable_slot,waited_seconds").out);
@@ -155,7 +162,7 @@ TEST_F(KivctlTest, PausesBetweenTwoQuestionsWhileItWaitsForASim)
 
 TEST_F(KivctlTest, ShowsColoursAndProgressOnATerminal)
 {
-    const std::string colour = "\033[1m", progress = "\r\033[Klooking at the bus";
+    const std::string colour = "\033[1m", progress = "\r\033[Kchecking the bus";
     const std::string onTerminal = " script --quiet --echo never --command '" KIVCTL " doctor' /dev/null";
     EXPECT_THAT(Outcome("env -u NO_COLOR TERM=xterm" + onTerminal).out, AllOf(HasSubstr(colour), HasSubstr(progress)));
     EXPECT_THAT(Outcome("env NO_COLOR=1 TERM=xterm" + onTerminal).out, AllOf(testing::Not(HasSubstr(colour)), HasSubstr(progress)));

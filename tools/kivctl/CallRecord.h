@@ -5,7 +5,7 @@
 
 #include <BusCall.h>
 
-/// A call from the bus as a line to print: its kind as "event", then its values by name.
+/// A call from the bus as a record: its kind as "event", then its values by name.
 Record CallRecord(const kiv::BusCall& call);
 
 #endif

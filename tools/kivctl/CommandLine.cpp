@@ -7,6 +7,7 @@
 #include "VerbOptions.h"
 
 #include <CLI/CLI.hpp>
+#include <StandardOutput.h>
 
 #include <unistd.h>
 
@@ -20,10 +21,10 @@ namespace
 {
 
 constexpr char kAbout[] =
-    "Ask the device what an agent asks, send what an agent sends, run a client service, and change the simulated "
-    "device.";
+    "Query the device as an agent does, send an agent's notifications and push messages, run a client service, and change the "
+    "simulated device.";
 
-/// What --help says below everything else.
+/// The end of the program's help.
 std::string Footer()
 {
     std::string text = "Exit codes:\n";
@@ -40,7 +41,7 @@ std::string Footer()
 
 constexpr char kVerbFooter[] = R"(Options of every verb: --json, --profile NAME|FILE, --color WHEN
 Options of every query: --fields NAME,NAME, --terse
-kivctl --help describes these, the exit codes and the environment.)";
+kivctl --help describes these options, the exit codes and the environment.)";
 
 OptionManual Describe(const CLI::Option& option, const CLI::Formatter& formatter)
 {
@@ -56,41 +57,41 @@ OptionManual Describe(const CLI::Option& option, const CLI::Formatter& formatter
     return manual;
 }
 
-VerbManual Describe(const CLI::App& app, const std::string& path, const CLI::Formatter& formatter)
+VerbManual Describe(const CLI::App& app, const std::string& path, const Command& command, const CLI::Formatter& formatter)
 {
     VerbManual manual;
     manual.path = path;
     manual.usage = formatter.make_usage(&app, path.empty() ? app.get_name() : path);
     manual.usage = CLI::detail::trim_copy(manual.usage.substr(manual.usage.find(' ')));
     manual.help = app.get_description();
+    if (const auto fields = command.fields.find(&app); fields != command.fields.end())
+        manual.fields = fields->second;
     for (const CLI::Option* option : app.get_options())
         manual.options.push_back(Describe(*option, formatter));
     for (const CLI::App* verb : app.get_subcommands([](const CLI::App* candidate) { return !candidate->get_group().empty(); }))
-        manual.verbs.push_back(Describe(*verb, path + (path.empty() ? "" : " ") + verb->get_name(), formatter));
+        manual.verbs.push_back(Describe(*verb, path + (path.empty() ? "" : " ") + verb->get_name(), command, formatter));
     return manual;
 }
 
-/// Adds what describes the command line itself: the completion of a shell, and for the build the manual page.
+/// Adds the verbs that describe the command line itself: the shells' completion scripts and, for the build, the manual page.
 void AddDescriptions(CLI::App& app, Command& command, const CLI::Formatter& formatter)
 {
     const auto print = [&command](const std::string& text)
     {
         command.deviceUse = DeviceUse::Leaves;
-        command.prints = Prints::Events;
         command.verb = [text]
         {
-            Write(text);
+            kiv::StandardOutput::Write(text);
             return Exit::Done;
         };
     };
-    CLI::App* completion =
-        app.add_subcommand("completion", "Print the completion of this command line for a shell")->group("Verbs");
+    CLI::App* completion = app.add_subcommand("completion", "Print the completion script of a shell")->group("Verbs");
     const auto shell = std::make_shared<std::string>();
-    Restrict(completion->add_option("SHELL", *shell, "Shell that reads it")->required(), CompletionShells());
+    Restrict(completion->add_option("SHELL", *shell, "Shell to complete in")->required(), CompletionShells());
     completion->callback([print, shell] { print(CompletionScript(*shell)); });
     app.add_subcommand("print-man-page")
         ->group("")
-        ->callback([print, &app, &formatter] { print(ManPage(Describe(app, "", formatter))); });
+        ->callback([print, &app, &command, &formatter] { print(ManPage(Describe(app, "", command, formatter))); });
 }
 
 std::vector<std::string> FieldNames(const std::string& text)
@@ -103,31 +104,31 @@ std::vector<std::string> FieldNames(const std::string& text)
 
 void AddGlobalOptions(CLI::App& app, Command& command)
 {
-    app.set_help_flag("-h,--help", "Show this help and end");
-    app.set_version_flag("-V,--version", "kivctl " KIV_VERSION)->description("Show the version and end");
+    app.set_help_flag("-h,--help", "Show this help and exit");
+    app.set_version_flag("-V,--version", "kivctl " KIV_VERSION)->description("Show the version and exit");
     Form& form = command.form;
     CLI::Option* const json = app.add_flag_callback(
-        "-j,--json", [&form] { form.notation = Form::Notation::Json; }, "Print JSON, one object per line for events");
+        "-j,--json", [&form] { form.notation = Form::Notation::Json; }, "Print JSON; for events, one object per line");
     app.add_flag_callback(
            "-t,--terse", [&form] { form.notation = Form::Notation::Terse; },
-           "Print values only, one record per line, with \":\" between values, and \"\\\" before \":\" and \"\\\"; for queries")
+           "In queries, print only values, one record per line, separated by \":\" (\":\" in a value becomes \"\\:\")")
         ->excludes(json);
     app.add_option_function<std::string>(
            "--fields", [&form](const std::string& text) { form.fields = FieldNames(text); },
-           "Print these fields only, in this order, by their names in JSON; for queries")
+           "In queries, print only these fields, in this order; the help of each query lists its fields")
         ->type_name("NAME,NAME");
     CLI::Option* const colour = app.add_option_function<std::string>(
         "--color",
         [&form](const std::string& when) {
             form.colour = when == "auto" ? Form::Colour::Auto : when == "always" ? Form::Colour::Always : Form::Colour::Never;
         },
-        "When to use colour (default: auto, on a terminal)");
+        "Use colour always, never, or on a terminal only (default: auto)");
     Restrict(colour, {"auto", "always", "never"});
-    app.add_option("-p,--profile", command.profile, "The device: a file, or the name of a profile (kivctl profiles)")
+    app.add_option("-p,--profile", command.profile, "Device to use: a device file, or a name that kivctl profiles lists")
         ->type_name("NAME|FILE");
 }
 
-/// The verb that was typed, with those above it; the words that may follow it.
+/// The verb that was typed, and the options and verbs that may follow it.
 struct Place
 {
     const CLI::App* app;
@@ -155,7 +156,7 @@ Place FindPlace(const CLI::App& program)
     return place;
 }
 
-/// The words of the parser for a value that is missing, in plain ones.
+/// Rewords the parser's message about a missing value.
 std::string Plain(const std::string& text)
 {
     const std::string number = " required ", missing = " missing";
@@ -168,30 +169,34 @@ std::string Plain(const std::string& text)
            text.substr(type, text.rfind(missing) - type);
 }
 
-/// What was wrong with the command line, and what would be right. An unknown word is named first: other faults follow from it.
+/// Says what is wrong with the command line and what is expected. Reports an unknown word first, because it causes other errors.
 std::string Explain(const CLI::App& program, const CLI::ParseError& error)
 {
     const Place place = FindPlace(program);
-    const std::string more = "; " + place.verb + " --help tells more";
+    const std::string more = "; see " + place.verb + " --help";
     const std::vector<std::string> unknown = program.remaining(true);
     const auto option =
         std::find_if(unknown.begin(), unknown.end(), [](const std::string& word) { return word.rfind('-', 0) == 0; });
     if (option != unknown.end())
-        return '"' + *option + "\" is no option of " + place.verb + DidYouMean(*option, place.options) + more;
+        return "unknown option \"" + *option + "\" of " + place.verb + DidYouMean(*option, place.options) + more;
     if (!unknown.empty() && place.verbs.empty())
-        return '"' + unknown.front() + "\" is one word too many for " + place.verb + more;
+        return "unexpected word \"" + unknown.front() + "\" after " + place.verb + more;
     if (!unknown.empty())
-        return '"' + unknown.front() + "\" is no verb of " + place.verb + DidYouMean(unknown.front(), place.verbs) + more;
+        return "unknown verb \"" + unknown.front() + "\" of " + place.verb + DidYouMean(unknown.front(), place.verbs) + more;
     const bool lacksVerb = place.app->get_require_subcommand_min() > 0 && place.app->get_subcommands().empty();
-    return (lacksVerb ? "a verb is needed: " + Joined(place.verbs, ", ") : Plain(error.what())) + more;
+    return (lacksVerb ? "missing verb; expected one of " + Joined(place.verbs, ", ") : Plain(error.what())) + more;
 }
 
-/// The choice of fields is for what has fields.
+/// Refuses the wrong fields before the verb runs, because some verbs take long.
 void CheckForm(const CLI::App& program, const Command& command)
 {
+    const Place place = FindPlace(program);
+    const auto fields = command.fields.find(place.app);
     const bool isChosen = command.form.notation == Form::Notation::Terse || !command.form.fields.empty();
-    if (command.verb && command.prints == Prints::Events && isChosen)
-        throw Failure(Exit::Usage, "--fields and --terse are for queries, and " + FindPlace(program).verb + " is none");
+    if (fields != command.fields.end())
+        RequireFields(fields->second, command.form);
+    else if (command.verb && isChosen)
+        throw Failure(Exit::Usage, "--fields and --terse are for queries, and " + place.verb + " is not a query");
 }
 
 } // namespace
@@ -202,6 +207,7 @@ void ReadCommandLine(int argc, char** argv, Command& command)
     formatter->column_width(28);
     formatter->label("REQUIRED", "(required)");
     formatter->label("SUBCOMMAND", "VERB");
+    formatter->label("Excludes", "Not with");
     formatter->label("Positionals", "Operands");
     CLI::App app(kAbout, "kivctl");
     app.formatter(formatter);
@@ -211,9 +217,9 @@ void ReadCommandLine(int argc, char** argv, Command& command)
     AddGlobalOptions(app, command);
     AddVerbs(app, command);
     AddDescriptions(app, command, *formatter);
-    app.footer(Footer()); // the verbs have taken theirs
+    app.footer(Footer()); // the verbs have copied the other one
     if (argc > 1 && std::strcmp(argv[1], kCompletionVerb) == 0)
-        return Write(Completions(Describe(app, "", *formatter), {argv + 2, argv + argc}));
+        return kiv::StandardOutput::Write(Completions(Describe(app, "", command, *formatter), {argv + 2, argv + argc}));
     try
     {
         app.parse(argc, argv);
@@ -223,7 +229,7 @@ void ReadCommandLine(int argc, char** argv, Command& command)
     {
         std::ostringstream text;
         app.exit(success, text);
-        Write(WrappedHelp(text.str(), TerminalWidth(STDOUT_FILENO)));
+        kiv::StandardOutput::Write(WrappedHelp(text.str(), TerminalWidth(STDOUT_FILENO)));
     }
     catch (const CLI::ParseError& error)
     {

@@ -4,7 +4,7 @@
 #include "Kivctl.h"
 
 /// Reads the command line.
-/// @param command  receives what it asks for; without a verb when everything is done already, as with --help
+/// @param command  receives the result; without a verb when nothing is left to do, as after --help
 /// Throws Failure.
 void ReadCommandLine(int argc, char** argv, Command& command);
 

@@ -37,7 +37,7 @@ const OptionManual* FindOption(const VerbManual& verb, const std::string& name)
     return nullptr;
 }
 
-/// Where the last word of a command line is: the verb, its operands before that word, and the option whose value it is.
+/// The place of the last word in a command line: the verb, the operands before the word, and the option whose value the word is.
 struct Place
 {
     const VerbManual* program;
@@ -73,8 +73,8 @@ struct Place
     }
 };
 
-/// The recorded values of the operand that follows those of a subscription. For a new one, these are the keys of its kind, and
-/// "all", and then the values of any subscription.
+/// The values that the next operand has in the recorded subscriptions that match the operands before it. For a new subscription,
+/// the operand after the kind is one of that kind's keys or "all", and later ones are those of any subscription.
 Candidates Recorded(const std::vector<std::string>& operands, bool isNew)
 {
     std::vector<DASubscription> subscriptions;
@@ -98,7 +98,7 @@ Candidates Recorded(const std::vector<std::string>& operands, bool isNew)
     return candidates;
 }
 
-/// The keys of a device file, with `end` behind each; those of a slot under the group of the one that is typed.
+/// The keys of a device file, each followed by `end`. Keys of slots get the slot that is typed.
 Candidates Keys(const std::string& typed, const char* end)
 {
     const bool isOfSlot = typed.rfind("sim", 0) == 0 && typed.find('.') == 4;
@@ -114,7 +114,7 @@ Candidates Keys(const std::string& typed, const char* end)
     return candidates;
 }
 
-/// "GROUP.KEY=" for every key, or the values behind it.
+/// "GROUP.KEY=" for every key; after the "=", each value of the key.
 Candidates Assignments(const std::string& typed)
 {
     const std::string key = typed.substr(0, typed.find('='));
@@ -140,10 +140,25 @@ Candidates Profiles()
     return candidates;
 }
 
-/// What an option's value may be.
-Candidates ValuesOf(const OptionManual& option)
+/// The list of fields that is typed, with one more field in place of the last, unfinished one.
+Candidates FieldLists(const VerbManual& verb, const std::string& typed)
+{
+    const std::string before = typed.substr(0, typed.rfind(',') + 1);
+    Candidates candidates;
+    for (const std::string& field : verb.fields)
+    {
+        if ((',' + before).find(',' + field + ',') == before.npos)
+            candidates.push_back({before + field});
+    }
+    return candidates;
+}
+
+/// The possible values of an option.
+Candidates ValuesOf(const OptionManual& option, const VerbManual& verb, const std::string& typed)
 {
     Candidates candidates;
+    if (option.names.back() == "--fields")
+        return FieldLists(verb, typed);
     if (option.names.back() == "--profile")
     {
         candidates = Profiles();
@@ -158,7 +173,7 @@ Candidates ValuesOf(const OptionManual& option)
     return candidates;
 }
 
-/// What the next operand may be.
+/// The possible values of the next operand.
 Candidates Operands(const Place& place, const std::string& typed)
 {
     std::vector<const OptionManual*> operands;
@@ -177,7 +192,7 @@ Candidates Operands(const Place& place, const std::string& typed)
         return Keys(typed, "");
     const bool isNew = place.verb->path == "subscribers add";
     if ((!isNew && place.verb->path != "subscribers remove") || (isNew && index == 0))
-        return ValuesOf(operand);
+        return ValuesOf(operand, *place.verb, typed);
     return Recorded(place.operands, isNew);
 }
 
@@ -213,12 +228,12 @@ Candidates Options(const Place& place)
 Candidates Following(const Place& place, const std::string& typed)
 {
     if (place.option != nullptr)
-        return ValuesOf(*place.option);
+        return ValuesOf(*place.option, *place.verb, typed);
     const size_t equals = typed.find('=');
     if (IsOption(typed) && equals != typed.npos)
     {
         const OptionManual* const option = place.Find(typed.substr(0, equals));
-        Candidates candidates = option == nullptr ? Candidates() : ValuesOf(*option);
+        Candidates candidates = option == nullptr ? Candidates() : ValuesOf(*option, *place.verb, typed.substr(equals + 1));
         for (Candidate& candidate : candidates)
         {
             if (candidate.word != kFiles)

@@ -6,17 +6,17 @@
 #include <string>
 #include <vector>
 
-/// The first word behind "kivctl" when a shell asks what may follow; the words of the command line are behind it.
+/// The first word after "kivctl" when a shell asks for completions; the words of the command line follow it.
 inline constexpr char kCompletionVerb[] = "complete-words";
 
 /// The shells for which there is a script.
 std::vector<std::string> CompletionShells();
 
-/// What one of those shells reads to complete kivctl's command line; it asks kivctl on each completion.
+/// The completion script of one of those shells. The script asks kivctl on each completion.
 std::string CompletionScript(const std::string& shell);
 
-/// What may follow, one candidate per line, with a tab and its description where there is one; ":files" where a file may.
-/// @param words  those behind "kivctl"; the last one is to be completed, and may be empty
+/// The possible next words, one per line, each with a tab and a description if it has one; ":files" where a file is possible.
+/// @param words  the words after "kivctl"; the last one, possibly empty, is to be completed
 std::string Completions(const VerbManual& program, const std::vector<std::string>& words);
 
 #endif

@@ -5,11 +5,11 @@
 namespace
 {
 
-constexpr char kBash[] = R"(# Completion of kivctl's command line for bash: asks kivctl what may follow.
+constexpr char kBash[] = R"(# Completion of kivctl's command line for bash: asks kivctl for the next words.
 
 _kivctl()
 {
-    # Bash breaks words at "=" and ":" too; what follows without a blank belongs to the word before.
+    # Bash also breaks words at "=" and ":"; a part that follows without a blank belongs to the word before it.
     local rest=${COMP_LINE:0:COMP_POINT} word prefix line
     local -a words=() lines=()
     for word in "${COMP_WORDS[@]:0:COMP_CWORD}"; do
@@ -44,7 +44,7 @@ _kivctl()
     done
     [[ ${COMPREPLY[0]-} == *= ]] && compopt -o nospace
 
-    # What is inserted replaces the last of bash's own words alone.
+    # Bash replaces only the last of its own words.
     prefix=${current%"${current##*[=:]}"}
     if [[ $COMP_WORDBREAKS == *=* && $COMP_WORDBREAKS == *:* ]]; then
         COMPREPLY=("${COMPREPLY[@]#"$prefix"}")
@@ -55,7 +55,7 @@ complete -F _kivctl kivctl
 )";
 
 constexpr char kZsh[] = R"(#compdef kivctl
-# Completion of kivctl's command line for zsh: asks kivctl what may follow.
+# Completion of kivctl's command line for zsh: asks kivctl for the next words.
 
 _kivctl()
 {
@@ -82,7 +82,7 @@ _kivctl()
     fi
 }
 
-# Read from a folder of completions, this file is the function; otherwise it defines it.
+# In a folder of completions this file is the body of the function; when sourced, it defines the function.
 if [[ ${funcstack[1]-} == _kivctl ]]; then
     _kivctl "$@"
 else
@@ -90,7 +90,7 @@ else
 fi
 )";
 
-constexpr char kFish[] = R"(# Completion of kivctl's command line for fish: asks kivctl what may follow.
+constexpr char kFish[] = R"(# Completion of kivctl's command line for fish: asks kivctl for the next words.
 
 function __kivctl_candidates
     set -l before (commandline --tokenize --cut-at-cursor --current-process)

@@ -8,7 +8,7 @@
 namespace
 {
 
-/// What a key may be, and the lookup that leads from it to an MCC; a key that is an MCC needs none.
+/// A type of key, and the function that looks up its MCC; null for an MCC.
 struct KeyKind
 {
     const char* word;
@@ -28,7 +28,7 @@ constexpr const KeyKind& kAlpha2 = kKeyKinds[1];
 constexpr const KeyKind& kCalling = kKeyKinds[2];
 constexpr const KeyKind& kService = kKeyKinds[3];
 
-/// What is known of an MCC.
+/// One fact about an MCC.
 struct Fact
 {
     const char* name;
@@ -72,12 +72,12 @@ const KeyKind& Guess(const std::string& key)
         std::vector<std::string> shapes;
         for (const KeyKind& kind : kKeyKinds)
             shapes.push_back(std::string(kind.name) + ": " + kind.shape);
-        throw Failure(Exit::Usage, '"' + key + "\" is no key of a country; one is", shapes);
+        throw Failure(Exit::Usage, '"' + key + "\" is not a key of a country; a key is one of", shapes);
     }
     if (key.size() != 3 || !IsKnownMcc(key))
         return kCalling;
     if (Lookup(kCalling.toMcc, key))
-        Note(key + " is taken for an MCC; it is a calling code too: --by calling");
+        Note(key + " was read as an MCC; for the calling code, add --by calling");
     return kMcc;
 }
 
@@ -89,7 +89,7 @@ std::string ToMcc(const KeyKind& kind, const std::string& key)
     if (!kind.toMcc && IsKnownMcc(key))
         return key;
 
-    std::string text = std::string("no country has the ") + kind.name + " \"" + key + "\"; such a key is " + kind.shape;
+    std::string text = std::string("no country has the ") + kind.name + " \"" + key + "\"; expected " + kind.shape;
     throw Failure(Exit::No, text);
 }
 

@@ -5,7 +5,7 @@
 
 Deadline::Deadline(GDBusConnection* connection, std::optional<double> seconds)
 {
-    constexpr double kYear = 365.0 * 24 * 60 * 60; // longer ones would overflow the clock
+    constexpr double kYear = 365.0 * 24 * 60 * 60; // longer waits would overflow the clock
     if (seconds)
         thread_ = std::thread(&Deadline::Wait, this, connection, std::min(*seconds, kYear));
 }

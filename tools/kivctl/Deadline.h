@@ -8,18 +8,18 @@
 #include <optional>
 #include <thread>
 
-/// Closes a bus connection when the time is up, which ends the calls that wait for answers on it: the library's have no time limit.
-/// Waits on a thread of its own, which ends with the object.
+/// Closes a bus connection when the time is up. This ends the calls that wait for answers on it; the library's calls have no time
+/// limit. Waits on a thread of its own, which ends with the object.
 class Deadline
 {
 public:
-    /// @param seconds  none for no deadline
+    /// @param seconds  no deadline when empty
     Deadline(GDBusConnection* connection, std::optional<double> seconds);
     Deadline(const Deadline&) = delete;
     Deadline& operator=(const Deadline&) = delete;
     ~Deadline();
 
-    /// Ends the wait. @return whether the time was up before
+    /// Ends the wait. @return whether the time was already up
     bool WasMissed();
 
 private:

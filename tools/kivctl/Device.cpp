@@ -13,21 +13,23 @@ namespace
 
 using kiv::platform::ReasonFor;
 
-/// @param key  of the device file, by which the device knows why it has no such value
-std::string NotTold(const char* key, int code)
+/// Says why a value is missing.
+/// @param key  of the device file, for which the device may know the reason
+std::string WhyMissing(const char* key, int code)
 {
     const std::string reason = ReasonFor(key);
-    return !reason.empty() ? reason : "the platform does not tell" + (code ? ", code " + std::to_string(code) : std::string());
+    return !reason.empty() ? reason
+                           : "the platform does not provide it" + (code ? ", code " + std::to_string(code) : std::string());
 }
 
-/// @param read  stores a text and gives the platform's code
+/// @param read  stores a text and returns the platform's code
 template <typename Read>
 Field ReadText(const char* name, const char* key, Read read)
 {
     char* text = nullptr;
     const int code = read(&text);
     const LibraryText owner(text);
-    return TextOr(name, text, NotTold(key, code));
+    return TextOr(name, text, WhyMissing(key, code));
 }
 
 Field ReadText(const char* name, const char* key, int (DASystem::*read)(char**))
@@ -35,7 +37,7 @@ Field ReadText(const char* name, const char* key, int (DASystem::*read)(char**))
     return ReadText(name, key, [read](char** text) { return (DASystem::GetInstance()->*read)(text); });
 }
 
-/// The device unique ID as the library answers; the text is the owner's, for all that its type says.
+/// The device unique ID that the library returns. The caller owns the text, although its type is const.
 struct DeviceId
 {
     DeviceId() : code(DASystem::GetInstance()->GetDeviceUniqueID(&text)) {}
@@ -50,10 +52,10 @@ struct DeviceId
 Field Serial()
 {
     const DeviceId id;
-    return TextOr("serial", id.text, id.code ? MeaningOf(id.code) : "the device daemon tells none");
+    return TextOr("serial", id.text, id.code ? MeaningOf(id.code) : "the device daemon returned none");
 }
 
-/// The text that stands in for an IMEI: the local time's offset from UTC, filled up with zeros.
+/// The text that the library returns instead of an IMEI: the local time's offset from UTC, followed by zeros.
 std::string ImeiFallback()
 {
     const std::time_t now = std::time(nullptr);
@@ -69,7 +71,7 @@ Field Imei(Identifiers identifiers)
     Field field = ReadText("imei", "", &DASystem::GetIMEI);
     if (field.value != Value(ImeiFallback()))
         return Masked(std::move(field), 0, 4, identifiers);
-    field.note = "no modem answered; derived from the UTC offset";
+    field.note = "no modem answered; this is the UTC offset";
     return field;
 }
 
@@ -77,14 +79,14 @@ Field FontSize()
 {
     int size = 0;
     const int code = DASystem::GetInstance()->GetFontSize(&size);
-    return code ? Missing("font_size", NotTold("settings.font-size", code)) : Field{"font_size", std::int64_t{size}};
+    return code ? Missing("font_size", WhyMissing("settings.font-size", code)) : Field{"font_size", std::int64_t{size}};
 }
 
 Field CurrentTime()
 {
     std::tm now{};
     if (const int code = DASystem::GetInstance()->GetCurrentTime(&now))
-        return Missing("time", NotTold("", code));
+        return Missing("time", WhyMissing("", code));
     std::array<char, 32> text{};
     std::strftime(text.data(), text.size(), "%Y-%m-%d %H:%M:%S", &now);
     return {"time", std::string(text.data())};
@@ -101,9 +103,9 @@ Field Language(const char* name, LanguageCode which)
     char* text = nullptr;
     const int code = DASystem::GetInstance()->GetDeviceLanguageCode(&text, which == LanguageCode::Iso639);
     const LibraryText owner(text);
-    Field field = TextOr(name, text, "the language has no such code here");
+    Field field = TextOr(name, text, "unknown for this language");
     if (code)
-        field.note = "stands in for a setting that can not be read, code " + std::to_string(code);
+        field.note = "default, because the setting cannot be read, code " + std::to_string(code);
     return field;
 }
 

@@ -3,6 +3,7 @@
 
 #include <DeviceControl.h>
 #include <SourceControl.h>
+#include <StandardOutput.h>
 #include <Visible.h>
 
 #include <algorithm>
@@ -10,20 +11,19 @@
 namespace
 {
 
-/// The file that is to be changed. Ends the verb when the device comes from elsewhere.
+/// The device file to change. Ends the verb when the device does not come from a file.
 std::string RequireFile(const Command& command)
 {
     std::string file = DeviceAskedFor(command);
     if (IsHost(file))
     {
-        throw Failure(Exit::Usage,
-            "the machine itself is changed by its own tools, such as nmcli and mmcli; what can be changed here "
-            "is a device file, which --profile names, such as ./my.profile");
+        throw Failure(Exit::Usage, "only a device file can be changed; give one with --profile, such as ./my.profile (tools such "
+                                   "as nmcli and mmcli change "
+                                   "the machine itself)");
     }
     if (IsProfileName(file))
     {
-        throw Failure(
-            Exit::Usage, "a device that comes from a profile cannot be changed; name a file with --profile, such as ./my.profile");
+        throw Failure(Exit::Usage, "a profile cannot be changed; give a device file with --profile, such as ./my.profile");
     }
     return file;
 }
@@ -34,7 +34,7 @@ void RequireNone(const std::string& trouble)
         throw Failure(Exit::BadDevice, trouble);
 }
 
-/// What identifies a person or a device, and how many characters of it stay at the end where it is masked.
+/// A key that identifies a person or a device, and how many characters at the end of its value are never masked.
 struct Identifier
 {
     const char* key;
@@ -77,7 +77,7 @@ Exit SetInDeviceFile(const DeviceFileOptions& options, const Command& command)
         return Exit::Done;
     }
     if (options.words.empty())
-        throw Failure(Exit::Usage, "nothing to change; GROUP.KEY=VALUE is needed, such as runtime.flight-mode=true");
+        throw Failure(Exit::Usage, "nothing to change; expected GROUP.KEY=VALUE, such as runtime.flight-mode=true");
     std::string madeFrom;
     RequireNone(kiv::platform::SetInDeviceFile(file, options.words, &madeFrom));
     if (!madeFrom.empty())
@@ -109,13 +109,13 @@ Exit ShowDeviceValues(const DeviceValueOptions& options, const Command& command)
         if (!isBare)
             Print({{"key", value.key}, field}, command.form);
         else if (value.value)
-            Write(kiv::platform::Visible(*value.value) + '\n');
+            kiv::StandardOutput::Write(kiv::platform::Visible(*value.value) + '\n');
         else
             Note(value.key + " has no value" + (field.note.empty() ? "" : ": " + field.note));
         return value.value ? Exit::Done : Exit::No;
     }
     throw Failure(Exit::Usage,
-        '"' + options.key + "\" is no key of this device" + DidYouMean(options.key, keys) + "; kivctl device get lists them");
+        '"' + options.key + "\" is not a key of this device" + DidYouMean(options.key, keys) + "; kivctl device get lists them");
 }
 
 Exit ShowDeviceKeys(const Command& command)
@@ -146,13 +146,13 @@ Exit ShowProfile(const ProfileOptions& options, const Command& command)
 {
     const auto text = kiv::platform::TextOfProfile(options.name);
     if (IsHost(options.name))
-        throw Failure(Exit::BadDevice, "the machine itself has no text; kivctl device get --profile host shows its values");
+        throw Failure(Exit::BadDevice, "the machine itself is not a profile; kivctl device get --profile host shows its values");
     if (!text)
         throw Failure(Exit::BadDevice,
-            '"' + options.name + "\" is no profile" + DidYouMean(options.name, ProfileNames()) + "; kivctl profiles lists them");
+            '"' + options.name + "\" is not a profile" + DidYouMean(options.name, ProfileNames()) + "; kivctl profiles lists them");
     if (command.form.notation == Form::Notation::Text && command.form.fields.empty())
     {
-        Write(*text);
+        kiv::StandardOutput::Write(*text);
         return Exit::Done;
     }
     RequireNone(kiv::platform::UseProfile(options.name));

@@ -19,7 +19,7 @@
 namespace
 {
 
-/// What one look found, and what to do about it; nothing is to be done when all is well.
+/// The result of a check, and what to do about it; no remedy when all is well.
 struct Finding
 {
     std::string text;
@@ -27,9 +27,9 @@ struct Finding
 };
 using Findings = std::vector<Finding>;
 
-constexpr int kPatienceMs = 3000; ///< with a service that runs, but may be stuck
+constexpr int kPatienceMs = 3000; ///< how long a service may take to answer
 
-Finding LookAtBus(const Command&)
+Finding CheckBus(const Command&)
 {
     const LibraryLog log;
     int code = 0;
@@ -38,17 +38,17 @@ Finding LookAtBus(const Command&)
     const std::string where = address ? address : "no address";
     if (connection)
         return {where};
-    return {where + ": " + MeaningOf(code), "start dbus-daemon, and have DBUS_SYSTEM_BUS_ADDRESS tell where it listens"};
+    return {where + ": " + MeaningOf(code), "start dbus-daemon, and set DBUS_SYSTEM_BUS_ADDRESS to its address"};
 }
 
-/// A method of the bus itself. @return the reply; null when the bus refuses
+/// Calls a method of the bus itself. @return the reply; null on an error
 GVariant* AskBus(GDBusConnection* connection, const char* method, GVariant* arguments, GError** error = nullptr)
 {
     return g_dbus_connection_call_sync(connection, "org.freedesktop.DBus", "/org/freedesktop/DBus", "org.freedesktop.DBus", method,
         arguments, nullptr, G_DBUS_CALL_FLAGS_NONE, kPatienceMs, nullptr, error);
 }
 
-/// Whether the bus would let this user own a name that nobody owns. There is no other way to know than to take it for a moment.
+/// Whether the bus lets this user own a name that nobody owns. The only way to find out is to own it for a moment.
 bool MayOwn(GDBusConnection* connection, const char* busName)
 {
     constexpr guint kDoNotQueue = 4;
@@ -73,7 +73,7 @@ struct Service
     std::string program;
 };
 
-Finding LookAtService(const Service& service)
+Finding CheckService(const Service& service)
 {
     g_autoptr(GDBusConnection) connection = g_bus_get_sync(G_BUS_TYPE_SYSTEM, nullptr, nullptr);
     if (!connection)
@@ -97,22 +97,22 @@ Finding LookAtService(const Service& service)
     if (isForbidden)
         return {name + " is on the bus, which forbids this user to ask whether it answers"};
     g_dbus_error_strip_remote_error(error);
-    return {name + " does not answer: " + error->message, "look at its process, and start it again"};
+    return {name + " does not answer: " + error->message, "check its process, and restart it"};
 }
 
-Finding LookAtDeviceDaemon(const Command&)
+Finding CheckDeviceDaemon(const Command&)
 {
-    return LookAtService({kiv::BoardDaemon::kBusName, "/Org/Tizen/System/DeviceD/Board", "org.tizen.system.deviced.Board",
+    return CheckService({kiv::BoardDaemon::kBusName, "/Org/Tizen/System/DeviceD/Board", "org.tizen.system.deviced.Board",
         "GetSerial", true, "kiv-board-daemon"});
 }
 
-Finding LookAtServiceManager(const Command&)
+Finding CheckServiceManager(const Command&)
 {
-    return LookAtService({kiv::ServiceManager::kBusName, "/", "org.freedesktop.DBus.Peer", "Ping", false, "kiv-service-manager"});
+    return CheckService({kiv::ServiceManager::kBusName, "/", "org.freedesktop.DBus.Peer", "Ping", false, "kiv-service-manager"});
 }
 
-/// A daemon that the machine itself is known from. Asking does not start it.
-Finding LookAtHostDaemon(const char* name, const std::string& unit, const char* interface, const char* path)
+/// Checks a daemon that provides values of the machine itself, without starting it.
+Finding CheckHostDaemon(const char* name, const std::string& unit, const char* interface, const char* path)
 {
     g_autoptr(GDBusConnection) connection = g_bus_get_sync(G_BUS_TYPE_SYSTEM, nullptr, nullptr);
     if (!connection)
@@ -129,26 +129,25 @@ Finding LookAtHostDaemon(const char* name, const std::string& unit, const char* 
         return {std::string("version ") + (isText ? g_variant_get_string(version, nullptr) : "unknown") + ", answers this user"};
     }
     if (g_error_matches(error, G_DBUS_ERROR, G_DBUS_ERROR_ACCESS_DENIED))
-        return {"not permitted", std::string("have the bus policy of ") + name + " let this user ask it"};
+        return {"not permitted", std::string("allow this user to call ") + name + " in a bus policy"};
     if (g_error_matches(error, G_DBUS_ERROR, G_DBUS_ERROR_SERVICE_UNKNOWN) ||
         g_error_matches(error, G_DBUS_ERROR, G_DBUS_ERROR_NAME_HAS_NO_OWNER))
         return {"does not run", "install and start it: systemctl start " + unit};
     g_dbus_error_strip_remote_error(error);
-    return {std::string("does not answer: ") + error->message, "start it again: systemctl restart " + unit};
+    return {std::string("does not answer: ") + error->message, "restart it: systemctl restart " + unit};
 }
 
-Finding LookAtModemManager(const Command&)
+Finding CheckModemManager(const Command&)
 {
-    return LookAtHostDaemon("ModemManager", "ModemManager", "org.freedesktop.ModemManager1", "/org/freedesktop/ModemManager1");
+    return CheckHostDaemon("ModemManager", "ModemManager", "org.freedesktop.ModemManager1", "/org/freedesktop/ModemManager1");
 }
 
-Finding LookAtNetworkManager(const Command&)
+Finding CheckNetworkManager(const Command&)
 {
-    return LookAtHostDaemon(
-        "NetworkManager", "NetworkManager", "org.freedesktop.NetworkManager", "/org/freedesktop/NetworkManager");
+    return CheckHostDaemon("NetworkManager", "NetworkManager", "org.freedesktop.NetworkManager", "/org/freedesktop/NetworkManager");
 }
 
-Finding LookAtStore(const Command&)
+Finding CheckStore(const Command&)
 {
     std::vector<DASubscription> subscriptions;
     std::string reason;
@@ -158,7 +157,7 @@ Finding LookAtStore(const Command&)
     return {reason.substr(0, end), reason.substr(end + 2)};
 }
 
-/// Adds the names that a method of the bus lists. @return whether the bus lets it
+/// Adds the names that a method of the bus lists. @return whether the bus allows the call
 bool AddNames(GDBusConnection* connection, const char* method, std::set<std::string>& names)
 {
     g_autoptr(GVariant) reply = AskBus(connection, method, nullptr);
@@ -171,8 +170,8 @@ bool AddNames(GDBusConnection* connection, const char* method, std::set<std::str
     return true;
 }
 
-/// One finding for each record that reaches nobody. None without a bus and a store, of which there are others.
-Findings LookAtSubscribers(const Command&)
+/// One finding for each record that reaches nobody. Nothing without a bus or a store, which have checks of their own.
+Findings CheckSubscribers(const Command&)
 {
     std::vector<DASubscription> subscriptions;
     std::string reason;
@@ -195,23 +194,23 @@ Findings LookAtSubscribers(const Command&)
     return findings;
 }
 
-Finding LookAtDevice(const Command& command)
+Finding CheckDevice(const Command& command)
 {
     const std::string trouble = UseDevice(command);
     if (!trouble.empty())
-        return {trouble, "name another with --profile or KIV_PROFILE; kivctl device keys lists what a file may hold"};
+        return {trouble, "choose another with --profile or KIV_PROFILE; kivctl device keys lists the keys of a file"};
     const std::string device = DeviceAskedFor(command);
     return {(IsProfileName(device) ? "profile " : "file ") + (device.empty() ? "dual" : device) + ", " +
             kiv::platform::GetDevice().description};
 }
 
-/// The shared library that holds a function, its version in its real name.
+/// Checks the shared library that contains a function. Its version is part of its file name.
 template <typename Function>
-Finding LookAtLibrary(Function* function)
+Finding CheckLibrary(Function* function)
 {
     Dl_info info{};
     if (dladdr(reinterpret_cast<void*>(function), &info) == 0 || !info.dli_fname)
-        return {"not to be found in memory", "run kivctl from an installation"};
+        return {"the file of the library cannot be determined", "run kivctl from an installation"};
     char* const real = realpath(info.dli_fname, nullptr);
     const LibraryText owner(real);
     const std::string path = real ? real : info.dli_fname;
@@ -219,44 +218,44 @@ Finding LookAtLibrary(Function* function)
     const std::string version = end == path.npos ? "unknown" : path.substr(end + 4);
     if (version == KIV_VERSION)
         return {path + ", version " + version};
-    return {
-        path + " is of version " + version + ", kivctl of " KIV_VERSION, "look at LD_LIBRARY_PATH, or install the two together"};
+    return {path + " has version " + version + ", but kivctl has " KIV_VERSION,
+        "check LD_LIBRARY_PATH, or install the same version of both"};
 }
 
-Finding LookAtSystemLibrary(const Command&)
+Finding CheckSystemLibrary(const Command&)
 {
-    return LookAtLibrary(&DASystem::GetInstance);
+    return CheckLibrary(&DASystem::GetInstance);
 }
 
-Finding LookAtPlatformLibrary(const Command&)
+Finding CheckPlatformLibrary(const Command&)
 {
-    return LookAtLibrary(&telephony_init);
+    return CheckLibrary(&telephony_init);
 }
 
-template <Finding (*look)(const Command&)>
+template <Finding (*check)(const Command&)>
 Findings One(const Command& command)
 {
-    return {look(command)};
+    return {check(command)};
 }
 
-struct Check
+struct Examination
 {
     const char* name;
-    Findings (*look)(const Command&);
-    bool isForHost = false; ///< looked at only when the device is the machine itself
+    Findings (*check)(const Command&);
+    bool isForHost = false; ///< done only when the device is the machine itself
 };
 
-constexpr Check kChecks[] = {
-    {"bus", One<LookAtBus>},
-    {"device daemon", One<LookAtDeviceDaemon>},
-    {"service manager", One<LookAtServiceManager>},
-    {"subscriber store", One<LookAtStore>},
-    {"subscribers", LookAtSubscribers},
-    {"device", One<LookAtDevice>},
-    {"ModemManager", One<LookAtModemManager>, true},
-    {"NetworkManager", One<LookAtNetworkManager>, true},
-    {"library", One<LookAtSystemLibrary>},
-    {"platform", One<LookAtPlatformLibrary>},
+constexpr Examination kChecks[] = {
+    {"bus", One<CheckBus>},
+    {"device daemon", One<CheckDeviceDaemon>},
+    {"service manager", One<CheckServiceManager>},
+    {"subscriber store", One<CheckStore>},
+    {"subscribers", CheckSubscribers},
+    {"device", One<CheckDevice>},
+    {"ModemManager", One<CheckModemManager>, true},
+    {"NetworkManager", One<CheckNetworkManager>, true},
+    {"library", One<CheckSystemLibrary>},
+    {"platform", One<CheckPlatformLibrary>},
 };
 
 } // namespace
@@ -267,18 +266,18 @@ Exit Examine(const Command& command)
     Exit exit = Exit::Done;
     const Progress progress;
     const bool isHost = IsHost(DeviceAskedFor(command));
-    for (const Check& check : kChecks)
+    for (const Examination& examination : kChecks)
     {
-        if (check.isForHost && !isHost)
+        if (examination.isForHost && !isHost)
             continue;
-        progress.Show(std::string("looking at the ") + check.name);
-        for (const Finding& finding : check.look(command))
+        progress.Show(std::string("checking the ") + examination.name);
+        for (const Finding& finding : examination.check(command))
         {
             const bool isWell = finding.remedy.empty();
             if (!isWell)
                 exit = Exit::No;
-            rows.push_back({{"check", check.name}, {"ok", isWell, "", isWell ? Tone::Good : Tone::Bad}, {"finding", finding.text},
-                isWell ? Missing("remedy", "") : Field{"remedy", finding.remedy}});
+            rows.push_back({{"check", examination.name}, {"ok", isWell, "", isWell ? Tone::Good : Tone::Bad},
+                {"finding", finding.text}, isWell ? Missing("remedy", "") : Field{"remedy", finding.remedy}});
         }
     }
     progress.Show("");

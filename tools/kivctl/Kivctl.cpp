@@ -23,12 +23,13 @@ struct CodeMeaning
 };
 
 constexpr CodeMeaning kCodeMeanings[] = {
-    {KIV_RESULT_NO_BUS, Exit::NoBus, "the system bus can not be reached", "DBUS_SYSTEM_BUS_ADDRESS has to name one that runs"},
-    {KIV_RESULT_NO_REPLY, Exit::No, "no reply from the service", "it has to run on this bus (kivctl services)"},
-    {KIV_RESULT_BUS_TIMED_OUT, Exit::BusTimedOut, "reaching the system bus timed out",
-        "DBUS_SYSTEM_BUS_ADDRESS has to name a bus that answers"},
-    {KIV_RESULT_INVALID_ARGUMENT, Exit::Refused, "the library refuses an argument", "its log says which"},
-    {KIV_RESULT_NO_PROXY, Exit::NoService, "the service can not be addressed", "its log says why"},
+    {KIV_RESULT_NO_BUS, Exit::NoBus, "the system bus cannot be reached",
+        "set DBUS_SYSTEM_BUS_ADDRESS to the address of a running bus"},
+    {KIV_RESULT_NO_REPLY, Exit::No, "no reply from the service", "start it on this bus (kivctl services)"},
+    {KIV_RESULT_BUS_TIMED_OUT, Exit::BusTimedOut, "connecting to the system bus timed out",
+        "set DBUS_SYSTEM_BUS_ADDRESS to the address of a bus that answers"},
+    {KIV_RESULT_INVALID_ARGUMENT, Exit::Refused, "the library rejected an argument", "its log says which"},
+    {KIV_RESULT_NO_PROXY, Exit::NoService, "the service cannot be addressed", "its log says why"},
 };
 
 CodeMeaning Find(int code)
@@ -38,7 +39,7 @@ CodeMeaning Find(int code)
         if (meaning.code == code)
             return meaning;
     }
-    return {code, Exit::No, "a result code without a meaning", "the log may tell more"};
+    return {code, Exit::No, "unknown result code", "the log may say more"};
 }
 
 } // namespace

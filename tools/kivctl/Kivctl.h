@@ -5,10 +5,16 @@
 
 #include <cstdlib>
 #include <functional>
+#include <map>
 #include <memory>
 #include <stdexcept>
 #include <string>
 #include <vector>
+
+namespace CLI
+{
+class App;
+}
 
 /// Exit codes, the same for every verb and from version to version.
 enum class Exit : int
@@ -26,7 +32,7 @@ enum class Exit : int
     BadDevice = 10
 };
 
-/// What an exit code tells.
+/// The meaning of an exit code.
 struct ExitMeaning
 {
     Exit code;
@@ -35,19 +41,19 @@ struct ExitMeaning
 
 inline constexpr ExitMeaning kExitMeanings[] = {
     {Exit::Done, "done; the answer is yes"},
-    {Exit::No, "no, not found, not delivered, no reply, something is not well"},
+    {Exit::No, "no; not found; not delivered; no reply; a check failed"},
     {Exit::Usage, "wrong usage"},
-    {Exit::TimeUp, "time is up"},
-    {Exit::Refused, "the library refuses an argument"},
-    {Exit::NoService, "the service can not be addressed"},
-    {Exit::NoStore, "the subscriber store can not be used"},
+    {Exit::TimeUp, "timed out"},
+    {Exit::Refused, "the library rejected an argument"},
+    {Exit::NoService, "the service cannot be addressed"},
+    {Exit::NoStore, "the subscriber store cannot be used"},
     {Exit::NotWritten, "the output cannot be written"},
-    {Exit::NoBus, "the system bus can not be reached"},
-    {Exit::BusTimedOut, "reaching the system bus timed out"},
+    {Exit::NoBus, "the system bus cannot be reached"},
+    {Exit::BusTimedOut, "connecting to the system bus timed out"},
     {Exit::BadDevice, "the device file is wrong"},
 };
 
-/// An environment variable that matters.
+/// An environment variable that the program uses.
 struct Variable
 {
     const char* name;
@@ -55,14 +61,15 @@ struct Variable
 };
 
 inline constexpr Variable kEnvironment[] = {
-    {"DBUS_SYSTEM_BUS_ADDRESS", "the system bus to use"},
+    {"DBUS_SYSTEM_BUS_ADDRESS", "address of the system bus"},
     {"KIV_SUBSCRIBERS", "file of the subscriber store"},
-    {"KIV_PROFILE", "the device where --profile names none"},
-    {"KIV_LOG", "\"error\" or \"info\" shows the platform log on standard error, \"journal\" sends it to the system log"},
-    {"NO_COLOR", "when not empty, no colour on a terminal either"},
+    {"KIV_PROFILE", "device to use without --profile"},
+    {"KIV_LOG", "\"error\" or \"info\" prints the platform log to standard error, \"journal\" sends it to the system log"},
+    {"NO_COLOR", "when not empty, --color auto uses no colour"},
 };
 
-/// What ends a verb early: the exit code, and a text that says what was wrong and what would be right, perhaps with more lines.
+/// Ends a verb early, with an exit code and a message that says what was wrong and what is expected. The message may have more
+/// lines.
 class Failure : public std::runtime_error
 {
 public:
@@ -75,62 +82,57 @@ public:
     const std::vector<std::string> details;
 };
 
-/// Whether a verb asks the device, which has to be in order then.
+/// Whether a verb uses the device. If so, the device must be usable.
 enum class DeviceUse
 {
     Asks,
     Leaves
 };
 
-/// What a verb prints: records that a query returns, of which the command line may choose fields, or what happens.
-enum class Prints
-{
-    Records,
-    Events
-};
-
-/// What the command line asks for.
+/// The result of reading the command line.
 struct Command
 {
     Form form;
     Identifiers identifiers = Identifiers::Masked;
-    std::string profile; ///< name or file of the device; empty for that of the environment
+    std::string profile; ///< name or file of the device; empty to use KIV_PROFILE
     DeviceUse deviceUse = DeviceUse::Asks;
-    Prints prints = Prints::Records;
     std::function<Exit()> verb; ///< may throw Failure, kiv::BusError
+
+    /// For each query, the names of the fields that its records may have. The other verbs print no records.
+    std::map<const CLI::App*, std::vector<std::string>> fields;
 };
 
-/// A text that the library handed out with malloc(), free()d with its owner.
+/// Frees a text that the library allocated with malloc().
 struct Freed
 {
     void operator()(char* text) const { std::free(text); }
 };
 using LibraryText = std::unique_ptr<char, Freed>;
 
-/// Ends the verb when the library's result code, one of DADBusManager's, is not 0.
-/// @param log  error lines that the library wrote meanwhile; shown below the failure
+/// Ends the verb when a result code of DADBusManager is not 0.
+/// @param log  error lines that the library wrote during the call; printed below the failure
 void RequireSuccess(int code, const std::vector<std::string>& log);
 
-/// What a result code of DADBusManager's means, in a few words.
+/// Describes a result code of DADBusManager in a few words.
 std::string MeaningOf(int code);
 
-/// The device that the command line or the environment asks for; empty for the default one.
+/// The device that the command line or the environment selects; empty for the default.
 std::string DeviceAskedFor(const Command& command);
 
-/// Makes that device the one to ask: the profile of the command line takes the place of the environment's.
-/// @return what is wrong with it and what would be right; empty when nothing is
+/// Selects that device. The command line takes precedence over the environment.
+/// @return what is wrong with it and what is expected; empty on success
 std::string UseDevice(const Command& command);
 
-/// The same, ending the verb when something is wrong.
+/// Like UseDevice(), but ends the verb when the device is unusable.
 void RequireDevice(const Command& command);
 
-/// Names of the profiles that come with the simulated device.
+/// Names of the profiles, and of the machine itself.
 std::vector<std::string> ProfileNames();
 
-/// Whether `device` names a profile that comes with the simulated device, not a file. Such a device never changes.
+/// Whether `device` is a name and not a file. The device of a profile never changes.
 bool IsProfileName(const std::string& device);
 
-/// The word for a value of an enumeration of the platform, which may give others than it names.
+/// The word for a value of a platform enumeration. The platform may return values that have no name.
 struct Word
 {
     int value;
@@ -148,10 +150,10 @@ std::string WordFor(const Word (&words)[N], int value)
     return "other (" + std::to_string(value) + ")";
 }
 
-/// Whether `device` names the machine itself.
+/// Whether `device` is the machine itself.
 bool IsHost(const std::string& device);
 
-/// A diagnostic on standard error: one line, and one more for each detail. Line ends and control characters in them are escaped.
+/// Prints a diagnostic to standard error: one line, and one for each detail. Escapes line ends and control characters in them.
 void Note(const std::string& text, const std::vector<std::string>& details = {});
 
 #endif

@@ -16,7 +16,7 @@ size_t Columns(gunichar character)
     return g_unichar_iszerowidth(character) ? 0 : g_unichar_iswide(character) ? 2 : 1;
 }
 
-/// Bytes of the text that fit into `width` columns; those of one character at least.
+/// Number of bytes of the text that fit into `width` columns; at least one character.
 size_t BytesThatFit(const std::string& text, size_t width)
 {
     const char* const begin = text.c_str();
@@ -30,7 +30,7 @@ size_t BytesThatFit(const std::string& text, size_t width)
     return static_cast<size_t>(at - begin);
 }
 
-/// Where the description in a line of help begins, behind two blanks or more; the line's indentation if it has none.
+/// Where the description in a line of help begins, after two or more blanks; the line's indentation when there is none.
 size_t DescriptionBegin(const std::string& line)
 {
     const size_t heading = std::min(line.find_first_not_of(' '), line.size());

@@ -9,27 +9,27 @@
 /// @file
 /// Text on a terminal: how wide it is, and where its lines end. All text here is UTF-8 without control characters.
 
-/// The width of what is no terminal: lines stay as long as they are.
+/// The width where there is no terminal: lines are not wrapped.
 inline constexpr size_t kUnlimited = std::numeric_limits<size_t>::max();
 
-/// Columns of the terminal that a file descriptor refers to; kUnlimited when it is none.
+/// Columns of the terminal that a file descriptor refers to; kUnlimited when it is no terminal.
 size_t TerminalWidth(int descriptor);
 
-/// Columns that a text takes.
+/// Number of columns of a text on a terminal.
 size_t Width(const std::string& text);
 
-/// The text with blanks behind it up to a width.
+/// Pads a text with blanks to a width.
 std::string Padded(const std::string& text, size_t width);
 
-/// The text in lines of at most `width` columns, cut at blanks where possible.
-/// @param indent  blanks before every line but the first; less than `width`
+/// Breaks a text into lines of at most `width` columns, at blanks where possible.
+/// @param indent  number of blanks before each line but the first; less than `width`
 std::vector<std::string> Wrapped(const std::string& text, size_t width, size_t indent = 0);
 
-/// The same for a text that begins with a heading of `indent` columns, its padding included, below which the lines continue. Where
-/// the terminal leaves too little room for that, the heading is on a line of its own.
+/// Like Wrapped(), for a text that begins with a heading of `indent` columns, including its padding. The lines continue to the
+/// right of the heading. Where there is too little room for that, the heading has a line of its own.
 std::vector<std::string> WrappedBehindHeading(const std::string& text, size_t width, size_t indent);
 
-/// Wraps each line of a help text; it continues below its description.
+/// Wraps each line of a help text. A description continues below its beginning.
 std::string WrappedHelp(const std::string& text, size_t width);
 
 #endif

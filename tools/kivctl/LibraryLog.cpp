@@ -60,5 +60,5 @@ LibraryLog::~LibraryLog()
 void LibraryLog::RequireStore() const
 {
     if (!storeTrouble_.empty())
-        throw Failure(Exit::NoStore, "the subscriber store can not be used: " + storeTrouble_);
+        throw Failure(Exit::NoStore, "the subscriber store cannot be used: " + storeTrouble_);
 }

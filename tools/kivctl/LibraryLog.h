@@ -5,7 +5,7 @@
 #include <string>
 #include <vector>
 
-/// One line that the library wrote to the platform log, taken apart.
+/// The parts of one line that the library wrote to the platform log.
 struct LibraryLine
 {
     enum class Level
@@ -15,19 +15,18 @@ struct LibraryLine
     };
 
     Level level;
-    std::string function; ///< bare name of the member that wrote it
+    std::string function; ///< name of the member that wrote it
     std::string message;
 };
 
-/// Listens to the platform log as long as it lives. What became of a call to a subscriber stands nowhere else: the library tells
-/// its caller of none.
-/// One object at a time.
+/// Receives the platform log during its lifetime. Only the log says whether a call to a subscriber succeeded: the library does not
+/// return it. One object at a time.
 class LibraryLog
 {
 public:
     using Listener = std::function<void(const LibraryLine&)>;
 
-    /// @param listener  hears every line of the library, on the thread that writes it; may be empty
+    /// @param listener  receives every line of the library, on the thread that writes it; may be empty
     explicit LibraryLog(Listener listener = nullptr);
     LibraryLog(const LibraryLog&) = delete;
     LibraryLog& operator=(const LibraryLog&) = delete;
@@ -36,7 +35,7 @@ public:
     /// Messages of the library's error lines so far.
     const std::vector<std::string>& Errors() const { return errors_; }
 
-    /// Ends the verb when the subscriber store could not be asked.
+    /// Ends the verb when the subscriber store could not be used.
     void RequireStore() const;
 
 private:

@@ -6,7 +6,7 @@
 namespace
 {
 
-/// Text as man takes it: no hyphens for minus signs, no macros at the beginning of a line.
+/// Escapes a text for man: minus signs, and a macro at the beginning.
 std::string Escaped(const std::string& text)
 {
     std::string escaped;
@@ -42,6 +42,8 @@ std::string Entries(const VerbManual& verb)
         if (verb.path.empty() || !IsHelp(option)) // every verb has it
             text += Entry(Joined(option.names, ", ") + (option.value.empty() ? "" : " " + option.value), option.help);
     }
+    if (!verb.fields.empty())
+        text += ".PP\nFields: " + Escaped(Joined(verb.fields, ", ")) + ".\n";
     return text;
 }
 
@@ -57,13 +59,14 @@ std::string VerbSections(const VerbManual& verb)
 
 std::string ManPage(const VerbManual& program)
 {
-    std::string text = ".TH KIVCTL 1 \"\" \"kivctl " KIV_VERSION "\" \"User Commands\"\n.nh\n"
-                       ".SH NAME\nkivctl \\- the agent, its client services and the simulated device on the command line\n"
-                       ".SH SYNOPSIS\n" +
-                       Escaped(program.usage) + "\n.SH DESCRIPTION\n" + Escaped(program.help) +
-                       "\n.PP\nData go to standard output, everything else to standard error.\n"
-                       ".SH OPTIONS\nEvery verb takes these, before or behind it; those for queries choose what is printed.\n" +
-                       Entries(program) + ".SH VERBS\n" + VerbSections(program) + ".SH EXIT STATUS\n";
+    std::string text =
+        ".TH KIVCTL 1 \"\" \"kivctl " KIV_VERSION "\" \"User Commands\"\n.nh\n"
+        ".SH NAME\nkivctl \\- query and change the device of kiv\\-agent, and exchange messages with its client services\n"
+        ".SH SYNOPSIS\n" +
+        Escaped(program.usage) + "\n.SH DESCRIPTION\n" + Escaped(program.help) +
+        "\n.PP\nData is printed to standard output, everything else to standard error.\n"
+        ".SH OPTIONS\nEvery verb accepts these options, before or after it.\n" +
+        Entries(program) + ".SH VERBS\n" + VerbSections(program) + ".SH EXIT STATUS\n";
     for (const ExitMeaning& exit : kExitMeanings)
         text += Entry(std::to_string(static_cast<int>(exit.code)), exit.meaning);
     text += ".SH ENVIRONMENT\n";

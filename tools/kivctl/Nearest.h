@@ -8,7 +8,7 @@
 
 using kiv::platform::DidYouMean;
 
-/// The words with a separator between them.
+/// Joins words with a separator between them.
 std::string Joined(const std::vector<std::string>& words, const char* separator);
 
 #endif

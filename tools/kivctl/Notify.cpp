@@ -15,7 +15,7 @@
 namespace
 {
 
-/// The types by name; a kind of event is the name of what most of its notifications say.
+/// The types by name. The name of a kind means its usual type.
 const std::map<std::string, _KIV_NOTI_TYPE_E> kTypes = {
     {"auth", KIV_NOTI_TYPE_AUTH_SUCCESS},
     {"auth-success", KIV_NOTI_TYPE_AUTH_SUCCESS},
@@ -34,7 +34,7 @@ bool IsSwitch(const std::string& type)
     return type == "on" || type == "off" || type == "status";
 }
 
-/// The subscriptions that a type goes to: kind, and key of those that are not by service.
+/// The kind and key of the subscriptions that receive a type.
 struct Audience
 {
     const char* kind;
@@ -60,34 +60,34 @@ void Require(bool holds, const char* text)
         throw Failure(Exit::Usage, text);
 }
 
-/// What the options of one line must have to do with each other.
+/// Checks that the options fit together.
 void CheckOptions(const NotifyOptions& options)
 {
     const std::string& first = options.types.front();
     const bool areSwitches = std::all_of(options.types.begin(), options.types.end(), IsSwitch);
-    Require(options.types.size() == 1 || areSwitches, "only \"on\" and \"off\" go several at once");
-    Require(options.types.size() == 1 || options.to == "subscribers", "the service manager takes one notification at a time");
+    Require(options.types.size() == 1 || areSwitches, "only \"on\" and \"off\" can be sent together");
+    Require(options.types.size() == 1 || options.to == "subscribers", "the service manager accepts one event at a time");
     const size_t services = areSwitches ? options.types.size() : first == "policy" ? 1 : 0;
-    Require(options.services.size() == services, areSwitches ? "each \"on\" and \"off\" needs its --service, in the same order"
+    Require(options.services.size() == services, areSwitches ? "each \"on\" and \"off\" needs one --service, in the same order"
                                                  : services  ? "\"policy\" needs one --service"
-                                                             : "--service belongs to \"on\", \"off\" and \"policy\"");
+                                                             : "only \"on\", \"off\" and \"policy\" have a --service");
     Require(options.texts.size() == (TakesTexts(first) ? 4 : 0),
-        "--texts belongs to \"policy\" and \"number-changed\", which need all four");
+        "\"policy\" and \"number-changed\" need four --texts; the others have none");
 }
 
-/// What became of the call to one subscriber.
+/// The result of the call to one subscriber.
 struct Delivery
 {
     std::string busName;
     std::string trouble; ///< empty when it was answered
 };
 
-/// Follows the library's walk over the subscribers by the lines that it logs: the record's bus name first, then an error line if it
-/// could not be called. Error lines that are about no record tell why there was no walk.
+/// Follows the library's walk over the subscribers by the lines that it logs: first a record's bus name, then an error line if the
+/// call failed. Error lines before the first record say why there was no walk.
 class Walk
 {
 public:
-    void Hear(const LibraryLine& line)
+    void Read(const LibraryLine& line)
     {
         static const std::string kBusName = "busname: ";
         const bool isError = line.level == LibraryLine::Level::Error;
@@ -112,7 +112,7 @@ bool IsClosed(const std::string& trouble)
     return trouble.find("onnection is closed") != trouble.npos;
 }
 
-/// Why there was no delivery; a connection that was closed at the deadline is told as what it means.
+/// Says why there was no delivery. A connection that was closed at the deadline means that the time was up.
 std::string Explained(const Delivery& delivery, const NotifyOptions& options, bool wasMissed)
 {
     if (wasMissed && IsClosed(delivery.trouble))
@@ -139,7 +139,7 @@ int SendToSubscribers(const NotifyOptions& options, std::string imsi, const std:
         imsi.c_str(), static_cast<int>(statuses.size()), services.data(), statuses.data());
 }
 
-Exit TellSubscribers(
+Exit NotifySubscribers(
     const NotifyOptions& options, const std::string& imsi, const std::array<const char*, 4>& texts, const Form& form)
 {
     Walk walk;
@@ -147,12 +147,12 @@ Exit TellSubscribers(
     const LibraryLog log(
         [&walk, &progress](const LibraryLine& line)
         {
-            walk.Hear(line);
+            walk.Read(line);
             if (!walk.Deliveries().empty())
-                progress.Show("telling " + walk.Deliveries().back().busName);
+                progress.Show("notifying " + walk.Deliveries().back().busName);
         });
 
-    // The facade's result tells nothing of the bus, so its connection is asked for first, and kept for the walk.
+    // The facade's result does not say whether the bus is reachable, so connect first and keep the connection for the walk.
     int code = 0;
     g_autoptr(GDBusConnection) connection = DADBusManager::GetInstance()->InitDbusConnection(&code);
     RequireSuccess(connection ? KIV_RESULT_SUCCESS : code, log.Errors());
@@ -175,13 +175,13 @@ Exit TellSubscribers(
     const auto subscribers = static_cast<std::int64_t>(walk.Deliveries().size());
     PrintLine({{"event", "sent"}, {"subscribers", subscribers}, {"delivered", delivered}}, form);
     if (subscribers == 0)
-        Note("nobody has subscribed to that (kivctl subscribers list)");
+        Note("there are no subscribers to this event (kivctl subscribers list)");
     if (wasMissed && delivered < subscribers)
-        throw Failure(Exit::TimeUp, "the time is up");
+        throw Failure(Exit::TimeUp, "timed out");
     return subscribers > 0 && delivered == subscribers ? Exit::Done : Exit::No;
 }
 
-Exit TellManager(const NotifyOptions& options, const std::string& imsi, const std::array<const char*, 4>& texts, const Form& form)
+Exit NotifyManager(const NotifyOptions& options, const std::string& imsi, const std::array<const char*, 4>& texts, const Form& form)
 {
     const LibraryLog log;
     int code = 0;
@@ -198,7 +198,7 @@ Exit TellManager(const NotifyOptions& options, const std::string& imsi, const st
     return Exit::Done;
 }
 
-/// The IMSI given, or else, as an agent has it, that of the first SIM that answers.
+/// The IMSI that was given; without one, that of the first SIM that answers, as an agent reads it.
 std::string Imsi(const NotifyOptions& options)
 {
     if (!options.imsi.empty())
@@ -207,7 +207,7 @@ std::string Imsi(const NotifyOptions& options)
     DASystem::GetInstance()->GetIMSIFromSim(&imsi);
     const LibraryText owner(imsi);
     if (!imsi)
-        throw Failure(Exit::No, "no SIM of this device tells its IMSI; give one with --imsi");
+        throw Failure(Exit::No, "no SIM of this device has a readable IMSI; give one with --imsi");
     return imsi;
 }
 
@@ -225,6 +225,6 @@ Exit Notify(const NotifyOptions& options, const Command& command)
     CheckOptions(options);
     std::array<const char*, 4> texts{};
     std::transform(options.texts.begin(), options.texts.end(), texts.begin(), [](const std::string& text) { return text.c_str(); });
-    const auto tell = options.to == "manager" ? TellManager : TellSubscribers;
-    return tell(options, Imsi(options), texts, command.form);
+    const auto notify = options.to == "manager" ? NotifyManager : NotifySubscribers;
+    return notify(options, Imsi(options), texts, command.form);
 }

@@ -4,6 +4,7 @@
 #include "Layout.h"
 #include "Nearest.h"
 
+#include <StandardOutput.h>
 #include <Visible.h>
 #include <glib.h>
 #include <nlohmann/json.hpp>
@@ -11,9 +12,6 @@
 #include <unistd.h>
 
 #include <algorithm>
-#include <atomic>
-#include <cerrno>
-#include <cstdio>
 #include <cstdlib>
 #include <cstring>
 #include <numeric>
@@ -25,6 +23,7 @@ namespace
 
 using Json = nlohmann::ordered_json;
 using kiv::platform::Visible;
+using kiv::StandardOutput::Write;
 
 Json ToJson(const Value& value)
 {
@@ -56,7 +55,7 @@ Json ToJson(const Record& record)
     return object;
 }
 
-/// JSON is UTF-8, and the values may be anything. What no terminal should see raw is escaped, and the rest with it.
+/// The values may be invalid UTF-8; JSON must not be. Where a character must not reach a terminal, all but ASCII is escaped.
 std::string Dump(const Json& json, int indent)
 {
     const std::string line = json.dump(-1, ' ', false, Json::error_handler_t::replace);
@@ -70,7 +69,7 @@ std::string Label(std::string name)
     return name;
 }
 
-/// A value in words, empty where it holds nothing.
+/// A value as text; empty when it is missing.
 std::string ToText(const Value& value)
 {
     if (const auto* text = std::get_if<std::string>(&value))
@@ -123,7 +122,7 @@ constexpr char kFaint[] = "\033[2m";
 constexpr char kGreen[] = "\033[32m";
 constexpr char kRed[] = "\033[31m";
 
-/// How a field's value looks on a terminal.
+/// The style of a field's value on a terminal.
 const char* Style(const Field& field)
 {
     if (field.tone != Tone::Plain)
@@ -146,7 +145,7 @@ std::string Painted(const std::string& text, const char* style, const Form& form
     return usesColour && *style != '\0' && !text.empty() ? style + text + "\033[0m" : text;
 }
 
-/// The value in a line of name=value: texts quoted and escaped, so that none breaks the line.
+/// The value in a line of name=value. Texts are quoted and escaped, so that they cannot break the line.
 std::string LineText(const Value& value)
 {
     const auto* text = std::get_if<std::string>(&value);
@@ -207,7 +206,7 @@ void PrintRows(const Cells& rows, const Form& form)
     }
 }
 
-/// A field per line, as wide as the terminal.
+/// Prints one field per line, wrapped at the terminal's width.
 void PrintFields(const Record& record, const Form& form)
 {
     size_t indent = 0;
@@ -226,7 +225,7 @@ void PrintFields(const Record& record, const Form& form)
     }
 }
 
-/// The fields of a record that the form asks for.
+/// The fields of a record that the form selects.
 Record Chosen(const Record& record, const Form& form)
 {
     if (form.fields.empty())
@@ -234,27 +233,11 @@ Record Chosen(const Record& record, const Form& form)
     std::vector<std::string> known;
     for (const Field& field : record)
         known.push_back(field.name);
+    RequireFields(known, form);
     Record chosen;
     for (const std::string& name : form.fields)
-    {
-        const auto found = std::find(known.begin(), known.end(), name);
-        if (found == known.end())
-        {
-            throw Failure(Exit::Usage,
-                "there is no field \"" + name + '"' + DidYouMean(name, known) + "; the fields are " + Joined(known, ", "));
-        }
-        chosen.push_back(record[static_cast<size_t>(found - known.begin())]);
-    }
+        chosen.push_back(record[static_cast<size_t>(std::find(known.begin(), known.end(), name) - known.begin())]);
     return chosen;
-}
-
-std::atomic<int> writeError{0};
-
-void NoteWriteError(bool isWritten)
-{
-    int none = 0;
-    if (!isWritten)
-        writeError.compare_exchange_strong(none, errno);
 }
 
 } // namespace
@@ -269,9 +252,16 @@ Field TextOr(std::string name, const char* text, std::string reason)
     return text ? Field{std::move(name), std::string(text)} : Missing(std::move(name), std::move(reason));
 }
 
-void RequireFields(const Record& record, const Form& form)
+void RequireFields(const std::vector<std::string>& known, const Form& form)
 {
-    Chosen(record, form);
+    for (const std::string& name : form.fields)
+    {
+        if (std::find(known.begin(), known.end(), name) == known.end())
+        {
+            throw Failure(Exit::Usage,
+                "there is no field \"" + name + '"' + DidYouMean(name, known) + "; the fields are " + Joined(known, ", "));
+        }
+    }
 }
 
 void Print(const Record& record, const Form& form)
@@ -339,25 +329,8 @@ void PrintLine(const Record& record, const Form& form)
         for (const Field& field : record)
             line += line.empty() ? CellText(field) : " " + field.name + "=" + LineText(field.value);
     Write(line + '\n');
-    if (WriteError() != 0)
-        g_main_context_wakeup(nullptr); // whoever waits for what is printed here sees that it cannot be
-}
-
-void Write(const std::string& text)
-{
-    NoteWriteError(std::fputs(text.c_str(), stdout) >= 0);
-}
-
-int WriteError()
-{
-    NoteWriteError(std::fflush(stdout) == 0);
-    return writeError;
-}
-
-void EndStream()
-{
-    int readerGone = EPIPE;
-    writeError.compare_exchange_strong(readerGone, 0);
+    if (kiv::StandardOutput::Error() != 0)
+        g_main_context_wakeup(nullptr); // a main loop that only serves the output then ends
 }
 
 std::string Masked(std::string text, size_t first, size_t last)

@@ -6,13 +6,13 @@
 #include <variant>
 #include <vector>
 
-/// How data goes to standard output.
+/// How data is printed.
 struct Form
 {
     enum class Notation
     {
         Text,
-        Terse, ///< values only, a record per line, ":" between the values, "\\" before ":" and "\\" in them
+        Terse, ///< values only, one record per line; values are separated by ":", and "\\" escapes ":" and "\\"
         Json
     };
     enum class Colour
@@ -27,14 +27,14 @@ struct Form
     std::vector<std::string> fields; ///< names of the fields to print, in this order; empty for all
 };
 
-/// Whether numbers that identify a person or a device are shown whole.
+/// Whether numbers that identify a person or a device are shown in full.
 enum class Identifiers
 {
     Masked,
     Shown
 };
 
-/// What a field may hold; std::monostate where a value is missing.
+/// The value of a field; std::monostate when it is missing.
 using Value = std::variant<std::monostate, bool, std::int64_t, double, std::string, std::vector<std::string>>;
 
 /// How a value is coloured.
@@ -45,53 +45,44 @@ enum class Tone
     Bad
 };
 
-/// One value with its name, which is the JSON key; text shows it with blanks for underscores. A missing value may have its reason
-/// as the note; a value that is there may have a note too.
+/// One value and its name. The name is the JSON key; text output shows it with blanks for underscores. The note of a missing value
+/// says why it is missing; other values may have a note too.
 struct Field
 {
     std::string name;
     Value value;
     std::string note = {};
     Tone tone = Tone::Plain;
-    bool isMasked = false; ///< the value has stars in it, which JSON notes
+    bool isMasked = false; ///< the value has stars in it; JSON says so in "notes"
 };
 using Record = std::vector<Field>;
 
 /// A field whose value is missing.
 Field Missing(std::string name, std::string reason);
 
-/// A field with a text; one that is missing for that reason where `text` is null.
+/// A field with a text; a missing one, with that reason, when `text` is null.
 Field TextOr(std::string name, const char* text, std::string reason);
 
-/// Ends the verb with Exit::Usage when the form asks for a field that the record lacks. Printing the record does the same.
-void RequireFields(const Record& record, const Form& form);
+/// Ends the verb with Exit::Usage when the form asks for a field that is not one of these. Printing a record checks its own fields.
+void RequireFields(const std::vector<std::string>& known, const Form& form);
 
-/// One record: a field per line, or one JSON object, in which "notes" holds the notes by field name.
+/// Prints one record: a field per line, or one JSON object, in which "notes" holds the notes by field name.
 void Print(const Record& record, const Form& form);
 
-/// Records with the same fields: a row each under a heading, or an array of JSON objects. Where the terminal is too narrow for
-/// the rows they become columns, or one block of lines per record.
+/// Prints records with the same fields: one row per record below a heading, or an array of JSON objects. When the terminal is too
+/// narrow for the rows, they become columns, or one block of lines per record.
 void PrintTable(const std::vector<Record>& records, const Form& form);
 
-/// One record of a stream, on one line, flushed: the values, the first one bare and the others as name=value, or a JSON object.
-/// Any thread; lines stay whole.
+/// Prints one record of a stream on one line and flushes it: the first value alone and the others as name=value, or a JSON object.
+/// Any thread; lines are never mixed.
 void PrintLine(const Record& record, const Form& form);
 
-/// Writes a text to standard output as it is.
-void Write(const std::string& text);
-
-/// Writes out what is buffered. @return the errno of the first failure to write since the start; 0 when all is written
-int WriteError();
-
-/// Ends a stream of lines: a reader that went away has ended it, which is no failure.
-void EndStream();
-
-/// The text with all but its first and last characters starred.
-/// @param first  number of bytes that stay at the beginning
-/// @param last   number of bytes that stay at the end; a text that would stay whole is starred completely
+/// Replaces all but the first and last bytes of a text by stars.
+/// @param first  number of bytes to keep at the beginning
+/// @param last   number of bytes to keep at the end; nothing is kept of a text that would otherwise stay complete
 std::string Masked(std::string text, size_t first, size_t last);
 
-/// The field with its text starred in this way, unless identifiers are shown.
+/// Masks the text of a field in this way, unless identifiers are shown.
 Field Masked(Field field, size_t first, size_t last, Identifiers identifiers);
 
 #endif

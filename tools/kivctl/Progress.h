@@ -3,7 +3,7 @@
 
 #include <string>
 
-/// What long work is about, on one line of standard error that is written over; nothing where that is no terminal.
+/// Shows the progress of long work on one line of standard error, which is overwritten. Does nothing when that is no terminal.
 class Progress
 {
 public:
@@ -12,7 +12,7 @@ public:
     Progress& operator=(const Progress&) = delete;
     ~Progress() { Show(""); }
 
-    /// @param text  what is under way; empty clears the line, for whatever comes next
+    /// @param text  the current step; empty clears the line
     void Show(const std::string& text) const;
 };
 

@@ -9,12 +9,12 @@
 namespace
 {
 
-/// Follows the library's deliveries by the lines that it logs. One begins with its record's bus name and ends with the line of a
-/// proxy that could not be made, or with the "end" of the call's completion, before which the failure stands if it failed.
+/// Counts the library's deliveries by the lines that it logs. A delivery begins with the bus name of its record. It ends with an
+/// error about its proxy, or with the "end" line of its call; the error of a failed call comes before that line.
 class Deliveries
 {
 public:
-    void Hear(const LibraryLine& line)
+    void Read(const LibraryLine& line)
     {
         const bool isError = line.level == LibraryLine::Level::Error;
         const bool isStart = line.function == "DeliverPushMessage";
@@ -46,7 +46,7 @@ private:
 
     size_t started_ = 0;
     size_t ended_ = 0;
-    std::string trouble_; ///< of the call whose completion is being logged
+    std::string trouble_; ///< of the call that is ending
     std::vector<std::string> troubles_;
     std::vector<std::string> refusals_;
 };
@@ -73,7 +73,7 @@ void AwaitEnd(const Deliveries& deliveries)
 Exit Push(const PushOptions& options, const Command& command)
 {
     Deliveries deliveries;
-    const LibraryLog log([&deliveries](const LibraryLine& line) { deliveries.Hear(line); });
+    const LibraryLog log([&deliveries](const LibraryLine& line) { deliveries.Read(line); });
     RequireBus(log);
 
     DADBusManager::GetInstance()->DeliverPushMessage(
@@ -89,6 +89,6 @@ Exit Push(const PushOptions& options, const Command& command)
                   {"delivered", static_cast<std::int64_t>(deliveries.Started() - failed)}},
         command.form);
     if (deliveries.Started() == 0)
-        Note("nobody has subscribed to pushes of \"" + options.service + "\" (kivctl subscribers list)");
+        Note("there are no subscribers to pushes of \"" + options.service + "\" (kivctl subscribers list)");
     return deliveries.Started() > 0 && failed == 0 ? Exit::Done : Exit::No;
 }

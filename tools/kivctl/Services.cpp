@@ -3,6 +3,7 @@
 
 #include <BoardDaemon.h>
 #include <ServiceManager.h>
+#include <StandardOutput.h>
 #include <StopSignals.h>
 
 Exit RunServices(const ServicesOptions& options, const Command& command)
@@ -12,8 +13,8 @@ Exit RunServices(const ServicesOptions& options, const Command& command)
     const kiv::ServiceManager manager([form = command.form](const kiv::BusCall& call) { PrintLine(CallRecord(call), form); });
     PrintLine({{"event", "ready"}, {"bus_names", std::vector{board.Name(), manager.Name()}}}, command.form);
     const bool wasStopped = signals.IterateWhile([&] { return board.IsConnected() && manager.IsConnected(); });
-    EndStream();
+    kiv::StandardOutput::EndStream();
     if (wasStopped)
         return Exit::Done;
-    throw Failure(Exit::NoBus, "the bus went away");
+    throw Failure(Exit::NoBus, "the connection to the bus was lost");
 }

@@ -15,7 +15,7 @@ public:
     HandleList()
     {
         if (!DASystem::GetInstance()->InitHandleList(&list_))
-            throw Failure(Exit::No, "the telephony of this device does not start");
+            throw Failure(Exit::No, "the telephony of this device cannot be started");
     }
     HandleList(const HandleList&) = delete;
     HandleList& operator=(const HandleList&) = delete;
@@ -29,8 +29,8 @@ private:
 
 constexpr char kNoAnswer[] = "modem does not answer";
 
-/// One slot as its fields are read. Card status and service type come from one question, because a card that is starting may
-/// answer the next one differently.
+/// One slot while its fields are read. Card status and service type are read at once, because the status of a card that is starting
+/// may change from one read to the next.
 struct Slot
 {
     Slot(const telephony_handle_list_s& handles, int slot, std::string cp, Identifiers shown)
@@ -50,11 +50,11 @@ struct Slot
     mutable std::string cpName; ///< mutable for platform calls that only read a char*
     const Identifiers identifiers;
     std::string card;     ///< status in words; empty when it could not be read
-    std::string reason;   ///< why something is missing, if nothing better is known
+    std::string reason;   ///< why a value is missing, unless a better reason is known
     int serviceType = -1; ///< -1 when it could not be read
 };
 
-/// What a field holds, or why it is missing. Its name stands in the table.
+/// The value of a field, or why it is missing. kFields has its name.
 Field Held(Value value)
 {
     return {"", std::move(value)};
@@ -63,7 +63,7 @@ Field Gone(const std::string& reason)
 {
     return Missing("", reason);
 }
-/// A field that is missing because a ready card does not hold it, or for what else keeps the slot from answering.
+/// A field that is missing because a ready card does not have it, or because the slot cannot be read.
 Field GoneFromCard(const Slot& slot, const char* key, const char* reason)
 {
     const std::string known = kiv::platform::ReasonFor("sim" + std::to_string(slot.index) + "." + key);
@@ -88,7 +88,7 @@ LibraryText ReadMcc(const Slot& slot)
 {
     const char* mcc = nullptr;
     DASimManager::GetInstance()->GetMCCFromSim(slot.list, slot.index, &mcc);
-    return LibraryText(const_cast<char*>(mcc)); // a copy to be released, for all that its type says
+    return LibraryText(const_cast<char*>(mcc)); // the caller owns the copy, although its type is const
 }
 
 LibraryText Read(const Slot& slot, int (DASimManager::*read)(telephony_handle_list_s, int, char**))
@@ -106,7 +106,7 @@ Field Country(const Slot& slot)
     char* name = nullptr;
     DASystem::GetInstance()->GetCountryNameFromMcc(mcc.get(), &name);
     const LibraryText owner(name);
-    return TextOr("", name, "none has this MCC");
+    return TextOr("", name, "no country has this MCC");
 }
 
 Field Imsi(const Slot& slot)
@@ -151,7 +151,7 @@ Field Sms(const Slot& slot)
                                                                                  : Gone(kNoAnswer);
 }
 
-/// What the device uses this slot's SIM for by default.
+/// The purposes that this slot's SIM is the default for.
 Field DefaultFor(const Slot& slot)
 {
     DASystem* const system = DASystem::GetInstance();

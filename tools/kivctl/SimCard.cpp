@@ -31,7 +31,7 @@ std::string CardStatusWord(TelSimCardStatus_t status)
     return WordFor(kWords, status);
 }
 
-CardAnswer AskForCard(int slot)
+CardAnswer ReadCard(int slot)
 {
     constexpr auto kUnread = static_cast<TelSimCardStatus_t>(-1);
     DASystem* const system = DASystem::GetInstance();
@@ -39,7 +39,7 @@ CardAnswer AskForCard(int slot)
     const bool isUsable = system->IsAvaliableState(slot, &status);
     if (status == kUnread)
         return {slot, false, true, "modem does not answer"};
-    // A card without power is waited for, as the library's own poll does.
+    // Wait for a card without power too, as the library's own poll does.
     const bool mayBecomeUsable = system->IsWaittingSimCheck(status) || status == TAPI_SIM_STATUS_CARD_POWEROFF;
     return {slot, isUsable, mayBecomeUsable, CardStatusWord(status)};
 }
@@ -60,7 +60,7 @@ std::vector<int> RequireSlots(int asked, size_t count)
     if (asked >= 0 && static_cast<size_t>(asked) >= count)
     {
         throw Failure(Exit::No, "there is no slot " + std::to_string(asked) +
-                                    "; slots count from 0, the last one of this device is " + std::to_string(count - 1));
+                                    "; slots are counted from 0, and the last slot of this device is " + std::to_string(count - 1));
     }
     if (asked >= 0)
         return {asked};

@@ -9,7 +9,7 @@
 /// A card status in a few words, such as "PIN required".
 std::string CardStatusWord(TelSimCardStatus_t status);
 
-/// The card of one slot, as one question found it.
+/// The card of one slot at one moment.
 struct CardAnswer
 {
     int slot;
@@ -18,13 +18,13 @@ struct CardAnswer
     std::string text; ///< card status in words
 };
 
-/// Asks for the card in a slot. Blocks on the modem.
-CardAnswer AskForCard(int slot);
+/// Reads the card status of a slot. Blocks on the modem.
+CardAnswer ReadCard(int slot);
 
-/// CP names of the modems, by slot. Ends the verb when the device has none.
+/// The CP names of the modems, by slot. Ends the verb when the device has no modem.
 std::vector<std::string> RequireCpNames();
 
-/// The slots to look at: the one asked for, all when that is below 0. Ends the verb when there is no such slot.
+/// The slots to use: the one given, or all when it is negative. Ends the verb when there is no such slot.
 std::vector<int> RequireSlots(int asked, size_t count);
 
 #endif

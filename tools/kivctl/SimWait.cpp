@@ -11,7 +11,7 @@ namespace
 
 using Clock = std::chrono::steady_clock;
 
-std::string Tell(const std::vector<CardAnswer>& answers)
+std::string Describe(const std::vector<CardAnswer>& answers)
 {
     std::string text;
     for (const CardAnswer& answer : answers)
@@ -31,7 +31,7 @@ Exit WaitForSim(const SimOptions& options, const Command& command)
     for (;;)
     {
         std::vector<CardAnswer> answers;
-        std::transform(slots.begin(), slots.end(), std::back_inserter(answers), AskForCard);
+        std::transform(slots.begin(), slots.end(), std::back_inserter(answers), ReadCard);
         const auto usable = std::find_if(answers.begin(), answers.end(), [](const CardAnswer& answer) { return answer.isUsable; });
         if (usable != answers.end())
         {
@@ -41,11 +41,11 @@ Exit WaitForSim(const SimOptions& options, const Command& command)
             return Exit::Done;
         }
         if (std::none_of(answers.begin(), answers.end(), [](const CardAnswer& answer) { return answer.mayBecomeUsable; }))
-            throw Failure(Exit::No, "waiting makes no SIM usable: " + Tell(answers));
+            throw Failure(Exit::No, "waiting does not make a SIM usable: " + Describe(answers));
         if (options.timeout && waited() >= *options.timeout)
-            throw Failure(Exit::TimeUp, "no SIM is usable after " + seconds() + ": " + Tell(answers));
+            throw Failure(Exit::TimeUp, "no SIM is usable after " + seconds() + ": " + Describe(answers));
 
-        progress.Show("waiting, " + seconds() + ": " + Tell(answers));
+        progress.Show("waiting, " + seconds() + ": " + Describe(answers));
         const double pause = options.timeout ? std::clamp(*options.timeout - waited(), 0.0, 1.0) : 1.0;
         std::this_thread::sleep_for(std::chrono::duration<double>(pause));
     }

@@ -5,11 +5,11 @@
 
 #include <string>
 
-/// The command that removes a subscription, for a shell.
+/// The shell command that removes a subscription.
 std::string RemovalOf(const DASubscription& subscription);
 
-/// Why a call to a subscriber failed, in words for the user: for a bus name that nobody owns, with the command that removes the
-/// record, which the store is asked for.
+/// Says why a call to a subscriber failed. If nobody owns the bus name, includes the command that removes the subscription, which
+/// is looked up in the store.
 /// @param trouble  as the library logs it
 /// @param kind     of the subscription
 /// @param key      of the subscription

@@ -5,7 +5,7 @@
 
 #include <string>
 
-/// Ends the verb unless the store did, or had done, what it was asked for.
+/// Ends the verb when the store rejected a subscription or cannot be used.
 void RequireStored(DASubscriberStore::Outcome outcome, const std::string& reason);
 
 #endif

@@ -4,6 +4,7 @@
 
 #include <BusInterfaces.h>
 #include <BusParty.h>
+#include <StandardOutput.h>
 #include <StopSignals.h>
 #include <SubscriptionService.h>
 
@@ -14,13 +15,13 @@ namespace
 
 using Outcome = DASubscriberStore::Outcome;
 
-/// Subscriptions that are taken back when the client service ends. They are made by the subscription service where it answers or
-/// can be started, else in the store's file.
+/// Subscriptions that are removed when the client service ends. The subscription service makes them if it answers or can be
+/// started; otherwise they are written to the store's file.
 class Subscriptions
 {
 public:
     /// @param party    who subscribes; outlives the subscriptions
-    /// @param useFile  leave the subscription service alone
+    /// @param useFile  do not use the subscription service
     Subscriptions(const kiv::BusParty& party, bool useFile) : party_(party), isServed_(!useFile && IsServiceThere()) {}
     Subscriptions(const Subscriptions&) = delete;
     Subscriptions& operator=(const Subscriptions&) = delete;
@@ -32,7 +33,7 @@ public:
         {
             const Outcome outcome = isServed_ ? Call("Unsubscribe", subscription, reason) : store_.Remove(subscription, reason);
             if (outcome == Outcome::Failed || outcome == Outcome::Refused)
-                Note("could not take the subscription back: " + reason);
+                Note("could not remove the subscription: " + reason);
         }
     }
 
@@ -85,16 +86,16 @@ std::vector<std::pair<std::string, std::string>> Wanted(const SubscribeOptions& 
     {
         const bool takesKey = kind == "policy" || kind == "status" || kind == "push";
         if (takesKey && options.key.empty())
-            throw Failure(Exit::Usage, "\"" + kind + "\" is subscribed to by service; name it with --key");
+            throw Failure(Exit::Usage, "\"" + kind + "\" needs a service; give it with --key");
         wanted.emplace_back(kind, takesKey ? options.key : "all");
         isKeyUsed = isKeyUsed || takesKey || options.key == "all";
     }
     for (const std::string& service : options.pushes)
         wanted.emplace_back("push", service);
     if (wanted.empty())
-        throw Failure(Exit::Usage, "nothing to subscribe to; name it with --kind or --push");
+        throw Failure(Exit::Usage, "nothing to subscribe to; give it with --kind or --push");
     if (!isKeyUsed)
-        throw Failure(Exit::Usage, "auth, activated and number_changed are subscribed to for all services; leave --key out");
+        throw Failure(Exit::Usage, "auth, activated and number_changed have no service; omit --key");
     return wanted;
 }
 
@@ -125,8 +126,8 @@ Exit Subscribe(const SubscribeOptions& options, const Command& command)
     }
     PrintLine({{"event", "ready"}, {"bus_name", party.Name()}, {"subscribed", subscribed}}, command.form);
     const bool wasStopped = signals.IterateWhile([&party] { return party.IsConnected(); });
-    EndStream();
+    kiv::StandardOutput::EndStream();
     if (wasStopped)
         return Exit::Done;
-    throw Failure(Exit::NoBus, "the bus went away");
+    throw Failure(Exit::NoBus, "the connection to the bus was lost");
 }

@@ -19,7 +19,7 @@ Record ToRecord(const DASubscription& subscription)
         {"interface", who.interface}};
 }
 
-/// Prints what became of a subscription; text has the exit code for that.
+/// Prints the result in JSON. In text, the exit code says it.
 void PrintResult(const char* result, const DASubscription& subscription, const Form& form)
 {
     if (form.notation != Form::Notation::Json)
@@ -36,7 +36,7 @@ void RequireStored(DASubscriberStore::Outcome outcome, const std::string& reason
     if (outcome == DASubscriberStore::Outcome::Refused)
         throw Failure(Exit::Refused, reason);
     if (outcome == DASubscriberStore::Outcome::Failed)
-        throw Failure(Exit::NoStore, "the subscriber store can not be used: " + reason);
+        throw Failure(Exit::NoStore, "the subscriber store cannot be used: " + reason);
 }
 
 Exit ListSubscribers(const Command& command)
@@ -45,12 +45,11 @@ Exit ListSubscribers(const Command& command)
     std::string reason;
     RequireStored(DASubscriberStore().List(subscriptions, reason), reason);
 
-    RequireFields(ToRecord({}), command.form);
     std::vector<Record> records;
     std::transform(subscriptions.begin(), subscriptions.end(), std::back_inserter(records), ToRecord);
     PrintTable(records, command.form);
     if (records.empty())
-        Note("nobody has subscribed to anything in " + DASubscriberStore::Path());
+        Note("there are no subscriptions in " + DASubscriberStore::Path());
     return Exit::Done;
 }
 
@@ -60,7 +59,7 @@ Exit AddSubscriber(const SubscriptionOptions& options, const Command& command)
     const auto outcome = DASubscriberStore().Add(Subscription(options), reason);
     RequireStored(outcome, reason);
     if (outcome == DASubscriberStore::Outcome::Unchanged)
-        Note("was subscribed before");
+        Note("this subscription already exists");
     PrintResult(outcome == DASubscriberStore::Outcome::Done ? "added" : "unchanged", Subscription(options), command.form);
     return Exit::Done;
 }
@@ -71,8 +70,7 @@ Exit RemoveSubscriber(const SubscriptionOptions& options, const Command& command
     const auto outcome = DASubscriberStore().Remove(Subscription(options), reason);
     RequireStored(outcome, reason);
     if (outcome == DASubscriberStore::Outcome::Unchanged)
-        throw Failure(
-            Exit::No, "there is no such subscription; all five fields must be those that \"kivctl subscribers list\" shows");
+        throw Failure(Exit::No, "there is no such subscription; give all five fields as \"kivctl subscribers list\" shows them");
     PrintResult("removed", Subscription(options), command.form);
     return Exit::Done;
 }

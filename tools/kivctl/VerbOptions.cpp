@@ -13,13 +13,13 @@
 namespace
 {
 
-/// A check of an option's text. @return what is wrong with it, empty when nothing is
+/// Checks an option's text. @return what is wrong with it; empty when it is right
 template <typename Number>
-std::string Check(const std::string& text, bool mayBeNegative, const char* right)
+std::string Check(const std::string& text, bool mayBeNegative, const char* expected)
 {
     Number number{};
     const bool isNumber = CLI::detail::lexical_cast(text, number) && std::isfinite(static_cast<double>(number));
-    return isNumber && (mayBeNegative || number >= 0) ? "" : '"' + text + "\" is wrong; " + right + " would be right";
+    return isNumber && (mayBeNegative || number >= 0) ? "" : '"' + text + "\" is invalid; expected " + expected;
 }
 
 std::string IsNumber(const std::string& text)
@@ -29,30 +29,30 @@ std::string IsNumber(const std::string& text)
 
 std::string IsZeroOrMore(const std::string& text)
 {
-    return Check<double>(text, false, "a number from 0 up");
+    return Check<double>(text, false, "0 or a positive number");
 }
 
 std::string IsWhole(const std::string& text)
 {
-    return Check<std::int64_t>(text, true, "a whole number of 64 bits");
+    return Check<std::int64_t>(text, true, "a 64-bit whole number");
 }
 
 std::string IsServiceId(const std::string& text)
 {
-    return Check<int>(text, true, "a whole number of 32 bits");
+    return Check<int>(text, true, "a 32-bit whole number");
 }
 
 std::string IsSlot(const std::string& text)
 {
-    return Check<int>(text, false, "a number from 0 up");
+    return Check<int>(text, false, "0 or a positive whole number");
 }
 
-/// An option of a verb means nothing to the verb below it that runs.
+/// Refuses options of a verb when a verb below it runs, which ignores them.
 void RefuseOptions(const CLI::App& verb, const std::string& below)
 {
     const std::string whole = verb.get_name() + " " + below;
-    const std::string rest = " belongs to \"" + verb.get_name() + "\" alone; \"" + whole +
-                             "\" takes its own options behind it: kivctl " + whole + " --help";
+    const std::string rest =
+        " is an option of \"" + verb.get_name() + "\"; those of \"" + whole + "\" go after it (see kivctl " + whole + " --help)";
     for (const CLI::Option* option : verb.get_options())
     {
         if (option->count() > 0)
@@ -65,20 +65,19 @@ CLI::App* AddToHelp(CLI::App& app, const char* name, const char* help)
     return app.add_subcommand(name, help)->group("Verbs");
 }
 
-/// What is to be known of a verb before it runs.
-struct Traits
+/// Makes the verb a query, which prints records.
+/// @param fields  names of the fields that a record may have
+void AddFields(CLI::App* verb, Command& command, const std::vector<std::string>& fields)
 {
-    DeviceUse deviceUse = DeviceUse::Asks;
-    Prints prints = Prints::Records;
-};
-constexpr Traits kWithoutDevice{DeviceUse::Leaves};
-constexpr Traits kPrintsEvents{DeviceUse::Asks, Prints::Events};
+    command.fields[verb] = fields;
+    verb->footer([fields] { return "Fields: " + Joined(fields, ", "); });
+}
 
-/// Adds a verb that runs with options of its own, which live as long as the command.
+/// Adds a verb with options of its own, which live as long as the command.
 /// @return its command line, and the options to bind it to
 template <typename Options>
 std::pair<CLI::App*, std::shared_ptr<Options>> AddVerb(CLI::App& app, Command& command, const char* name, const char* help,
-    Exit (*run)(const Options&, const Command&), Traits traits = {})
+    Exit (*run)(const Options&, const Command&), DeviceUse deviceUse = DeviceUse::Asks)
 {
     const auto options = std::make_shared<Options>();
     CLI::App* verb = AddToHelp(app, name, help);
@@ -87,16 +86,15 @@ std::pair<CLI::App*, std::shared_ptr<Options>> AddVerb(CLI::App& app, Command& c
         {
             if (!verb->get_subcommands().empty())
                 return RefuseOptions(*verb, verb->get_subcommands().front()->get_name());
-            command.deviceUse = traits.deviceUse;
-            command.prints = traits.prints;
+            command.deviceUse = deviceUse;
             command.verb = [options, run, &command] { return run(*options, command); };
         });
     return {verb, options};
 }
 
 /// The same for a verb without options.
-CLI::App* AddVerb(
-    CLI::App& app, Command& command, const char* name, const char* help, Exit (*run)(const Command&), Traits traits = {})
+CLI::App* AddVerb(CLI::App& app, Command& command, const char* name, const char* help, Exit (*run)(const Command&),
+    DeviceUse deviceUse = DeviceUse::Asks)
 {
     CLI::App* verb = AddToHelp(app, name, help);
     verb->callback(
@@ -104,8 +102,7 @@ CLI::App* AddVerb(
         {
             if (!verb->get_subcommands().empty())
                 return;
-            command.deviceUse = traits.deviceUse;
-            command.prints = traits.prints;
+            command.deviceUse = deviceUse;
             command.verb = [run, &command] { return run(command); };
         });
     return verb;
@@ -119,7 +116,9 @@ void AddShowIds(CLI::App* verb, Command& command, const char* help)
 
 void AddCountry(CLI::App& app, Command& command)
 {
-    const auto [verb, options] = AddVerb(app, command, "country", "Show what the tables know about a country", ShowCountry);
+    const auto [verb, options] = AddVerb(app, command, "country", "Show the data about a country", ShowCountry);
+    AddFields(
+        verb, command, {"mcc", "name", "alpha2", "alpha3", "calling_code", "service_code", "mo_support", "alpha2_of_calling_code"});
     verb->add_option("KEY", options->key, "MCC (450), alpha-2 code (kr), calling code (82 or +82) or service country code (ko_KR)")
         ->required();
     Restrict(verb->add_option("--by", options->kind, "Type of KEY (default: guessed)"), CountryKeyKinds());
@@ -128,49 +127,64 @@ void AddCountry(CLI::App& app, Command& command)
 void AddDevice(CLI::App& app, Command& command)
 {
     const auto [device, options] = AddVerb(app, command, "device", "Show the device's properties and settings", ShowDevice);
+    AddFields(device, command,
+        {"name", "model", "platform", "platform_version", "platform_device_id", "serial", "imei", "sales_code", "language",
+            "language_iso639", "time", "font_size", "flight_mode", "mobile_data", "data_roaming", "storage_needed_mib",
+            "storage_suffices", "package", "package_installed", "package_version"});
     AddShowIds(device, command, "Show serial number, IMEI and platform device ID unmasked");
-    device->add_option("--package", options->package, "Show also whether this package is installed, and its version")
+    device->add_option("--package", options->package, "Also show whether this package is installed, and its version")
         ->type_name("ID");
-    device->add_option("--storage", options->storageMiB, "Show whether more than this is free in the internal storage")
+    device->add_option("--storage", options->storageMiB, "Check that more than this is free in the internal storage")
         ->type_name("MIB")
         ->capture_default_str()
         ->check(IsNumber);
-    AddVerb(*device, command, "id", "Ask the device daemon on the bus for the device unique ID", ShowDeviceId);
+    AddFields(AddVerb(*device, command, "id", "Ask the device daemon on the bus for the device unique ID", ShowDeviceId), command,
+        {"device_id"});
 
-    constexpr Traits kChangesFile{DeviceUse::Leaves, Prints::Events};
-    const auto [set, changes] =
-        AddVerb(*device, command, "set", "Change values in the device file that --profile names", SetInDeviceFile, kChangesFile);
-    set->add_option("GROUP.KEY=VALUE", changes->words, "What to change, all of it or nothing (keys: kivctl device keys)");
-    set->add_option("--from", changes->from, "Create the file from this profile (default: from the one in use)")
+    const auto [set, changes] = AddVerb(
+        *device, command, "set", "Change values in the device file that --profile names", SetInDeviceFile, DeviceUse::Leaves);
+    set->add_option("GROUP.KEY=VALUE", changes->words,
+        "Values to change; an error in one leaves all unchanged (kivctl device keys lists the keys)");
+    set->add_option("--from", changes->from, "Create the file from this profile (default: from the profile in use)")
         ->type_name("PROFILE");
     const auto [unset, removals] = AddVerb(*device, command, "unset",
-        "Remove keys from the device file that --profile names, so that they have their defaults", UnsetInDeviceFile, kChangesFile);
-    unset->add_option("GROUP.KEY", removals->words, "What to remove, all of it or nothing")->required();
+        "Reset keys of the device file that --profile names to their defaults", UnsetInDeviceFile, DeviceUse::Leaves);
+    unset->add_option("GROUP.KEY", removals->words, "Keys to remove from the file; an error in one leaves all unchanged")
+        ->required();
     const auto [get, value] =
-        AddVerb(*device, command, "get", "Show the device's values as a device file holds them", ShowDeviceValues);
+        AddVerb(*device, command, "get", "Show the device's values as they are in a device file", ShowDeviceValues);
+    AddFields(get, command, {"key", "value"});
     get->add_option("GROUP.KEY", value->key, "Print only this value");
-    AddShowIds(get, command, "List identifying values unmasked; with GROUP.KEY they always are");
-    AddVerb(*device, command, "keys", "List what a device file may contain", ShowDeviceKeys, kWithoutDevice);
+    AddShowIds(get, command, "Show values that identify a person or a device unmasked, as GROUP.KEY does");
+    AddFields(AddVerb(*device, command, "keys", "List the keys of a device file", ShowDeviceKeys, DeviceUse::Leaves), command,
+        {"key", "values", "default", "meaning"});
 
     CLI::App* const profiles =
-        AddVerb(app, command, "profiles", "List the devices that --profile knows by name", ShowProfiles, kWithoutDevice);
+        AddVerb(app, command, "profiles", "List the names that --profile accepts", ShowProfiles, DeviceUse::Leaves);
+    AddFields(profiles, command, {"name", "description"});
     const auto [show, profile] =
-        AddVerb(*profiles, command, "show", "Print a profile in the form of a device file", ShowProfile, kWithoutDevice);
+        AddVerb(*profiles, command, "show", "Print a profile in the form of a device file", ShowProfile, DeviceUse::Leaves);
+    AddFields(show, command, {"key", "value"});
     show->add_option("PROFILE", profile->name, "Name of the profile")->required();
 }
 
 void AddSim(CLI::App& app, Command& command)
 {
     const auto addSlot = [](CLI::App* verb, SimOptions& options)
-    { verb->add_option("--slot", options.slot, "Only this slot, counted from 0")->type_name("N")->check(IsSlot); };
+    { verb->add_option("--slot", options.slot, "Use only this slot, counted from 0")->type_name("N")->check(IsSlot); };
 
     const auto [sim, options] = AddVerb(app, command, "sim", "List the SIMs, one row per slot", ShowSims);
+    AddFields(sim, command,
+        {"slot", "cp_name", "state", "card", "mcc", "country", "mnc", "imsi", "number", "service", "service_type", "roaming", "sms",
+            "default_for"});
     addSlot(sim, *options);
     AddShowIds(sim, command, "Show IMSIs and subscriber numbers unmasked");
 
-    const auto [wait, waitOptions] = AddVerb(*sim, command, "wait", "Wait until a SIM is usable, asking once a second", WaitForSim);
+    const auto [wait, waitOptions] =
+        AddVerb(*sim, command, "wait", "Wait until a SIM is usable, checking once a second", WaitForSim);
+    AddFields(wait, command, {"usable_slot", "waited_seconds"});
     addSlot(wait, *waitOptions);
-    wait->add_option("--timeout", waitOptions->timeout, "Longest wait in seconds (default: as long as a card may become usable)")
+    wait->add_option("--timeout", waitOptions->timeout, "Maximum wait in seconds (default: as long as a SIM may become usable)")
         ->type_name("SECONDS")
         ->check(IsZeroOrMore);
 }
@@ -178,32 +192,33 @@ void AddSim(CLI::App& app, Command& command)
 void AddNetwork(CLI::App& app, Command& command)
 {
     const auto [verb, options] =
-        AddVerb(app, command, "network", "Show the network connections; exit code 0 when connected, 1 when not", ShowNetwork);
-    verb->add_flag("--wifi", options->countsWifi, "Count Wi-Fi as well as the cellular network");
-    verb->add_flag("--bluetooth,--bt", options->countsBluetooth, "Count Bluetooth as well as the cellular network");
-    AddVerb(app, command, "watch",
-        "Print network changes as they happen, and SIM changes, for which it asks once a second, until Ctrl-C", Watch,
-        kPrintsEvents);
+        AddVerb(app, command, "network", "Show the network connections; exit code 1 when not connected", ShowNetwork);
+    AddFields(verb, command, {"cellular", "wifi", "bluetooth", "connected"});
+    verb->add_flag("--wifi", options->countsWifi, "Also count Wi-Fi as a connection");
+    verb->add_flag("--bluetooth,--bt", options->countsBluetooth, "Also count Bluetooth as a connection");
+    AddVerb(app, command, "watch", "Print changes of the network and the SIMs until Ctrl-C", Watch);
 }
 
 void AddNotify(CLI::App& app, Command& command)
 {
     const auto [verb, options] =
-        AddVerb(app, command, "notify", "Notify the subscribers, or the service manager, of an event", Notify, kPrintsEvents);
+        AddVerb(app, command, "notify", "Send an event to the subscribers or to the service manager", Notify);
     Restrict(verb->add_option("TYPE", options->types,
-                     "Event; \"status\" means on, \"auth\" auth-success; on and off may be several, each with its --service")
+                     "Event to send; \"status\" means on, \"auth\" means auth-success; on and off may be repeated, each with its "
+                     "--service")
                  ->required(),
         NotificationTypes());
-    Restrict(verb->add_option("--to", options->to, "Whom to notify")->capture_default_str(), {"subscribers", "manager"});
-    verb->add_option("--imsi", options->imsi, "Subscriber identity (default: that of the first SIM that answers)")
+    Restrict(verb->add_option("--to", options->to, "Receivers of the event")->capture_default_str(), {"subscribers", "manager"});
+    verb->add_option("--imsi", options->imsi, "Subscriber that the event is about (default: the first SIM that answers)")
         ->type_name("IMSI");
-    verb->add_option("--service", options->services, "Service of on, off and policy, once for each TYPE")
+    verb->add_option("--service", options->services, "Service ID of on, off and policy; one for each TYPE")
         ->type_name("ID")
         ->check(IsServiceId);
-    verb->add_option("--texts", options->texts, "policy: status, feature, version, document URL; number-changed: any four")
+    verb->add_option("--texts", options->texts,
+            "Texts of the event; policy: status, feature, version, document URL; number-changed: any four")
         ->type_name("TEXT")
         ->expected(4);
-    verb->add_option("--timeout", options->timeout, "Longest wait for all answers in seconds (default: no limit); exit code 3")
+    verb->add_option("--timeout", options->timeout, "Maximum wait for all answers in seconds, then exit code 3 (default: no limit)")
         ->type_name("SECONDS")
         ->check(IsZeroOrMore);
 }
@@ -211,8 +226,8 @@ void AddNotify(CLI::App& app, Command& command)
 void AddPush(CLI::App& app, Command& command)
 {
     const auto [verb, options] =
-        AddVerb(app, command, "push", "Deliver a push message to the client services that subscribed to it", Push, kPrintsEvents);
-    verb->add_option("SERVICE", options->service, "Service that the message is for")->required();
+        AddVerb(app, command, "push", "Deliver a push message to the client services that subscribed to it", Push);
+    verb->add_option("SERVICE", options->service, "Name of the service that the message is for")->required();
     verb->add_option("--data", options->data, "Data for the client service")->required();
     verb->add_option("--message", options->message, "Message for the user")->required();
     verb->add_option("--time", options->time, "Time of sending, a 64-bit number (default: now, in seconds since 1970)")
@@ -222,52 +237,55 @@ void AddPush(CLI::App& app, Command& command)
 
 void AddSubscribe(CLI::App& app, Command& command)
 {
-    const auto [verb, options] = AddVerb(
-        app, command, "subscribe", "Run a client service: subscribe, and print each call, until Ctrl-C", Subscribe, kPrintsEvents);
+    const auto [verb, options] =
+        AddVerb(app, command, "subscribe", "Run a client service that prints each event until Ctrl-C", Subscribe);
     Restrict(
         verb->add_option("--kind", options->kinds, "Kind of event to subscribe to; may be repeated"), DASubscriberStore::Kinds());
-    verb->add_option("--key", options->key, "Service of policy and status (a number) and of push (a name)")->type_name("SERVICE");
+    verb->add_option("--key", options->key, "Service to subscribe to: a number for policy and status, a name for push")
+        ->type_name("SERVICE");
     verb->add_option("--push", options->pushes, "Same as --kind push --key SERVICE")->type_name("SERVICE");
     verb->add_option("--name", options->name, "Bus name to own (default: the connection's unique name)")->type_name("BUS_NAME");
-    verb->add_option("--store", options->store, "Subscribe in this file, not by the subscription service")->type_name("FILE");
+    verb->add_option("--store", options->store, "Write the subscriptions to this file instead of using the subscription service")
+        ->type_name("FILE");
 }
 
 void AddSubscribers(CLI::App& app, Command& command)
 {
     CLI::App* subscribers = AddToHelp(app, "subscribers", "Manage the subscriber store")->require_subcommand(1);
-    AddVerb(*subscribers, command, "list", "List all subscriptions, oldest first", ListSubscribers);
+    AddFields(AddVerb(*subscribers, command, "list", "List all subscriptions, oldest first", ListSubscribers), command,
+        {"kind", "key", "bus_name", "object_path", "interface"});
 
     const auto addFields = [](CLI::App* verb, SubscriptionOptions& options)
     {
         Restrict(verb->add_option("KIND", options.kind, "Kind of event")->required(), DASubscriberStore::Kinds());
-        verb->add_option("KEY", options.key, "Service id, service name for push, or \"all\"")->required();
-        verb->add_option("BUS_NAME", options.busName, "Such as org.example.Client")->required();
-        verb->add_option("OBJECT_PATH", options.objectPath, "Such as /org/example/Client")->required();
-        verb->add_option("INTERFACE", options.interface, "Such as org.example.Client")->required();
+        verb->add_option("KEY", options.key, "Service ID for policy and status, service name for push, or \"all\"")->required();
+        verb->add_option("BUS_NAME", options.busName, "Bus name of the client service, such as org.example.Client")->required();
+        verb->add_option("OBJECT_PATH", options.objectPath, "Its object, such as /org/example/Client")->required();
+        verb->add_option("INTERFACE", options.interface, "Interface of the object, such as org.example.Client")->required();
     };
-    const auto [add, added] = AddVerb(*subscribers, command, "add", "Record a subscription", AddSubscriber, kPrintsEvents);
+    const auto [add, added] = AddVerb(*subscribers, command, "add", "Add a subscription", AddSubscriber);
     addFields(add, *added);
-    const auto [remove, removed] =
-        AddVerb(*subscribers, command, "remove", "Remove a subscription", RemoveSubscriber, kPrintsEvents);
+    const auto [remove, removed] = AddVerb(*subscribers, command, "remove", "Remove a subscription", RemoveSubscriber);
     addFields(remove, *removed);
 }
 
 void AddServices(CLI::App& app, Command& command)
 {
-    const auto [verb, options] = AddVerb(app, command, "services",
-        "Run the device daemon and the service manager, and print each call, until Ctrl-C", RunServices, kPrintsEvents);
+    const auto [verb, options] = AddVerb(
+        app, command, "services", "Run the device daemon and the service manager, and print each event until Ctrl-C", RunServices);
     verb->add_option("--serial", options->serial, "Serial number that the device daemon returns (default: the device's own)");
 }
 
 void AddDoctor(CLI::App& app, Command& command)
 {
-    AddVerb(
-        app, command, "doctor", "Check bus, services, store, device and library, and suggest remedies", Examine, kWithoutDevice);
+    AddFields(AddVerb(app, command, "doctor", "Check bus, services, store, device and library, and suggest remedies", Examine,
+                  DeviceUse::Leaves),
+        command, {"check", "ok", "finding", "remedy"});
 }
 
 } // namespace
 
-/// Has the option take nothing but these words, "-" and "_" being one.
+/// Limits the option to these words; "-" and "_" are the same in them.
 void Restrict(CLI::Option* option, const std::vector<std::string>& words)
 {
     const auto check = [words](std::string& typed) -> std::string
@@ -282,7 +300,7 @@ void Restrict(CLI::Option* option, const std::vector<std::string>& words)
                 return "";
             }
         }
-        return '"' + typed + "\" is wrong" + DidYouMean(typed, words) + "; right are " + Joined(words, ", ");
+        return '"' + typed + "\" is invalid" + DidYouMean(typed, words) + "; expected one of " + Joined(words, ", ");
     };
     option->type_name(Joined(words, kOr))->transform(CLI::Validator(check, ""));
 }

@@ -9,7 +9,7 @@
 #include <vector>
 
 /// @file
-/// What kivctl can do: the verbs, each family in the source file of its name, and what each takes from the command line.
+/// The verbs of kivctl and the options of each. Each group of verbs is in the source file of its name.
 
 /// @name Country.cpp
 /// @{
@@ -127,7 +127,7 @@ struct SubscribeOptions
     std::string key;
     std::vector<std::string> pushes;
     std::string name;  ///< empty for the connection's unique name alone
-    std::string store; ///< empty for the subscription service, or else the usual file
+    std::string store; ///< empty to use the subscription service or, without it, the usual file
 };
 Exit Subscribe(const SubscribeOptions& options, const Command& command);
 /// @}

@@ -2,6 +2,7 @@
 #include "Verbs.h"
 
 #include <DASystem.h>
+#include <StandardOutput.h>
 #include <StopSignals.h>
 #include <glib.h>
 
@@ -11,7 +12,7 @@
 namespace
 {
 
-/// Prints what the device tells, on the thread on which it does.
+/// Prints the changes that the device reports, on the thread that reports them.
 class Printer : public IDAConnectionStateListener
 {
 public:
@@ -20,7 +21,7 @@ public:
     void OnWifiDeviceStateChanged(wifi_device_state_e state, void*) override
     {
         static constexpr Word kWords[] = {{WIFI_DEVICE_STATE_DEACTIVATED, "off"}, {WIFI_DEVICE_STATE_ACTIVATED, "on"}};
-        Tell("wifi_device", WordFor(kWords, state));
+        Report("wifi_device", WordFor(kWords, state));
     }
 
     void OnWifiConnectionStateChanged(wifi_connection_state_e state, void*, void*) override
@@ -28,41 +29,41 @@ public:
         static constexpr Word kWords[] = {{WIFI_CONNECTION_STATE_FAILURE, "failure"},
             {WIFI_CONNECTION_STATE_DISCONNECTED, "disconnected"}, {WIFI_CONNECTION_STATE_ASSOCIATION, "associating"},
             {WIFI_CONNECTION_STATE_CONFIGURATION, "configuring"}, {WIFI_CONNECTION_STATE_CONNECTED, "connected"}};
-        Tell("wifi_connection", WordFor(kWords, state));
+        Report("wifi_connection", WordFor(kWords, state));
     }
 
-    void OnFlightModeChanged(bool enabled, void*) override { Tell("flight_mode", enabled); }
-    void OnPacketDataChanged(bool enabled, void*) override { Tell("packet_data", enabled); }
-    void OnWifiConnectedChanged(bool connected, void*) override { Tell("wifi_connected", connected); }
+    void OnFlightModeChanged(bool enabled, void*) override { Report("flight_mode", enabled); }
+    void OnPacketDataChanged(bool enabled, void*) override { Report("packet_data", enabled); }
+    void OnWifiConnectedChanged(bool connected, void*) override { Report("wifi_connected", connected); }
 
 private:
-    void Tell(const char* event, Value value) const { PrintLine({{"event", event}, {"value", std::move(value)}}, form_); }
+    void Report(const char* event, Value value) const { PrintLine({{"event", event}, {"value", std::move(value)}}, form_); }
 
     const Form form_;
 };
 
-/// Asks for the card statuses once a second, in the default main context, and prints what changed: the platform does not notify of
-/// it.
+/// Reads the card statuses once a second, in the default main context, and prints their changes, because the platform does not
+/// report them.
 class CardWatch
 {
 public:
-    explicit CardWatch(const Form& form) : form_(form), cards_(Ask()), timer_(g_timeout_add_seconds(1, Look, this)) {}
+    explicit CardWatch(const Form& form) : form_(form), cards_(ReadCards()), timer_(g_timeout_add_seconds(1, Check, this)) {}
     CardWatch(const CardWatch&) = delete;
     CardWatch& operator=(const CardWatch&) = delete;
     ~CardWatch() { g_source_remove(timer_); }
 
 private:
     /// Card statuses by slot; none of a device without modems.
-    static std::vector<std::string> Ask()
+    static std::vector<std::string> ReadCards()
     {
         g_auto(GStrv) names = DASystem::GetInstance()->GetCpNameList();
         std::vector<std::string> cards;
         for (int slot = 0; names != nullptr && names[slot] != nullptr; ++slot)
-            cards.push_back(AskForCard(slot).text);
+            cards.push_back(ReadCard(slot).text);
         return cards;
     }
 
-    static gboolean Look(gpointer self)
+    static gboolean Check(gpointer self)
     {
         static_cast<CardWatch*>(self)->PrintChanges();
         return G_SOURCE_CONTINUE;
@@ -70,7 +71,7 @@ private:
 
     void PrintChanges()
     {
-        std::vector<std::string> now = Ask();
+        std::vector<std::string> now = ReadCards();
         const auto card = [](const char* name, const std::vector<std::string>& cards, size_t slot) {
             return slot < cards.size() ? Field{name, cards[slot]} : Missing(name, "no such slot");
         };
@@ -95,16 +96,16 @@ Exit Watch(const Command& command)
 {
     const std::string device = DeviceAskedFor(command);
     if (IsProfileName(device) && !IsHost(device))
-        Note("this device comes from a profile and never changes; one from a file does (kivctl device set --profile FILE)");
+        Note("a device from a profile never changes; to change one, use a device file (kivctl device set --profile FILE)");
 
-    // Registered for as long as the process lives: taking it back is for a moment in which no change can be under way, and there
-    // is none while the device goes on on a thread of its own.
+    // Registered until the process ends: it may be removed only while no change is being delivered, and the device delivers on
+    // its own thread at any time.
     static Printer* const printer = new Printer(command.form);
     kiv::StopSignals signals;
     DASystem::GetInstance()->SetConnectionEventListener(printer, nullptr);
     const CardWatch cards(command.form);
     PrintLine({{"event", "ready"}}, command.form);
     signals.IterateWhile([] { return true; });
-    EndStream();
+    kiv::StandardOutput::EndStream();
     return Exit::Done;
 }

@@ -1,6 +1,7 @@
 #include "CommandLine.h"
 
 #include <BusParty.h>
+#include <StandardOutput.h>
 #include <glib.h>
 
 #include <exception>
@@ -12,17 +13,17 @@ Exit Run(int argc, char** argv)
 {
     Command command;
     ReadCommandLine(argc, argv, command);
-    if (!command.verb) // --help and --version did it all
+    if (!command.verb) // after --help and --version
         return Exit::Done;
     if (command.deviceUse == DeviceUse::Asks)
         RequireDevice(command);
     return command.verb();
 }
 
-/// The exit code once everything is written.
+/// The exit code, once all output is written.
 Exit Finish(Exit exit)
 {
-    const int error = WriteError();
+    const int error = kiv::StandardOutput::Error();
     if (error == 0)
         return exit;
     throw Failure(Exit::NotWritten, std::string("cannot write to standard output: ") + g_strerror(error));
