@@ -1,7 +1,7 @@
 #!/bin/bash
 # Builds the library with the simulated device, and shows both at work on a message bus of its own: the device, its SIMs, countries,
-# notifications, push messages, and a change of the network that a watcher hears of; then the machine itself. Whatever it starts it
-# stops.
+# notifications, push messages, and a change of the network that a watcher notices. At the end it shows the machine itself. It stops
+# everything that it starts.
 set -euo pipefail
 here=$(dirname "$(readlink -f "$0")")
 cd "$here"
@@ -84,11 +84,11 @@ show() # argument...
     kivctl "$@" || echo "(exit code $?)"
 }
 
-# The same on one line, for an answer of one line.
+# The same on one line, for an answer of one line. Progress, which would overwrite that line, is shown on a terminal alone.
 tell() # argument...
 {
     printf '%-70s  ' "$(prompt "$@")"
-    kivctl "$@"
+    kivctl "$@" 2>&1 | cat
 }
 
 saw() # name

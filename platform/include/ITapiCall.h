@@ -16,6 +16,7 @@ typedef enum PLATFORM_OPEN_ENUM
     TAPI_CALL_PREFERRED_VOICE_SUBS_SIM2 = 1
 } TelCallPreferredVoiceSubs_t;
 
+/// @param handle  open handle
 /// @param subscription  receives a TelCallPreferredVoiceSubs_t, possibly a value without a name here
 int tel_get_call_preferred_voice_subscription(TapiHandle* handle, TelCallPreferredVoiceSubs_t* subscription);
 

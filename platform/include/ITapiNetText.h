@@ -8,6 +8,7 @@
 
 PLATFORM_BEGIN_DECLS
 
+/// @param handle  open handle
 /// @param ready_status  receives 0 while the modem is not ready for text messages, else another value
 int tel_check_sms_device_status(TapiHandle* handle, int* ready_status);
 

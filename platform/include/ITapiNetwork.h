@@ -24,9 +24,11 @@ typedef enum PLATFORM_OPEN_ENUM
     TAPI_NETWORK_DEFAULT_DATA_SUBS_SIM2 = 1
 } TelNetworkDefaultDataSubs_t;
 
+/// @param handle  open handle
 /// @param subscription  receives a TelNetworkDefaultSubs_t, possibly a value without a name here
 int tel_get_network_default_subscription(TapiHandle* handle, TelNetworkDefaultSubs_t* subscription);
 
+/// @param handle  open handle
 /// @param subscription  receives a TelNetworkDefaultDataSubs_t, possibly a value without a name here
 int tel_get_network_default_data_subscription(TapiHandle* handle, TelNetworkDefaultDataSubs_t* subscription);
 

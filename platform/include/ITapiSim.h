@@ -8,6 +8,7 @@
 
 PLATFORM_BEGIN_DECLS
 
+/// The status of a SIM card.
 typedef enum PLATFORM_OPEN_ENUM
 {
     TAPI_SIM_STATUS_CARD_ERROR = 0,
@@ -36,10 +37,12 @@ typedef struct
     char szMsin[10 + 1]; ///< subscriber within the network: the remaining digits
 } TelSimImsiInfo_t;
 
+/// @param handle  open handle
 /// @param status        receives a TelSimCardStatus_t, possibly a value without a name here
 /// @param card_changed  receives 1 when the card has changed since the last start, else 0
 int tel_get_sim_init_info(TapiHandle* handle, TelSimCardStatus_t* status, int* card_changed);
 
+/// @param handle  open handle
 /// @param imsi  receives the record; filled on success only
 int tel_get_sim_imsi(TapiHandle* handle, TelSimImsiInfo_t* imsi);
 

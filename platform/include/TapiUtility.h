@@ -26,6 +26,7 @@ TapiHandle* tel_init(const char* cp_name);
 /// Closes a handle.
 int tel_deinit(TapiHandle* handle);
 
+/// @param handle  open handle
 /// @param property  "INTERFACE:PROPERTY"; borrowed
 /// @param result    receives the value
 int tel_get_property_int(TapiHandle* handle, const char* property, int* result);

@@ -11,6 +11,7 @@ PLATFORM_BEGIN_DECLS
 /// A client of the connection service.
 typedef void* connection_h;
 
+/// The state of the cellular connection.
 typedef enum PLATFORM_OPEN_ENUM
 {
     CONNECTION_CELLULAR_STATE_OUT_OF_SERVICE = 0,
@@ -21,6 +22,7 @@ typedef enum PLATFORM_OPEN_ENUM
     CONNECTION_CELLULAR_STATE_CONNECTED = 5
 } connection_cellular_state_e;
 
+/// The state of the Wi-Fi connection.
 typedef enum PLATFORM_OPEN_ENUM
 {
     CONNECTION_WIFI_STATE_DEACTIVATED = 0,
@@ -28,6 +30,7 @@ typedef enum PLATFORM_OPEN_ENUM
     CONNECTION_WIFI_STATE_CONNECTED = 2
 } connection_wifi_state_e;
 
+/// The state of the Bluetooth connection.
 typedef enum PLATFORM_OPEN_ENUM
 {
     CONNECTION_BT_STATE_DEACTIVATED = 0,
@@ -38,14 +41,18 @@ typedef enum PLATFORM_OPEN_ENUM
 /// @param connection  receives a handle, which the caller releases with connection_destroy()
 int connection_create(connection_h* connection);
 
+/// Releases a handle.
 int connection_destroy(connection_h connection);
 
+/// @param connection  open handle
 /// @param state  receives a connection_cellular_state_e, possibly a value without a name here
 int connection_get_cellular_state(connection_h connection, connection_cellular_state_e* state);
 
+/// @param connection  open handle
 /// @param state  receives a connection_wifi_state_e, possibly a value without a name here
 int connection_get_wifi_state(connection_h connection, connection_wifi_state_e* state);
 
+/// @param connection  open handle
 /// @param state  receives a connection_bt_state_e, possibly a value without a name here
 int connection_get_bt_state(connection_h connection, connection_bt_state_e* state);
 

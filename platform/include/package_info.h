@@ -7,6 +7,7 @@
 
 PLATFORM_BEGIN_DECLS
 
+/// The open record of one package.
 typedef struct package_info* package_info_h;
 
 /// Opens the record of a package. Returns PACKAGE_MANAGER_ERROR_NO_SUCH_PACKAGE for an unknown package.
@@ -14,8 +15,10 @@ typedef struct package_info* package_info_h;
 /// @param package_info  receives a handle, which the caller releases with package_info_destroy()
 int package_info_create(const char* package_id, package_info_h* package_info);
 
+/// Releases a handle.
 int package_info_destroy(package_info_h package_info);
 
+/// @param package_info  open handle
 /// @param version  receives the version text; free() it
 int package_info_get_version(package_info_h package_info, char** version);
 

@@ -7,6 +7,7 @@
 
 PLATFORM_BEGIN_DECLS
 
+/// Results of the package services. Other negative values are errors without a name here.
 typedef enum PLATFORM_OPEN_ENUM
 {
     PACKAGE_MANAGER_ERROR_NONE = 0,
@@ -16,8 +17,10 @@ typedef enum PLATFORM_OPEN_ENUM
 /// The sizes of a package, valid while the callback runs.
 typedef struct package_size_info* package_size_info_h;
 
+/// Receives the sizes of a package.
 typedef void (*package_manager_size_info_receive_cb)(const char* package_id, const package_size_info_h size_info, void* user_data);
 
+/// @param user_data  passed to the callback
 /// Requests the sizes of a package. The result says whether the package is known.
 /// @param package_id  borrowed
 /// @param callback    receives the sizes; null when only the result matters

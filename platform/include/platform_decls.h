@@ -3,8 +3,13 @@
 #ifndef KIV_PLATFORM_DECLS_H
 #define KIV_PLATFORM_DECLS_H
 
-/// PLATFORM_OPEN_ENUM makes an enumeration an open one. Services may return values that its header does not name, so its
-/// underlying type in C++ is int: any int may be stored in it and read from it.
+/// @def PLATFORM_BEGIN_DECLS
+/// Begins declarations of C.
+/// @def PLATFORM_END_DECLS
+/// Ends declarations of C.
+/// @def PLATFORM_OPEN_ENUM
+/// Makes an enumeration an open one. Services may return values that its header does not name, so its underlying type in C++ is
+/// int: any int may be stored in it and read from it.
 #ifdef __cplusplus
 #define PLATFORM_BEGIN_DECLS                                                                                                       \
     extern "C"                                                                                                                     \

@@ -8,6 +8,7 @@
 
 PLATFORM_BEGIN_DECLS
 
+/// The values that can be read and watched, with their types.
 typedef enum PLATFORM_OPEN_ENUM
 {
     RUNTIME_INFO_KEY_FLIGHT_MODE_ENABLED = 0,  ///< bool
@@ -16,6 +17,7 @@ typedef enum PLATFORM_OPEN_ENUM
     RUNTIME_INFO_KEY_DATA_ROAMING_ENABLED = 10 ///< bool
 } runtime_info_key_e;
 
+/// Values of RUNTIME_INFO_KEY_WIFI_STATUS.
 typedef enum PLATFORM_OPEN_ENUM
 {
     RUNTIME_INFO_WIFI_STATUS_DISABLED = 0,
@@ -23,11 +25,14 @@ typedef enum PLATFORM_OPEN_ENUM
     RUNTIME_INFO_WIFI_STATUS_CONNECTED = 2
 } runtime_info_wifi_status_e;
 
+/// @param key  the value in question
 /// @param user_data  that of the registration
 typedef void (*runtime_info_changed_cb)(runtime_info_key_e key, void* user_data);
 
+/// Reads a number.
 int runtime_info_get_value_int(runtime_info_key_e key, int* value);
 
+/// Reads a switch.
 int runtime_info_get_value_bool(runtime_info_key_e key, bool* value);
 
 /// Registers a callback for changes of one value. A second registration for the key replaces the first. The callback runs on a

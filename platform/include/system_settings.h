@@ -8,6 +8,7 @@
 
 PLATFORM_BEGIN_DECLS
 
+/// The settings, with their types.
 typedef enum PLATFORM_OPEN_ENUM
 {
     SYSTEM_SETTINGS_KEY_FONT_SIZE = 3,               ///< int: 0 small, 1 normal, 2 large, 3 huge, 4 giant
@@ -16,15 +17,19 @@ typedef enum PLATFORM_OPEN_ENUM
     SYSTEM_SETTINGS_KEY_DEVICE_NAME = 21             ///< string
 } system_settings_key_e;
 
+/// Results of this service.
 typedef enum PLATFORM_OPEN_ENUM
 {
     SYSTEM_SETTINGS_ERROR_NONE = 0
 } system_settings_error_e;
 
+/// Reads a number.
 int system_settings_get_value_int(system_settings_key_e key, int* value);
 
+/// Reads a switch.
 int system_settings_get_value_bool(system_settings_key_e key, bool* value);
 
+/// @param key  the value in question
 /// @param value  receives the text; free() it
 int system_settings_get_value_string(system_settings_key_e key, char** value);
 

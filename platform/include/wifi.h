@@ -11,12 +11,14 @@ PLATFORM_BEGIN_DECLS
 /// An access point; valid while the callback that received it runs.
 typedef void* wifi_ap_h;
 
+/// Whether Wi-Fi is switched on.
 typedef enum PLATFORM_OPEN_ENUM
 {
     WIFI_DEVICE_STATE_DEACTIVATED = 0,
     WIFI_DEVICE_STATE_ACTIVATED = 1
 } wifi_device_state_e;
 
+/// The state of the connection to an access point.
 typedef enum PLATFORM_OPEN_ENUM
 {
     WIFI_CONNECTION_STATE_FAILURE = -1,
@@ -26,9 +28,11 @@ typedef enum PLATFORM_OPEN_ENUM
     WIFI_CONNECTION_STATE_CONNECTED = 3
 } wifi_connection_state_e;
 
+/// @param state  the new state
 /// @param user_data  that of the registration
 typedef void (*wifi_device_state_changed_cb)(wifi_device_state_e state, void* user_data);
 
+/// @param state  the new state
 /// @param ap         the access point in question, possibly null
 /// @param user_data  that of the registration
 typedef void (*wifi_connection_state_changed_cb)(wifi_connection_state_e state, wifi_ap_h ap, void* user_data);

@@ -15,6 +15,7 @@ public:
     /// Appends the subscribers of one event, in the order in which they subscribed.
     /// @param kind  "policy", "status", "auth", "activated" or "number_changed"
     /// @param key   decimal service ID for "policy" and "status", "all" for the others
+    /// @param subscribers  the list to append to
     /// @return whether the store could be read; if not, logs one error line and appends nothing
     /// Any thread; blocks on the store's file.
     bool GetSubscriber(const char* kind, const char* key, std::list<_SubscriberInfo>& subscribers);

@@ -35,6 +35,7 @@ struct DASubscription
 class __attribute__((visibility("default"))) DASubscriberStore
 {
 public:
+    /// What became of a call.
     enum class Outcome
     {
         Done,
