@@ -21,6 +21,24 @@ pid_t Start(const std::function<bool()>& run)
     return child;
 }
 
+/// Waits until all other threads sleep, which is when they hold no lock that a child would inherit.
+void AwaitSleepOfOthers()
+{
+    const auto areAsleep = []
+    {
+        const std::string self = std::to_string(gettid());
+        for (const auto& thread : std::filesystem::directory_iterator("/proc/self/task"))
+        {
+            std::string stat;
+            std::getline(std::ifstream(thread.path() / "stat"), stat);
+            if (thread.path().filename() != self && stat.find(") S ") == std::string::npos)
+                return false;
+        }
+        return true;
+    };
+    IterateUntil([&] { return areAsleep() && areAsleep(); });
+}
+
 bool Succeeds(pid_t child)
 {
     int status = 1;
@@ -87,7 +105,9 @@ TEST(Fork, DeniesTheBusOnlyToChildrenOfItsUsers)
     EXPECT_TRUE(Succeeds(early.child));
     EXPECT_EQ(2U, client.Calls().size());
 
+    const Connection held(g_bus_get_sync(G_BUS_TYPE_SYSTEM, nullptr, nullptr)); // else GDBus is still closing it at the fork
     EXPECT_EQ(0U, CallAll(client.Name()));
+    AwaitSleepOfOthers();
     EXPECT_TRUE(Succeeds(Start([&] { return CallAll(client.Name()) == 4; }))) << "fails at once where the parent used the bus";
     EXPECT_EQ(4U, client.Calls().size());
     EXPECT_EQ(0U, CallAll(client.Name())) << "the parent goes on";
