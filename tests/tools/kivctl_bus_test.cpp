@@ -32,8 +32,8 @@ TEST_F(KivctlTest, CarriesEveryNotificationToItsReceivers)
     {
         const std::string type = arguments.substr(0, arguments.find(' '));
         types += type == "number_changed" ? "" : ' ' + type + ','; // the other spelling of a type
-        const Outcome told = Kivctl("notify --imsi 1 " + arguments);
-        EXPECT_EQ("sent subscribers=1 delivered=1\n", told.out) << arguments << "\n" << told.err;
+        const Outcome sent = Kivctl("notify --imsi 1 " + arguments);
+        EXPECT_EQ("sent subscribers=1 delivered=1\n", sent.out) << arguments << "\n" << sent.err;
         all.Await(call);
         const bool isRefused = Kivctl("notify --to manager --imsi 1 " + arguments).exit == 4;
         EXPECT_EQ(arguments.find("number") == 0, isRefused) << arguments;
@@ -50,11 +50,11 @@ TEST_F(KivctlTest, CarriesEveryNotificationToItsReceivers)
     for (const std::string arguments :
         {"notify --imsi 1 on --service 7", "push mail --data '{\"a\":1}' --message 'two words' --time -5000000000"})
     {
-        const Outcome told = Kivctl(arguments);
-        EXPECT_EQ(1, told.exit) << arguments;
-        EXPECT_EQ("sent subscribers=2 delivered=1\n", told.out) << arguments;
+        const Outcome sent = Kivctl(arguments);
+        EXPECT_EQ(1, sent.exit) << arguments;
+        EXPECT_EQ("sent subscribers=2 delivered=1\n", sent.out) << arguments;
         const std::string kind = arguments[0] == 'p' ? "push mail" : "status 7";
-        EXPECT_THAT(told.err, HasSubstr("remove its record: kivctl subscribers remove " + kind + " org.gone.Away /a a.b\n"));
+        EXPECT_THAT(sent.err, HasSubstr("remove its record: kivctl subscribers remove " + kind + " org.gone.Away /a a.b\n"));
     }
     all.Await("push service_id='mail' data='{\"a\":1}' message='two words' time=-5000000000\n");
     Kivctl("push mail --data d --message now");
@@ -98,9 +98,9 @@ TEST_F(KivctlTest, LimitsTheWaitForAServiceThatIsStuck)
     for (const auto& [receiver, trouble] : std::map<std::string, const char*>{
              {"subscribers", "kivctl: not delivered to a.b: no answer in time\n"}, {"manager", "did not answer in time"}})
     {
-        const Outcome told = Kivctl("notify auth --timeout 0.2 --to " + receiver);
-        EXPECT_EQ(3, told.exit) << receiver;
-        EXPECT_THAT(told.err, HasSubstr(trouble));
+        const Outcome sent = Kivctl("notify auth --timeout 0.2 --to " + receiver);
+        EXPECT_EQ(3, sent.exit) << receiver;
+        EXPECT_THAT(sent.err, HasSubstr(trouble));
     }
     examined.Await("org.tizen.servicemanager.service does not answer");
     for (Service* stuck : {&board, &manager, &client})

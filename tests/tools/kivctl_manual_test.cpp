@@ -22,7 +22,7 @@ std::string Complete(const std::string& words)
 
 TEST_F(KivctlTest, PrintsWhatThePagesShow)
 {
-    std::map<std::string, Service> beside; // by the expected output
+    std::map<std::string, Service> running; // by the expected output
     const std::string pages = Contents(KIV_DOCS "/profiles.md") + Contents(KIV_DOCS "/kivctl.md");
     g_auto(GStrv) examples = g_strsplit(pages.c_str(), "\n$ kivctl ", -1);
     EXPECT_LT(42U, g_strv_length(examples));
@@ -33,14 +33,14 @@ TEST_F(KivctlTest, PrintsWhatThePagesShow)
         const std::string printed = example.substr(arguments.size() + 1);
         if (arguments.back() == '&')
         {
-            beside.try_emplace(printed, KIVCTL " " + arguments.substr(0, arguments.size() - 2));
+            running.try_emplace(printed, KIVCTL " " + arguments.substr(0, arguments.size() - 2));
             continue;
         }
         const Outcome outcome = Kivctl(arguments);
         const std::string end = outcome.exit ? "(exit code " + std::to_string(outcome.exit) + ")\n" : "";
         EXPECT_EQ(Steady(printed), Steady(outcome.out + outcome.err + end)) << arguments;
     }
-    for (const auto& [printed, program] : beside)
+    for (const auto& [printed, program] : running)
     {
         program.Await(printed);
         EXPECT_EQ(printed, program.Out());

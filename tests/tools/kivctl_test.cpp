@@ -84,6 +84,7 @@ TEST_F(KivctlTest, EndsWithTheDocumentedExitCode)
             ""},
         {"push m --data d --message m --time now", 2, "", "--time: \"now\" is invalid; expected a 64-bit whole number"},
         {"device --storage x", 2, "", "--storage: \"x\" is invalid; expected a number"},
+        {"notify policy --service 7 --texts a b", 2, "", "--texts needs 4 values, not 2; see"},
         {"country 450 --by", 2, "", "--by needs a value: mcc|alpha2|calling|service"},
         {"--color always -p single --fields slot sim", 0, "\033[1mslot\033[0m\n", ""},
         {"subscribers list --json", 0, "[]", "there are no subscriptions in "},
@@ -152,6 +153,7 @@ TEST_F(KivctlTest, PrintsNoLineThatIsWiderThanTheTerminal)
     EXPECT_EQ((std::vector<std::string>{"slot  card", "0     ready", "1     ready"}),
         OnTerminal("80", "--color never --fields slot,card sim"));
     EXPECT_THAT(OnTerminal("40", "sim --help"), testing::IsSupersetOf({"  --slot N", "    Use only this slot, counted from 0"}));
+    EXPECT_THAT(OnTerminal("80", "--help"), testing::Contains(std::string(28, ' ') + "(default: auto)"));
 }
 
 TEST_F(KivctlTest, PausesBetweenTwoChecksWhileItWaitsForASim)

@@ -20,6 +20,8 @@
 namespace
 {
 
+constexpr size_t kHelpColumn = 28; ///< of the descriptions
+
 constexpr char kAbout[] =
     "Query the device as an agent does, send an agent's notifications and push messages, run a client service, and change the "
     "simulated device.";
@@ -35,12 +37,15 @@ std::string Footer()
     }
     text += "\nEnvironment:";
     for (const Variable& variable : kEnvironment)
-        text.append("\n  ").append(variable.name).append(26 - std::strlen(variable.name), ' ').append(variable.meaning);
+        text.append("\n  ")
+            .append(variable.name)
+            .append(kHelpColumn - 2 - std::strlen(variable.name), ' ')
+            .append(variable.meaning);
     return text;
 }
 
-constexpr char kVerbFooter[] = R"(Options of every verb: --json, --profile NAME|FILE, --color WHEN
-Options of every query: --fields NAME,NAME, --terse
+constexpr char kVerbFooter[] = R"(Options of every verb: --json, --color WHEN, --profile NAME|FILE
+Options of every query: --terse, --fields NAME,NAME
 kivctl --help describes these options, the exit codes and the environment.)";
 
 OptionManual Describe(const CLI::Option& option, const CLI::Formatter& formatter)
@@ -156,9 +161,16 @@ Place FindPlace(const CLI::App& program)
     return place;
 }
 
-/// Rewords the parser's message about a missing value.
+/// Rewords the parser's messages about missing values.
 std::string Plain(const std::string& text)
 {
+    const std::string atLeast = ": At least ", received = " required but received ";
+    if (const size_t least = text.find(atLeast), but = text.find(received); least != text.npos && but != text.npos)
+    {
+        const size_t count = least + atLeast.size();
+        return text.substr(0, least) + " needs " + text.substr(count, but - count) + " values, not " +
+               text.substr(but + received.size());
+    }
     const std::string number = " required ", missing = " missing";
     const size_t name = text.find(": "), words = text.find(number);
     if (name == text.npos || words == text.npos || text.rfind(missing) != text.size() - missing.size())
@@ -204,7 +216,7 @@ void CheckForm(const CLI::App& program, const Command& command)
 void ReadCommandLine(int argc, char** argv, Command& command)
 {
     const auto formatter = std::make_shared<CLI::Formatter>();
-    formatter->column_width(28);
+    formatter->column_width(kHelpColumn);
     formatter->label("REQUIRED", "(required)");
     formatter->label("SUBCOMMAND", "VERB");
     formatter->label("Excludes", "Not with");
@@ -229,7 +241,7 @@ void ReadCommandLine(int argc, char** argv, Command& command)
     {
         std::ostringstream text;
         app.exit(success, text);
-        kiv::StandardOutput::Write(WrappedHelp(text.str(), TerminalWidth(STDOUT_FILENO)));
+        kiv::StandardOutput::Write(WrappedHelp(text.str(), TerminalWidth(STDOUT_FILENO), kHelpColumn));
     }
     catch (const CLI::ParseError& error)
     {

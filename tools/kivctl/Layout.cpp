@@ -30,12 +30,16 @@ size_t BytesThatFit(const std::string& text, size_t width)
     return static_cast<size_t>(at - begin);
 }
 
-/// Where the description in a line of help begins, after two or more blanks; the line's indentation when there is none.
-size_t DescriptionBegin(const std::string& line)
+/// Where the description in a line of help begins: after two or more blanks, or in the column of descriptions when the heading ends
+/// right before it. The line's indentation when there is no description.
+size_t DescriptionBegin(const std::string& line, size_t column)
 {
     const size_t heading = std::min(line.find_first_not_of(' '), line.size());
     const size_t gap = line.find("  ", heading);
-    return gap == line.npos ? heading : std::min(line.find_first_not_of(' ', gap), line.size());
+    if (gap != line.npos)
+        return std::min(line.find_first_not_of(' ', gap), line.size());
+    const bool isFullHeading = heading > 0 && heading < column && line.size() > column && line[column - 1] == ' ';
+    return isFullHeading ? column : heading;
 }
 
 } // namespace
@@ -92,13 +96,13 @@ std::vector<std::string> WrappedBehindHeading(const std::string& text, size_t wi
     return lines;
 }
 
-std::string WrappedHelp(const std::string& text, size_t width)
+std::string WrappedHelp(const std::string& text, size_t width, size_t column)
 {
     std::string wrapped;
     std::istringstream lines(text);
     for (std::string line; std::getline(lines, line);)
     {
-        for (const std::string& piece : WrappedBehindHeading(line, width, DescriptionBegin(line)))
+        for (const std::string& piece : WrappedBehindHeading(line, width, DescriptionBegin(line, column)))
             wrapped += piece + '\n';
     }
     return wrapped;

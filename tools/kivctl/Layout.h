@@ -30,6 +30,7 @@ std::vector<std::string> Wrapped(const std::string& text, size_t width, size_t i
 std::vector<std::string> WrappedBehindHeading(const std::string& text, size_t width, size_t indent);
 
 /// Wraps each line of a help text. A description continues below its beginning.
-std::string WrappedHelp(const std::string& text, size_t width);
+/// @param column  where the descriptions begin that are next to a heading
+std::string WrappedHelp(const std::string& text, size_t width, size_t column);
 
 #endif

@@ -260,7 +260,7 @@ void AddSubscribers(CLI::App& app, Command& command)
         Restrict(verb->add_option("KIND", options.kind, "Kind of event")->required(), DASubscriberStore::Kinds());
         verb->add_option("KEY", options.key, "Service ID for policy and status, service name for push, or \"all\"")->required();
         verb->add_option("BUS_NAME", options.busName, "Bus name of the client service, such as org.example.Client")->required();
-        verb->add_option("OBJECT_PATH", options.objectPath, "Its object, such as /org/example/Client")->required();
+        verb->add_option("OBJECT_PATH", options.objectPath, "Path of its object, such as /org/example/Client")->required();
         verb->add_option("INTERFACE", options.interface, "Interface of the object, such as org.example.Client")->required();
     };
     const auto [add, added] = AddVerb(*subscribers, command, "add", "Add a subscription", AddSubscriber);

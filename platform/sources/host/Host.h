@@ -16,7 +16,7 @@
 namespace kiv::platform
 {
 
-constexpr char kHostDescription[] = "the machine itself: its modems, its connections and what its files tell";
+constexpr char kHostDescription[] = "the machine itself: its modems, connections and files";
 
 /// Keeps the device as ModemManager, NetworkManager and BlueZ report it, on a thread of its own and over a bus connection of its
 /// own. A child of fork() has no copy of the thread: it answers from what was known at that moment.
