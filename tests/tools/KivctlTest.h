@@ -7,6 +7,7 @@
 
 #include <csignal>
 #include <regex>
+#include <sys/stat.h>
 
 namespace kiv::test
 {
@@ -81,6 +82,7 @@ struct KivctlTest : testing::Test
     KivctlTest()
     {
         std::filesystem::current_path(directory);
+        mkfifo("keyboard", 0600); // nobody types; at the end of its input, a terminal would print what ends it
         g_setenv("KIV_SUBSCRIBERS", (directory + "/subscribers.db").c_str(), TRUE);
     }
     ~KivctlTest() override { std::filesystem::remove_all(directory); }

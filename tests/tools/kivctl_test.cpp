@@ -131,8 +131,9 @@ TEST_F(KivctlTest, SaysThatTheOutputCannotBeWritten)
 /// The lines that the program prints on a terminal of that width.
 std::vector<std::string> OnTerminal(const std::string& columns, const std::string& arguments)
 {
-    const std::string out =
-        Outcome("script --quiet --echo never --command 'stty cols " + columns + "; " KIVCTL " " + arguments + "' /dev/null").out;
+    const std::string out = Outcome(
+        "script --quiet --echo never --command 'stty cols " + columns + "; " KIVCTL " " + arguments + "' /dev/null <>keyboard")
+                                .out;
     const std::regex ends("\r*\n");
     return {std::sregex_token_iterator(out.begin(), out.end(), ends, -1), std::sregex_token_iterator()};
 }
@@ -165,7 +166,7 @@ TEST_F(KivctlTest, PausesBetweenTwoChecksWhileItWaitsForASim)
 TEST_F(KivctlTest, ShowsColoursAndProgressOnATerminal)
 {
     const std::string colour = "\033[1m", progress = "\r\033[Kchecking the bus";
-    const std::string onTerminal = " script --quiet --echo never --command '" KIVCTL " doctor' /dev/null";
+    const std::string onTerminal = " script --quiet --echo never --command '" KIVCTL " doctor' /dev/null <>keyboard";
     EXPECT_THAT(Outcome("env -u NO_COLOR TERM=xterm" + onTerminal).out, AllOf(HasSubstr(colour), HasSubstr(progress)));
     EXPECT_THAT(Outcome("env NO_COLOR=1 TERM=xterm" + onTerminal).out, AllOf(testing::Not(HasSubstr(colour)), HasSubstr(progress)));
 }
