@@ -45,7 +45,7 @@ NAMES
 rm -r "$scratch/made"
 
 cp -r "$sources"/{CMakeLists.txt,cmake,dbus} "$scratch/tree"
-cp -r "$sources/lib/DASystem" "$scratch/tree/lib"
+cp -r "$sources"/lib/{DASystem,records} "$scratch/tree/lib"
 export PKG_CONFIG_PATH=$device/lib/pkgconfig
 configure() # option...
 {

@@ -21,7 +21,17 @@ lintian --allow-root --fail-on error ./*.deb
 root=$scratch/root
 mkdir -p "$root"/var/lib/dpkg/{info,updates,triggers}
 cp "${KIV_SYSROOT-}/var/lib/dpkg/status" "$root/var/lib/dpkg/status"
-dpkg-deb --field ./kivctl*.deb Architecture >"$root/var/lib/dpkg/arch"
+arch=$(dpkg-deb --field ./kivctl*.deb Architecture)
+echo "$arch" >"$root/var/lib/dpkg/arch"
+# dpkg counts what is for all architectures to its own, where the device's counts it to the device's.
+if [[ $arch != "$(dpkg --print-architecture)" ]]; then
+    for package in ./*_all.deb; do
+        dpkg-deb --raw-extract "$package" "$scratch/all"
+        sed --in-place "s/^Architecture: all/Architecture: $arch/" "$scratch/all/DEBIAN/control"
+        dpkg-deb --root-owner-group --build "$scratch/all" "$package" >/dev/null
+        rm -r "$scratch/all"
+    done
+fi
 if ! PATH=$PATH:/usr/sbin:/sbin dpkg --root="$root" --force-not-root --log=/dev/null --install ./*.deb >dpkg.log 2>&1; then
     grep --invert-match "files list file" dpkg.log
     exit 1
