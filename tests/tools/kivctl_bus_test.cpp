@@ -115,6 +115,8 @@ TEST_F(KivctlTest, WatchNamesEachChange)
         {"runtime.flight-mode=true", "flight_mode value=yes\n"},
         {"runtime.packet-data=false", "packet_data value=no\n"},
         {"runtime.wifi-status=2", "wifi_connected value=yes\n"},
+        {"runtime.wifi-status=1", "wifi_connected value=no\n"},
+        {"runtime.wifi-status=0", "wifi_connected value=no\n"}, // reported once
         {"network.wifi-device=0", "wifi_device value='off'\n"},
         {"network.wifi-device=1", "wifi_device value='on'\n"},
         {"network.wifi-connection=-1", "wifi_connection value='failure'\n"},
@@ -129,6 +131,8 @@ TEST_F(KivctlTest, WatchNamesEachChange)
         EXPECT_EQ(0, Kivctl(std::string("device set -p ./watched ") + change).exit);
         watch.Await(line);
     }
+    const std::string out = watch.Out(), repeated = "wifi_connected value=no\n";
+    EXPECT_EQ(out.find(repeated), out.rfind(repeated));
 }
 
 TEST_F(KivctlTest, SubscribesByTheServiceAsInTheFile)

@@ -7,6 +7,7 @@
 #include <glib.h>
 
 #include <algorithm>
+#include <atomic>
 #include <utility>
 
 namespace
@@ -34,12 +35,19 @@ public:
 
     void OnFlightModeChanged(bool enabled, void*) override { Report("flight_mode", enabled); }
     void OnPacketDataChanged(bool enabled, void*) override { Report("packet_data", enabled); }
-    void OnWifiConnectedChanged(bool connected, void*) override { Report("wifi_connected", connected); }
+
+    /// Two states of Wi-Fi are "not connected": a change from one to the other is none here.
+    void OnWifiConnectedChanged(bool connected, void*) override
+    {
+        if (wifiConnected_.exchange(connected) != static_cast<int>(connected))
+            Report("wifi_connected", connected);
+    }
 
 private:
     void Report(const char* event, Value value) const { PrintLine({{"event", event}, {"value", std::move(value)}}, form_); }
 
     const Form form_;
+    std::atomic<int> wifiConnected_{-1}; ///< not reported yet
 };
 
 /// Reads the card statuses once a second, in the default main context, and prints their changes, because the platform does not
