@@ -143,7 +143,7 @@ show_sims()
     title "The SIMs of a device whose first one is locked"
     show sim --profile dual-first-locked
 
-    title "Waiting for a SIM: of a device that is slow to start, of one that wants its PIN"
+    title "Waiting for a SIM: of a device that is slow to start, of one that needs its PIN"
     show sim wait --profile slow-sim
     show sim wait --profile pin-required --timeout 1
 }
