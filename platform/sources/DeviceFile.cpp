@@ -5,6 +5,7 @@
 #include <algorithm>
 #include <array>
 #include <cerrno>
+#include <cstring>
 #include <fcntl.h>
 #include <glib.h>
 #include <memory>
@@ -48,11 +49,22 @@ public:
 private:
     std::string Value(const std::string& group, const std::string& key) const
     {
-        g_autoptr(GError) error = nullptr; // may come with a value
-        const Owned value(g_key_file_get_string(file_, group.c_str(), key.c_str(), &error), g_free);
-        if (error)
+        const Owned raw(g_key_file_get_value(file_, group.c_str(), key.c_str(), nullptr), g_free);
+        if (!CanBeUnescaped(raw.get()))
             Fail(name_, group, key, "not UTF-8, or a backslash that escapes nothing; write \\\\ for a backslash");
+        const Owned value(g_key_file_get_string(file_, group.c_str(), key.c_str(), nullptr), g_free);
         return value.get();
+    }
+
+    // Whether GLib accepts a value as a text. It prints a warning about a value with two faults.
+    static bool CanBeUnescaped(const char* raw)
+    {
+        if (g_utf8_validate(raw, -1, nullptr) == FALSE)
+            return false;
+        for (const char* at = std::strchr(raw, '\\'); at != nullptr; at = std::strchr(at + 2, '\\'))
+            if (at[1] == '\0' || std::strchr("sntr\\", at[1]) == nullptr)
+                return false;
+        return true;
     }
 
     void Check(const std::vector<SimSlot>& slots, std::size_t slot) const

@@ -193,6 +193,20 @@ TEST_F(Changes, OfValuesAreTheSameByWordAndByNumber)
         UnsetInDeviceFile(path, {"runtime.flight-mod"}));
 }
 
+TEST_F(Changes, OfTextsTakeOnlyWholeEscapes)
+{
+    const auto use = [this](const std::string& name)
+    {
+        Write("[profile]\ndescription=x\n[settings]\ndevice-name=" + name + "\n");
+        return UseProfile(path);
+    };
+    EXPECT_EQ("", use(R"(a\\b\tc)"));
+    EXPECT_EQ("a\\b\tc", GetDevice().deviceName);
+    for (const char* name : {R"(\b)", "end\\", R"(\b\)", "\xff"}) // GLib prints a warning about the third
+        EXPECT_EQ(path + R"(: [settings] device-name: not UTF-8, or a backslash that escapes nothing; write \\ for a backslash)",
+            use(name));
+}
+
 TEST_F(Changes, StartFromTheProfileThatIsNamedOrInUse)
 {
     std::string madeFrom;
