@@ -16,8 +16,8 @@ namespace kiv::platform
 class LoopThread
 {
 public:
-    /// What the thread does besides iterating its context, which is its thread-default one. What the functions hold lives until the
-    /// thread is gone.
+    /// What the thread does besides iterating its context, which is its thread-default one. The thread owns the functions until it
+    /// ends.
     struct Work
     {
         std::function<void()> setUp;
@@ -26,10 +26,10 @@ public:
     };
     static std::shared_ptr<LoopThread> Start(Work work);
 
-    /// Ends the thread and waits until it is gone; within a callback of the device it does not wait. The last call.
+    /// Ends the thread and waits for its end. Within a callback of the device it does not wait. Must be the last call.
     void End();
 
-    /// Has the thread do its work for that, soon. Any thread.
+    /// Makes the thread run `poked` soon. Any thread.
     void Poke();
 
     /// False in a child of fork(), which has no copy of the thread.

@@ -1,5 +1,5 @@
 /// @file
-/// The machine itself as the source of the device: its modems, its connections, and what its files tell.
+/// The machine itself as the source of the device: its modems, its connections and its files.
 #ifndef KIV_SOURCES_HOST_H
 #define KIV_SOURCES_HOST_H
 
@@ -19,12 +19,12 @@ namespace kiv::platform
 constexpr char kHostDescription[] = "the machine itself: its modems, connections and files";
 
 /// Keeps the device as ModemManager, NetworkManager and BlueZ report it, on a thread of its own and over a bus connection of its
-/// own. A child of fork() has no copy of the thread: it answers from what was known at that moment.
+/// own. A child of fork() has no copy of the thread: it answers from the last snapshot before the fork.
 class Host : public Source
 {
 public:
-    /// Waits until everything was read, at most two seconds: a service that has not answered by then counts as absent until it
-    /// does.
+    /// Waits until everything was read, but at most two seconds. A service that has not answered by then counts as absent until
+    /// it does.
     static Origin Open();
 
     Host();
@@ -47,13 +47,13 @@ private:
 
     std::atomic<bool> inUse_{false};
 
-    // Of the thread alone.
+    // Only the thread uses these.
     GDBusConnection* connection_ = nullptr;
     Timer retry_;
     Reports reports_;
     std::unique_ptr<RemoteObjects> modems_, network_, bluetooth_;
 
-    // Of the first snapshot.
+    // These belong to the first snapshot.
     std::mutex mutex_;
     std::condition_variable isComplete_;
     Device latest_;

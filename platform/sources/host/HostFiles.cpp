@@ -21,7 +21,7 @@ struct Fact
     const char* reason = "not available on this machine";
 };
 
-// A file without the blanks around its text, and without the NUL that ends those of the device tree; an empty one tells nothing.
+// The text of a file without the blanks around it, and without the NUL at the end of a device tree's file. An empty file has none.
 Fact ReadFile(const std::string& path)
 {
     char* contents = nullptr;
@@ -33,7 +33,7 @@ Fact ReadFile(const std::string& path)
     return *contents == '\0' ? Fact() : Fact{contents};
 }
 
-// The first of the files that tells something; if none does, the reason of the first.
+// The text of the first file that has one. If none has, the reason of the first.
 template <class... Paths>
 Fact FirstFile(const std::string& root, const char* path, Paths... others)
 {
@@ -86,7 +86,7 @@ Fact PlatformVersion(const std::string& root)
     return Assigned(FirstFile(root, "/etc/os-release", "/usr/lib/os-release"), "VERSION_ID");
 }
 
-// machine-id(5) asks not to give the ID away, but a keyed hash of it.
+// machine-id(5) asks programs to publish only a keyed hash of the ID.
 Fact PlatformId(const std::string& root)
 {
     constexpr char kPurpose[] = "org.kiv.platform-id";

@@ -32,7 +32,7 @@ Timer StartTimer(guint milliseconds, GSourceFunc function, gpointer data)
     return timer;
 }
 
-// One call that is under way; who asked may be gone when it was cancelled.
+// One call that is under way. Its caller may be gone when it was cancelled.
 struct RemoteObjects::Question
 {
     RemoteObjects* self;
@@ -40,7 +40,7 @@ struct RemoteObjects::Question
     TakeReply take;
 };
 
-// GDBus complains about a match rule that it cannot send because the bus has just died; here, nothing comes of it.
+// GDBus would print a critical message when the bus dies before it can send a match rule. Here the failure is ignored.
 RemoteObjects::RemoteObjects(
     GDBusConnection* connection, const ServiceName& service, ServiceReport& report, std::function<void()> changed)
     : connection_(connection),

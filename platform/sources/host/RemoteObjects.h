@@ -1,5 +1,5 @@
 /// @file
-/// What a service on the bus reports of its objects, kept current by its signals.
+/// The objects of a service on the bus, kept current by its signals.
 #ifndef KIV_SOURCES_REMOTEOBJECTS_H
 #define KIV_SOURCES_REMOTEOBJECTS_H
 
@@ -32,12 +32,12 @@ struct EndOfTimer
 };
 using Timer = std::unique_ptr<GSource, EndOfTimer>;
 
-/// Has the thread's default context call the function once.
+/// Calls the function once, from the thread's default context.
 Timer StartTimer(guint milliseconds, GSourceFunc function, gpointer data);
 
-/// Of one service, over one connection; for one thread, whose default context it uses. Never blocks, never starts the service, and
-/// goes on when the connection dies. (GDBusObjectManagerClient reads the objects of a service that came back in a call that blocks
-/// for up to 25 seconds, and prints a warning when that fails or the bus is gone.)
+/// The objects of one service, over one connection. For one thread, whose default context it uses. Never blocks, never starts the
+/// service, and survives the end of the connection. (GDBusObjectManagerClient reads the objects of a service that came back in a
+/// call that blocks for up to 25 seconds, and prints a warning when that fails or the bus is gone.)
 class RemoteObjects
 {
 public:
@@ -48,7 +48,7 @@ public:
     RemoteObjects& operator=(const RemoteObjects&) = delete;
     ~RemoteObjects();
 
-    /// Whether everything was read that there is to read now.
+    /// Whether everything was read.
     bool IsComplete() const { return isKnown_ && pending_ == 0; }
 
     /// Objects beside those of the object manager, read by a method call each.

@@ -38,7 +38,7 @@ int Lookup(const std::pair<int, int> (&table)[count], int key, int fallback)
 // Enumerations of ModemManager and NetworkManager are those of their D-Bus interfaces, which never change a number.
 // clang-format off
 
-// MMModemState, but for "failed" and "locked", which depend on more.
+// MMModemState, except "failed" and "locked", which depend on more.
 constexpr std::pair<int, int> kCardOfState[] = {
     {0,  TAPI_SIM_STATUS_UNKNOWN},
     {1,  TAPI_SIM_STATUS_SIM_INITIALIZING},
@@ -111,7 +111,7 @@ constexpr Registration kRegistrations[] = {
 };
 constexpr int kUnregistered = 4; // where nothing is said
 
-// MMModemAccessTechnology, the bits of a generation; the latest one that is there counts
+// MMModemAccessTechnology, the bits of each generation; the latest generation counts
 struct Generation
 {
     std::uint32_t technologies;

@@ -19,7 +19,7 @@ namespace kiv::platform
 namespace
 {
 
-// A part of the report that is empty is one that no text stands for.
+// An empty part of a report is a missing text.
 Text Given(const std::string& text)
 {
     return text.empty() ? Text() : Text(text);
@@ -63,7 +63,7 @@ int CardStatusOf(const Objects& objects, const Reported& modem)
     return objects.count(sim) != 0 ? card : TAPI_SIM_STATUS_SIM_INITIALIZING; // ready is a card whose record is here
 }
 
-// How many digits of an IMSI are the MNC, no rule tells; the operator's code does.
+// No rule says how many digits of an IMSI are the MNC. The operator's code does.
 bool SplitImsi(const std::string& imsi, const std::string& operatorCode, SimSlot& slot)
 {
     constexpr std::size_t kMcc = 3, kMostDigits = 15, kMostMsin = 10;
@@ -126,7 +126,7 @@ void DescribeModems(const Objects& modems, Device& device)
     device.defaultNetwork = device.preferredVoice = device.defaultData = defaultSlot;
 }
 
-// State of the NetworkManager device that stands for a modem; unmanaged where NetworkManager does not know it.
+// The state of a modem's device in NetworkManager; unmanaged if NetworkManager does not know it.
 int NetworkStateOf(const Objects& network, const std::string& modemPath)
 {
     for (const std::string& path : PathsWith(network, kNetworkDevice))
@@ -181,7 +181,7 @@ struct Kind
     int connection = WIFI_CONNECTION_STATE_DISCONNECTED; ///< of the device that is furthest
 };
 
-// What the radios of one kind are.
+// The state of the radios of one kind.
 struct Radio
 {
     bool exists;
@@ -252,7 +252,7 @@ void DescribeNetwork(const Reports& reports, Device& device)
             device.dataRoaming = device.dataRoaming || !connection.Flag("home-only");
 }
 
-// Why a service tells nothing; null when it does.
+// Why a service reports nothing; null if it reports.
 const char* Silence(Presence presence, const char* whenAbsent)
 {
     if (presence == Presence::Present)

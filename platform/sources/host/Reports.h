@@ -1,5 +1,5 @@
 /// @file
-/// What the services on the bus report, and what it means for the device.
+/// Translates the reports of the services on the bus into values of the device.
 #ifndef KIV_SOURCES_REPORTS_H
 #define KIV_SOURCES_REPORTS_H
 
@@ -36,7 +36,7 @@ struct Reports
     ServiceReport modems, network, bluetooth; ///< of ModemManager, NetworkManager, BlueZ
 };
 
-/// Names of the properties that anything here reads, and a null; others need not be kept.
+/// Names of the properties that are read here, with a null at the end. Others need not be kept.
 extern const char* const kUsedProperties[];
 
 /// A method call that reads an object.
@@ -47,13 +47,13 @@ struct DetailCall
     const char* argument; ///< null when the method takes none
 };
 
-/// Objects that the modems refer to, beside those of the object manager: their SIMs.
+/// The SIMs of the modems, which the object manager does not list.
 std::map<std::string, DetailCall> DetailsOfModems(const Objects& modems);
 
-/// The connections that modems use or would use.
+/// The connections that the modems use, or would use.
 std::map<std::string, DetailCall> DetailsOfNetwork(const Objects& network);
 
-/// Sets everything in the device that the services decide, and why it is missing.
+/// Sets every value of the device that comes from the services, or the reason why it is missing.
 void Describe(const Reports& reports, Device& device);
 
 } // namespace kiv::platform
