@@ -3,6 +3,8 @@
 #include "BusInterfaces.h"
 #include "NameBook.h"
 
+#include <SubscriptionRules.h>
+
 #include <algorithm>
 #include <map>
 #include <tuple>
@@ -56,6 +58,14 @@ DASubscription ReadArguments(const BusCall& call)
     const char *kind, *key, *busName, *path, *interface;
     g_variant_get(call.arguments, "(&s&s&s&o&s)", &kind, &key, &busName, &path, &interface);
     return {kind, key, {*busName == '\0' ? call.sender : busName, path, interface}};
+}
+
+void RequireValid(const DASubscription& subscription)
+{
+    const auto& [busName, objectPath, interface] = subscription.subscriber;
+    const std::string objection = ObjectionTo(subscription.kind, subscription.key, busName, objectPath, interface);
+    if (!objection.empty())
+        throw CallError(G_DBUS_ERROR_INVALID_ARGS, objection);
 }
 
 void RequireDone(DASubscriberStore::Outcome outcome, const std::string& reason)
@@ -170,9 +180,12 @@ bool SubscriptionService::Subscribe(const DASubscription& wanted, const char* se
 
 bool SubscriptionService::Unsubscribe(const DASubscription& unwanted, const char* sender)
 {
-    if (IsAdministrator(sender))
+    const bool isAnyAllowed = IsAdministrator(sender);
+    if (!isAnyAllowed)
+        RequireOwner(unwanted.subscriber.busname, sender);
+    RequireValid(unwanted);
+    if (isAnyAllowed)
         return Apply(&DASubscriberStore::Remove, unwanted);
-    RequireOwner(unwanted.subscriber.busname, sender);
     return ApplyAsOwner(&DASubscriberStore::Remove, &DASubscriberStore::Add, unwanted, sender);
 }
 
