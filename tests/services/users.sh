@@ -90,6 +90,7 @@ cat >"$scratch/bus.conf" <<CONF
 </busconfig>
 CONF
 start bus unix: dbus-daemon --config-file="$scratch/bus.conf" --nofork --nosyslog --print-address
+expect "org.kiv.Subscriptions can be started by the bus" be $agent "$kivctl" doctor
 start mail ready be $client "$kivctl" subscribe --name org.example.Mail --key 7 --kind policy --kind status --kind auth \
     --kind activated --kind number_changed --push mail
 [[ $(stat --format=%U "$KIV_SUBSCRIBERS") == "$agent" ]] || fail "the store is not the agent's"

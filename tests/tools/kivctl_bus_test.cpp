@@ -138,6 +138,7 @@ TEST_F(KivctlTest, WatchNamesEachChange)
 TEST_F(KivctlTest, SubscribesByTheServiceAsInTheFile)
 {
     Service service("env KIV_SUBSCRIBERS=" + directory + "/served.db " KIV_SUBSCRIPTION_SERVICE);
+    EXPECT_THAT(Steady(Kivctl("doctor").out), HasSubstr("subscription service yes org.kiv.Subscriptions runs"));
     const std::string file = "env KIV_SUBSCRIBERS=served.db " KIVCTL " subscribers list";
     {
         Service client(KIVCTL " subscribe --name a.b --kind auth");

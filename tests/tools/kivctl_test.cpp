@@ -40,7 +40,7 @@ TEST_F(KivctlTest, EndsWithTheDocumentedExitCode)
         {"sim --profile host", 1, "", "ModemManager does not run"},
         {"network --profile host", 1, "off (NetworkManager does not run)", ""},
         {"device --profile host", 0, "(not available on this machine)", ""},
-        {"doctor --profile host", 1, "ModemManager      no   does not run", ""},
+        {"doctor --profile host", 1, "ModemManager          no   does not run", ""},
         {"subscribers", 2, "", "missing verb; expected one of list, add, remove"},
         {"country 450 kr", 2, "", "unexpected word \"kr\" after kivctl country; see kivctl country --help"},
         {"sim --slot 1 wait", 2, "", "--slot is an option of \"sim\"; those of \"sim wait\" go after it"},

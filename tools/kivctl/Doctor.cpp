@@ -9,6 +9,7 @@
 #include <DASystem.h>
 #include <DeviceControl.h>
 #include <ServiceManager.h>
+#include <SubscriptionService.h>
 #include <telephony.h>
 
 #include <dlfcn.h>
@@ -111,6 +112,36 @@ Finding CheckServiceManager(const Command&)
     return CheckService({kiv::ServiceManager::kBusName, "/", "org.freedesktop.DBus.Peer", "Ping", false, "kiv-service-manager"});
 }
 
+/// Adds the names that a method of the bus lists. @return whether the bus allows the call
+bool AddNames(GDBusConnection* connection, const char* method, std::set<std::string>& names)
+{
+    g_autoptr(GVariant) reply = AskBus(connection, method, nullptr);
+    if (!reply)
+        return false;
+    g_autofree const char** list = nullptr;
+    g_variant_get(reply, "(^a&s)", &list);
+    for (const char** name = list; *name != nullptr; ++name)
+        names.insert(*name);
+    return true;
+}
+
+/// Checks the subscription service without starting it. `kivctl subscribe` does not depend on it.
+Finding CheckSubscriptionService(const Command&)
+{
+    g_autoptr(GDBusConnection) connection = g_bus_get_sync(G_BUS_TYPE_SYSTEM, nullptr, nullptr);
+    if (!connection)
+        return {"not asked without a bus", "start the bus first"};
+    const std::string name = kiv::SubscriptionService::kBusName;
+    std::set<std::string> running, startable;
+    if (!AddNames(connection, "ListNames", running) || !AddNames(connection, "ListActivatableNames", startable))
+        return {"not known: the bus forbids this user to list its names"};
+    if (running.count(name) != 0)
+        return {name + " runs"};
+    if (startable.count(name) != 0)
+        return {name + " can be started by the bus"};
+    return {name + " is not available; kivctl subscribe uses the file"};
+}
+
 /// Checks a daemon that provides values of the machine itself, without starting it.
 Finding CheckHostDaemon(const char* name, const std::string& unit, const char* interface, const char* path)
 {
@@ -155,19 +186,6 @@ Finding CheckStore(const Command&)
         return {DASubscriberStore::Path() + ", subscriptions: " + std::to_string(subscriptions.size())};
     const std::size_t end = reason.rfind("; "); // what to do follows, as the store knows the cause
     return {reason.substr(0, end), reason.substr(end + 2)};
-}
-
-/// Adds the names that a method of the bus lists. @return whether the bus allows the call
-bool AddNames(GDBusConnection* connection, const char* method, std::set<std::string>& names)
-{
-    g_autoptr(GVariant) reply = AskBus(connection, method, nullptr);
-    if (!reply)
-        return false;
-    g_autofree const char** list = nullptr;
-    g_variant_get(reply, "(^a&s)", &list);
-    for (const char** name = list; *name != nullptr; ++name)
-        names.insert(*name);
-    return true;
 }
 
 /// One finding for each record that reaches nobody. Nothing without a bus or a store, which have checks of their own.
@@ -249,6 +267,7 @@ constexpr Examination kChecks[] = {
     {"bus", One<CheckBus>},
     {"device daemon", One<CheckDeviceDaemon>},
     {"service manager", One<CheckServiceManager>},
+    {"subscription service", One<CheckSubscriptionService>},
     {"subscriber store", One<CheckStore>},
     {"subscribers", CheckSubscribers},
     {"device", One<CheckDevice>},
