@@ -1,7 +1,10 @@
 #ifndef KIV_TESTS_CLIENT_H
 #define KIV_TESTS_CLIENT_H
 
+#include "support/Deliveries.h"
 #include "support/Peer.h"
+
+#include <DASubscriberStore.h>
 
 #include <glib/gstdio.h>
 #include <unistd.h>
@@ -11,6 +14,24 @@ namespace kiv::test
 
 constexpr char kPath[] = "/org/example/Client";
 constexpr char kInterface[] = "org.example.Client";
+constexpr char kMail[] = "org.example.Mail"; ///< a well-known name
+
+/// Returns the bus names of the store's records, in their order.
+inline std::vector<std::string> Stored()
+{
+    std::vector<DASubscription> records;
+    std::string reason;
+    EXPECT_EQ(DASubscriberStore::Outcome::Done, DASubscriberStore().List(records, reason)) << reason;
+    std::vector<std::string> names;
+    for (const DASubscription& record : records)
+        names.push_back(record.subscriber.busname);
+    return names;
+}
+
+inline void AwaitStored(const std::vector<std::string>& names)
+{
+    IterateUntil([&] { return Stored() == names; });
+}
 
 /// A folder with the subscriber store in use while it lives; in memory if possible.
 struct StoreFolder

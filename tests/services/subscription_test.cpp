@@ -1,7 +1,6 @@
 #include "services/Client.h"
-#include "support/Deliveries.h"
+#include "support/BusMonitor.h"
 
-#include <DASubscriberStore.h>
 #include <SubscriptionService.h>
 
 #include <sqlite3.h>
@@ -19,8 +18,8 @@ using testing::IsEmpty;
 class Running
 {
 public:
-    explicit Running(std::set<guint32> administrators)
-        : context_(g_main_context_new()), thread_([this, administrators] { Serve(administrators); })
+    Running(double idleSeconds, std::set<guint32> administrators)
+        : context_(g_main_context_new()), thread_([=] { Serve(idleSeconds, administrators); })
     {
         ready_.get_future().wait();
     }
@@ -32,15 +31,19 @@ public:
         g_main_context_unref(context_);
     }
 
+    std::atomic<int> turns{0}; ///< of its loop
+    std::atomic<bool> hasEnded{false};
+
 private:
-    void Serve(const std::set<guint32>& administrators)
+    void Serve(double idleSeconds, const std::set<guint32>& administrators)
     {
         g_main_context_push_thread_default(context_);
         {
-            SubscriptionService service(60, administrators);
+            SubscriptionService service(idleSeconds, administrators);
             ready_.set_value();
-            while (!isStopped_ && service.GoOn())
+            for (; !isStopped_ && service.GoOn(); ++turns)
                 g_main_context_iteration(context_, TRUE);
+            hasEnded = true;
         }
         g_main_context_pop_thread_default(context_);
     }
@@ -66,62 +69,14 @@ private:
     sqlite3* db_ = nullptr;
 };
 
-/// Counts the calls of one method on the bus. One at a time.
-class CallCount
-{
-public:
-    CallCount(const PrivateBus& bus, const std::string& member) : connection_(bus.Connect())
-    {
-        count = 0;
-        g_dbus_connection_add_filter(connection_.get(), Count, nullptr, nullptr);
-        const std::string rule = "type='method_call',member='" + member + "'";
-        const char* const rules[] = {rule.c_str(), nullptr};
-        g_autoptr(GVariant) reply = g_dbus_connection_call_sync(connection_.get(), "org.freedesktop.DBus", "/org/freedesktop/DBus",
-            "org.freedesktop.DBus.Monitoring", "BecomeMonitor", g_variant_new("(^asu)", rules, 0U), nullptr, G_DBUS_CALL_FLAGS_NONE,
-            -1, nullptr, nullptr);
-        EXPECT_NE(nullptr, reply);
-    }
-    ~CallCount() { g_dbus_connection_close_sync(connection_.get(), nullptr, nullptr); }
-
-    void AwaitOne() const
-    {
-        IterateUntil([] { return count > 0; });
-    }
-
-private:
-    static GDBusMessage* Count(GDBusConnection*, GDBusMessage* message, gboolean isIncoming, gpointer)
-    {
-        if (isIncoming == FALSE || g_dbus_message_get_message_type(message) != G_DBUS_MESSAGE_TYPE_METHOD_CALL)
-            return message;
-        ++count;
-        g_object_unref(message);
-        return nullptr;
-    }
-
-    static inline std::atomic<int> count{0};
-    Connection connection_;
-};
-
 struct Subscriptions : testing::Test
 {
     Subscriptions() { Start(); }
 
-    void Start(const std::set<guint32>& administrators = {})
+    void Start(double idleSeconds = 60, const std::set<guint32>& administrators = {})
     {
         service.reset();
-        service = std::make_unique<Running>(administrators);
-    }
-
-    /// Returns the bus names of the store's records, in their order.
-    static std::vector<std::string> Stored()
-    {
-        std::vector<DASubscription> records;
-        std::string reason;
-        EXPECT_EQ(DASubscriberStore::Outcome::Done, DASubscriberStore().List(records, reason)) << reason;
-        std::vector<std::string> names;
-        for (const DASubscription& record : records)
-            names.push_back(record.subscriber.busname);
-        return names;
+        service = std::make_unique<Running>(idleSeconds, administrators);
     }
 
     static void AddToStore(const std::string& name, const std::string& key = "all")
@@ -130,17 +85,11 @@ struct Subscriptions : testing::Test
         EXPECT_EQ(DASubscriberStore::Outcome::Done, DASubscriberStore().Add({"auth", key, {name, kPath, kInterface}}, reason));
     }
 
-    static void AwaitStored(const std::vector<std::string>& names)
-    {
-        IterateUntil([&] { return Stored() == names; });
-    }
-
     const StoreFolder folder;
     PrivateBus bus;
     std::unique_ptr<Running> service;
 };
 
-constexpr char kMail[] = "org.example.Mail";
 constexpr char kOther[] = "org.example.Other";
 
 TEST_F(Subscriptions, AreMadeListedAndRemovedUnderTheNamesOfTheCaller)
@@ -220,10 +169,10 @@ TEST_F(Subscriptions, DoNotChangeWhenTheNameGetsANewOwnerMeanwhile)
         const auto before = Stored();
         std::future<std::string> answer;
         {
-            const CallCount checks(bus, "GetNameOwner");
+            BusMonitor monitor(bus, successor.Bus());
             const StoreLock lock;
             answer = std::async(std::launch::async, [&] { return client.Change(method, kMail); });
-            checks.AwaitOne();
+            monitor.Await("GetNameOwner");
             successor.Own(kMail);
         }
         EXPECT_EQ("AccessDenied", answer.get());
@@ -234,7 +183,7 @@ TEST_F(Subscriptions, DoNotChangeWhenTheNameGetsANewOwnerMeanwhile)
 
 TEST_F(Subscriptions, OfEverybodyAreListedAndRemovedByAnAdministrator)
 {
-    Start({getuid()});
+    Start(60, {getuid()});
     Client administrator(bus), other(bus);
     other.Own(kOther);
     EXPECT_EQ("(true,)", other.Change("Subscribe", kOther));
@@ -248,24 +197,31 @@ TEST_F(Subscriptions, UnderAUniqueNameEndWhenItLeavesTheBus)
 {
     Client stays(bus);
     EXPECT_EQ("(true,)", stays.Change("Subscribe", ""));
-    const auto subscribe = [&](Client& leaves)
+    for (const bool isServed : {true, false})
     {
+        Client leaves(bus);
         leaves.Own(kMail);
         EXPECT_EQ("(true,)", leaves.Change("Subscribe", ""));
         leaves.Change("Subscribe", kMail);
-    };
-    {
-        Client leaves(bus);
-        subscribe(leaves);
+        if (!isServed)
+            service.reset();
         leaves.Close();
+        if (!isServed)
+            Start();
         AwaitStored({stays.UniqueName(), kMail});
     }
+}
+
+TEST_F(Subscriptions, UnderAUniqueNameKeepTheIdleServiceRunning)
+{
     Client leaves(bus);
-    subscribe(leaves);
-    service.reset();
+    EXPECT_EQ("(true,)", leaves.Change("Subscribe", ""));
+    Start(0.001);
+    IterateUntil([&] { return service->turns > 50 || service->hasEnded; });
+    EXPECT_FALSE(service->hasEnded);
     leaves.Close();
-    Start();
-    AwaitStored({stays.UniqueName(), kMail});
+    IterateUntil([&] { return service->hasEnded.load(); });
+    AwaitStored({});
 }
 
 TEST_F(Subscriptions, UnderAUniqueNameDoNotApplyOnTheNextBus)

@@ -1,5 +1,6 @@
 #include "support/BusMonitor.h"
 
+#include <algorithm>
 #include <chrono>
 #include <condition_variable>
 #include <stdexcept>
@@ -16,7 +17,7 @@ constexpr char kMarker[] = "org.example.Marker";
 struct
 {
     std::mutex mutex;
-    std::condition_variable marked;
+    std::condition_variable changed;
     bool isMarked = false;
     std::vector<std::string> lines;
 } seen;
@@ -48,7 +49,7 @@ BusMonitor::BusMonitor(const PrivateBus& bus, GDBusConnection* shared) : shared_
         -1, nullptr, &error);
     if (reply == nullptr)
         throw std::runtime_error(error->message);
-    AwaitMarker();
+    During([] {}); // forgets what another monitor saw
 }
 
 BusMonitor::~BusMonitor()
@@ -65,12 +66,10 @@ GDBusMessage* BusMonitor::Filter(GDBusConnection* connection, GDBusMessage* mess
         return message;
     const std::lock_guard<std::mutex> lock(seen.mutex);
     if (g_strcmp0(g_dbus_message_get_interface(message), kMarker) == 0)
-    {
         seen.isMarked = true;
-        seen.marked.notify_all();
-    }
     else
         seen.lines.push_back(Line(message));
+    seen.changed.notify_all();
     g_object_unref(message);
     return nullptr;
 }
@@ -80,9 +79,18 @@ void BusMonitor::AwaitMarker()
 {
     g_dbus_connection_emit_signal(shared_, nullptr, "/", kMarker, "Marker", nullptr, nullptr);
     std::unique_lock<std::mutex> lock(seen.mutex);
-    if (!seen.marked.wait_for(lock, std::chrono::seconds(30), [] { return seen.isMarked; }))
+    if (!seen.changed.wait_for(lock, std::chrono::seconds(30), [] { return seen.isMarked; }))
         throw std::runtime_error("the monitor sees nothing");
     seen.isMarked = false;
+}
+
+void BusMonitor::Await(const std::string& text)
+{
+    std::unique_lock<std::mutex> lock(seen.mutex);
+    const auto hasText = [&](const std::string& line) { return line.find(text) != std::string::npos; };
+    if (!seen.changed.wait_for(
+            lock, std::chrono::seconds(30), [&] { return std::any_of(seen.lines.begin(), seen.lines.end(), hasText); }))
+        throw std::runtime_error("the monitor does not see " + text);
 }
 
 std::vector<std::string> BusMonitor::During(const std::function<void()>& operation)

@@ -19,6 +19,9 @@ public:
     /// Returns the messages of an operation in the order of the bus, one per line, complete except for serials.
     std::vector<std::string> During(const std::function<void()>& operation);
 
+    /// Waits until it has seen a message with this text.
+    static void Await(const std::string& text);
+
 private:
     static GDBusMessage* Filter(GDBusConnection* connection, GDBusMessage* message, gboolean incoming, gpointer);
     void AwaitMarker();
