@@ -10,25 +10,7 @@ trap '((${#pids[@]})) && kill "${pids[@]}" 2>/dev/null; wait; rm -rf "$scratch"'
 export DBUS_SYSTEM_BUS_ADDRESS=unix:path=$scratch/bus KIV_SUBSCRIBERS=$scratch/subscribers.db
 unset KIV_PROFILE KIV_LOG
 
-fail() # text
-{
-    echo "$1" >&2
-    head -50 "$scratch"/*.log >&2
-    exit 1
-}
-
-start() # name text-that-it-prints command...
-{
-    local log=$scratch/$1.log text=$2 deadline=$((SECONDS + 20))
-    shift 2
-    : >"$log"
-    "$@" >>"$log" 2>&1 &
-    pids+=($!)
-    until grep --quiet "$text" "$log"; do
-        ((SECONDS < deadline)) && kill -0 "${pids[-1]}" 2>/dev/null || fail "not ready: $*"
-        sleep 0.02
-    done
-}
+. "$(dirname "$(readlink -f "$0")")/../support/programs.sh"
 
 # The agent, the services and their client run as one user here, so the policy allows the services as little as possible.
 sed "s/user=\"kiv-agent\"/user=\"$(id --user)\"/" "$policy" >"$scratch/agent.conf"

@@ -21,30 +21,12 @@ cmake --install "$build" --prefix "$scratch/prefix" >"$scratch/installed"
 emulate "$scratch"/prefix/bin/*
 readonly share=$scratch/prefix/share kivctl=$scratch/prefix/bin/kivctl
 
-fail() # text
-{
-    echo "$1" >&2
-    head -50 "$scratch"/*.log >&2
-    exit 1
-}
+. "$(dirname "$(readlink -f "$0")")/../support/programs.sh"
 
 # For subshells, whose process it takes.
 be() # user command...
 {
     exec setpriv --reuid="$1" --regid="$1" --clear-groups "${@:2}"
-}
-
-start() # name text-that-it-prints command...
-{
-    local log=$scratch/$1.log text=$2 deadline=$((SECONDS + 20))
-    shift 2
-    : >"$log"
-    "$@" >>"$log" 2>&1 &
-    pids+=($!)
-    until grep --quiet "$text" "$log"; do
-        ((SECONDS < deadline)) && kill -0 "${pids[-1]}" 2>/dev/null || fail "not ready: $*"
-        sleep 0.02
-    done
 }
 
 call() # user method argument...
