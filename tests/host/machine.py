@@ -165,7 +165,7 @@ class Machine(unittest.TestCase):
         with open(f"{self.folder}/NetworkManager.conf", "w") as file:
             file.write(NM_CONF)
         self.start("NetworkManager", "/usr/sbin/NetworkManager", "--no-daemon", f"--config={self.folder}/NetworkManager.conf",
-                   f"--config-dir={folder}", "--intern-config=/dev/null")
+                   f"--config-dir={folder}", f"--intern-config={folder}/NetworkManager-intern.conf")
         until(lambda: run("nmcli", "-t", "-f", "STATE", "general").returncode == 0, "NetworkManager answers")
 
     # What is looked at
