@@ -43,10 +43,17 @@ expect() # text command...
 }
 
 # A standard bus starts a service as a user with a helper; this bus starts it itself.
-sed "s|^Exec=.*/|Exec=$(command -v setpriv) --reuid=$agent --regid=$agent --clear-groups $scratch/prefix/bin/|" \
+run_as() # user
+{
+    echo "$(command -v setpriv) --reuid=$1 --regid=$1 --clear-groups"
+}
+sed "s|^Exec=.*/|Exec=$(run_as $agent) $scratch/prefix/bin/|" \
     "$share/dbus-1/system-services/org.kiv.Subscriptions.service" >"$scratch/services/org.kiv.Subscriptions.service"
+readonly examples=$share/doc/libkiv-client-dev/examples
+sed "s|^Exec=.*|Exec=$(run_as $client) $kivctl subscribe --name org.example.Mail --push other|" \
+    "$examples/org.example.Mail.service" >"$scratch/services/org.example.Mail.service"
 for policy in "$sources/dbus/kiv-agent.conf" "$share/dbus-1/system.d/org.kiv.Subscriptions.conf" \
-    "$share/doc/libkiv-client-dev/examples/org.example.Mail.conf"; do
+    "$examples/org.example.Mail.conf"; do
     sed "s/user=\"kiv-agent\"/user=\"$agent\"/; s|/org/example/Mail|/org/kiv/ClientService|" "$policy" \
         >"$scratch/$(basename "$policy")"
 done
@@ -88,6 +95,7 @@ notify number-changed --texts a b c d
 push mail --data a --message b
 EVENTS
 (($(wc --lines <"$scratch/mail.log") == 7)) || fail "not everything is received"
+! grep "Rejected.*org.example.Mail" "$scratch/bus.log" || fail "the policies deny a call of the agent"
 
 before=$(call $agent List)
 [[ $before == *org.example.Mail* && $(call root List) == "$before" ]] || fail "not listed: $before"
@@ -103,3 +111,8 @@ expect AccessDenied be $client dbus-send --system --print-reply --dest=org.kiv.S
 kill "${pids[1]}"
 wait "${pids[1]}" || fail "the client service does not end"
 [[ $(be $agent "$kivctl" subscribers list 2>/dev/null) == "" ]] || fail "the subscriptions are still there"
+
+# The bus starts a client service that has the example's .service file.
+(be $agent "$kivctl" subscribers add auth all org.example.Mail /org/kiv/ClientService org.kiv.ClientService)
+expect "each is on the bus, or is started by it" be $agent "$kivctl" doctor
+expect "sent subscribers=1 delivered=1" be $agent "$kivctl" notify auth-success
