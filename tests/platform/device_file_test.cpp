@@ -121,6 +121,8 @@ TEST_F(Changes, ThatCannotBeUsedAreReportedOnce)
     for (const char* comment : {"# one\n", "# two\n", "# three\n"})
         Write(comment + good + "[runtime]\nflight-mode=maybe\n");
     awaitReport("[runtime] flight-mode: \"maybe\" is invalid; expected true or false");
+    Write(good + "[runtime]\nflight-mode=maybe\n");
+    g_usleep(500'000); // in which the same trouble could be reported again
     std::filesystem::remove(path);
     awaitReport("No such file or directory");
     Write(good + "[runtime]\nflight-mode=true\n");

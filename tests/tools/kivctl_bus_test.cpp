@@ -1,3 +1,4 @@
+#include "support/Peer.h"
 #include "tools/KivctlTest.h"
 
 namespace kiv::test
@@ -11,6 +12,9 @@ TEST_F(KivctlTest, CarriesEveryNotificationToItsReceivers)
     const Service all(KIVCTL " subscribe --name a.all --key 7 --kind policy --kind status --kind auth --kind activated"
                              " --kind number_changed --push mail");
     const Service other(KIVCTL " subscribe --kind status --key 8");
+    EXPECT_EQ("ready bus_names=org.tizen.system.deviced,org.tizen.servicemanager.service\n", services.Out());
+    EXPECT_EQ(
+        "ready bus_name='a.all' subscribed=policy:7,status:7,auth:all,activated:all,number_changed:all,push:mail\n", all.Out());
     EXPECT_EQ("device id  S1\n", Kivctl("device id").out);
 
     const std::pair<std::string, const char*> cases[] = {
@@ -57,8 +61,8 @@ TEST_F(KivctlTest, CarriesEveryNotificationToItsReceivers)
         EXPECT_THAT(sent.err, HasSubstr("remove its record: kivctl subscribers remove " + kind + " org.gone.Away /a a.b\n"));
     }
     all.Await("push service_id='mail' data='{\"a\":1}' message='two words' time=-5000000000\n");
-    Kivctl("push mail --data d --message now");
-    EXPECT_THAT(Steady(all.Out()), testing::ContainsRegex("message='now' time=[0-9]{10}\n")); // in seconds
+    Kivctl("push mail --data d --message now\xe2\x80\xa8");
+    EXPECT_THAT(Steady(all.Out()), testing::ContainsRegex("message='now\\\\u2028' time=[0-9]{10}\n")); // in seconds
 }
 
 TEST_F(KivctlTest, ServicesKeepNamesAndSubscriptionsUntilTheyEnd)
@@ -74,27 +78,47 @@ TEST_F(KivctlTest, ServicesKeepNamesAndSubscriptionsUntilTheyEnd)
         EXPECT_EQ(0, service.End(signal));
         EXPECT_EQ("", Kivctl("subscribers list").out);
     }
-    Service board(KIV_BOARD_DAEMON), client(KIVCTL " subscribe --kind auth");
+    Service client(KIVCTL " subscribe --kind auth"), both(KIVCTL " services"), installed(KIV_SUBSCRIPTION_SERVICE);
     bus.Stop();
-    EXPECT_EQ(1, board.End());
     EXPECT_EQ(8, client.End());
+    EXPECT_EQ(8, both.End());
+    EXPECT_EQ(1, installed.End());
 }
 
 TEST_F(KivctlTest, InstalledServicesAnswerAndPrintWhatTheyReceive)
 {
-    const Service board(KIV_BOARD_DAEMON " --serial S2"), manager(KIV_SERVICE_MANAGER);
+    const Service board(KIV_BOARD_DAEMON " --serial S23456"), manager(KIV_SERVICE_MANAGER);
     EXPECT_EQ("ready bus_names=org.tizen.system.deviced\n", board.Out());
-    EXPECT_EQ("S2\n", Kivctl("device id -t").out);
+    EXPECT_EQ("S23456\n", Kivctl("device id -t").out);
+    EXPECT_EQ("**3456\n", Kivctl("device -t --fields serial").out);
     EXPECT_EQ(0, Kivctl("notify activated --imsi \"'1\xe2\x80\xa8\" --to manager").exit);
     EXPECT_EQ("ready bus_names=org.tizen.servicemanager.service\nactivated imsi=\"'1\\u2028\" active=1\n", manager.Out());
+}
+
+TEST_F(KivctlTest, EscapesTheErrorTextsOfOthers)
+{
+    const auto forge = [](GDBusMessage* call)
+    { return g_dbus_message_new_method_error_literal(call, "a.b.Error", "\x1b[31m\nforged"); };
+    const Peer manager(bus, "org.tizen.servicemanager.service", forge), client(bus, "a.b", forge);
+    for (const char* record : {"auth all", "push m"})
+        Kivctl(std::string("subscribers add ") + record + " a.b /a a.b");
+    for (const char* arguments : {"notify auth --to manager", "notify auth", "push m --data d --message m"})
+    {
+        const Outcome sent("env KIV_LOG=error " KIVCTL " " + std::string(arguments));
+        EXPECT_EQ(1, sent.exit) << arguments;
+        EXPECT_THAT(
+            sent.err, AllOf(HasSubstr("\\x1b[31m\\nforged"), testing::Not(HasSubstr("\x1b")), testing::Not(HasSubstr("\nforged"))));
+    }
 }
 
 TEST_F(KivctlTest, LimitsTheWaitForAServiceThatIsStuck)
 {
     Service board(KIV_BOARD_DAEMON), manager(KIV_SERVICE_MANAGER), client(KIVCTL " subscribe --kind auth --name a.b");
     for (Service* stuck : {&board, &manager, &client})
-        g_subprocess_send_signal(stuck->process.get(), SIGSTOP);
+        kill(std::stoi(g_subprocess_get_identifier(stuck->process.get())), SIGSTOP); // at once, before anybody calls it
+    const Peer modems(bus, "org.freedesktop.ModemManager1", Peer::InsteadDo([] {}));
     const Program examined(KIVCTL " doctor --fields check,finding"); // its time limits are far below GDBus's
+    const Program host(KIVCTL " doctor --fields check,finding --profile host");
     for (const auto& [receiver, trouble] : std::map<std::string, const char*>{
              {"subscribers", "kivctl: not delivered to a.b: no answer in time\n"}, {"manager", "did not answer in time"}})
     {
@@ -103,6 +127,7 @@ TEST_F(KivctlTest, LimitsTheWaitForAServiceThatIsStuck)
         EXPECT_THAT(sent.err, HasSubstr(trouble));
     }
     examined.Await("org.tizen.servicemanager.service does not answer");
+    host.Await("ModemManager          does not answer");
     for (Service* stuck : {&board, &manager, &client})
         g_subprocess_send_signal(stuck->process.get(), SIGCONT);
 }
@@ -171,9 +196,14 @@ TEST_F(KivctlTest, DistinguishesAMissingBusFromABrokenStore)
         AllOf(HasSubstr("bus yes"), HasSubstr("deviced is not on the bus start it: kiv-board-daemon"),
             testing::ContainsRegex("subscriber store no .*: file is not a database the file is damaged: move it away"),
             HasSubstr("library yes")));
-    std::filesystem::copy_file(KIV_SYSTEM_LIBRARY, "libkiv_system.so.9.9.9");
-    std::filesystem::create_symlink("libkiv_system.so.9.9.9", "libkiv_system.so.1");
-    EXPECT_THAT(Outcome("env LD_LIBRARY_PATH=. " KIVCTL " doctor").out, HasSubstr("libkiv_system.so.9.9.9 has version 9.9.9"));
+    for (const auto& [file, name] :
+        {std::pair(KIV_SYSTEM_LIBRARY, "libkiv_system.so"), {KIV_PLATFORM_LIBRARY, "libkiv_platform.so"}})
+    {
+        const std::string other = name + std::string(".9.9.9");
+        std::filesystem::copy_file(file, other);
+        std::filesystem::create_symlink(other, name + std::string(".1"));
+        EXPECT_THAT(Outcome("env LD_LIBRARY_PATH=. " KIVCTL " doctor").out, HasSubstr(other + " has version 9.9.9"));
+    }
     bus.Stop();
     EXPECT_THAT(Steady(Kivctl("doctor --profile nosuch").out), AllOf(HasSubstr("bus no"), HasSubstr("device no")));
     for (const char* arguments : {"device id", "notify --imsi 1 auth-fail", "notify --imsi 1 auth-fail --to manager",

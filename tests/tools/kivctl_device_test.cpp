@@ -20,7 +20,12 @@ TEST_F(KivctlTest, ShowsAndChangesTheValuesOfADeviceFile)
         {"-p ./x device get runtime.wifi-status", 0, "off\n", ""},
         {"-p ./x device get sim0.number", 1, "", "sim0.number has no value"},
         {"-p ./x device get sim0.imei", 0, "356938035643809\n", ""},
+        {"-p ./x device get sim0.imei -t", 0, "sim0.imei:356938035643809\n", ""},
         {"-p ./x device get -t", 0, "\nsim0.imei:***********3809\n", ""},
+        {"-p ./x device get -t", 0, "\nsim0.msin:**********\n", ""},
+        {"-p single device get -t", 0, "\nsim0.number:***********78\n", ""},
+        {"-p ./x device get -t", 0, "\ndevice.serial:*********6789\n", ""},
+        {"-p ./x device get -t", 0, "\ndevice.tizen-id:***********9wPq\n", ""},
         {"-p ./x device get -t --show-ids", 0, "\nsim0.imei:356938035643809\n", ""},
         {"-p ./x device get sim0.imie", 2, "", "(did you mean \"sim0.imei\"?)"},
         {"-p ./x device set faults.tel_get_sim_imsi@1=-5", 0, "", ""},
@@ -50,6 +55,8 @@ TEST_F(KivctlTest, NamesTheProfileThatANewDeviceFileStartsFrom)
     EXPECT_EQ("", Kivctl("-p ./x device set network.wifi=connected").err);
     EXPECT_EQ("kivctl: created ./y from the profile dual\n", Kivctl("-p ./y device set network.wifi=off").err);
     EXPECT_EQ("1\n", Kivctl("-p ./y device get telephony.preferred-voice").out);
+    const Outcome fromHost("env KIV_PROFILE=host " KIVCTL " -p ./z device set network.wifi=off");
+    EXPECT_EQ("kivctl: created ./z from the profile dual\n", fromHost.err);
 }
 
 TEST_F(KivctlTest, DoctorListsRecordsThatReachNobody)

@@ -41,6 +41,7 @@ TEST_F(KivctlTest, EndsWithTheDocumentedExitCode)
         {"network --profile host", 1, "off (NetworkManager does not run)", ""},
         {"device --profile host", 0, "(not available on this machine)", ""},
         {"doctor --profile host", 1, "ModemManager          no   does not run", ""},
+        {"doctor --profile host", 1, "NetworkManager        no   does not run", ""},
         {"subscribers", 2, "", "missing verb; expected one of list, add, remove"},
         {"country 450 kr", 2, "", "unexpected word \"kr\" after kivctl country; see kivctl country --help"},
         {"sim --slot 1 wait", 2, "", "--slot is an option of \"sim\"; those of \"sim wait\" go after it"},
@@ -65,13 +66,17 @@ TEST_F(KivctlTest, EndsWithTheDocumentedExitCode)
         {"network --profile no-telephony", 1, "out of service", ""},
         {"country +81", 0, "Japan", ""},
         {"-t --fields imsi,number sim -p single", 0, "45005**********:***********78\n", ""},
+        {"device -t --fields imei", 0, "***********3809\n", ""},
         {"device --show-ids --fields imei,platform_device_id -j", 0, "\"imei\": \"356938035643809\"", ""},
         {"device set -p ./w network.cellular=0 network.wifi=2 device.tizen-id=1234", 0, "", ""},
         {"network -p ./w --bt", 1, "connected  no", ""},
         {"network -p ./w --wifi", 0, "connected  yes", ""},
         {"device set -p ./w network.wifi=0 network.bluetooth=2 settings.device-name='a:\\\xe2\x80\xae'", 0, "", ""},
         {"network -p ./w --bt", 0, "connected  yes", ""},
+        {"network -p ./w --wifi", 1, "connected  no", ""},
         {"device -p ./w -t --fields platform_device_id,name", 0, "****:a\\:\\\\\\u202e\n", ""},
+        {"device -p ./w --fields name", 0, "name  a:\\\\u202e\n", ""},
+        {"device get -p ./w settings.device-name", 0, "a:\\\\u202e\n", ""},
         {"device -p ./w -j --fields name", 0, "\"a:\\\\\\u202e\"", ""},
         {"network -p './\x1b[31m\n'", 10, "", "./\\x1b[31m\\n"},
         {"device --fields nam,model", 2, "", "there is no field \"nam\" (did you mean \"name\"?); the fields are name, model,"},
@@ -103,16 +108,16 @@ TEST_F(KivctlTest, EndsWithTheDocumentedExitCode)
         EXPECT_EQ(*out == '\0', outcome.out.empty()) << arguments;
     }
     EXPECT_FALSE(std::filesystem::exists("x"));
-    const Outcome mistyped("env KIV_PROFILE=tripel KIV_LOG=verbose " KIVCTL " network");
+    const Outcome mistyped("env KIV_PROFILE=tripel KIV_LOG=loud\x1b " KIVCTL " network");
     EXPECT_EQ(10, mistyped.exit);
     EXPECT_EQ(2, std::count(mistyped.err.begin(), mistyped.err.end(), '\n')) << mistyped.err;
-    EXPECT_THAT(mistyped.err, HasSubstr("kivctl: KIV_LOG: \"verbose\" is invalid; expected error, info or journal\n"));
+    EXPECT_THAT(mistyped.err, HasSubstr("kivctl: KIV_LOG: \"loud\\x1b\" is invalid; expected error, info or journal\n"));
 }
 
 TEST_F(KivctlTest, SaysThatTheOutputCannotBeWritten)
 {
-    for (const char* arguments :
-        {"device", "sim", "country 450 -t", "--help", "--version", "sim --help", "completion bash", "services"})
+    for (const char* arguments : {"device", "sim", "country 450 -t", "network -j", "profiles -j", "device get runtime.flight-mode",
+             "profiles show dual", "--help", "--version", "sim --help", "completion bash", "services"})
     {
         const Outcome outcome("sh -c '" KIVCTL " " + std::string(arguments) + " >/dev/full'");
         EXPECT_EQ(7, outcome.exit) << arguments;

@@ -279,6 +279,7 @@ TEST_F(BusyStore, CanBeReadWhenItCannotBeWritten)
                 EXPECT_EQ(0, setrlimit(RLIMIT_FSIZE, &nothing));
                 EXPECT_EQ(":1.7 ", Find("push", "7"));
                 EXPECT_EQ(Outcome::Failed, Add("push", "7", ":1.8"));
+                EXPECT_THAT(reason, HasSubstr("; check the disk and its file system"));
                 EXPECT_EQ(":1.7 ", Find("push", "7"));
             });
         full.AwaitEnd();
