@@ -1,7 +1,7 @@
 #!/bin/bash
-# Builds the library with the simulated device, and shows both at work on a message bus of its own: the device, its SIMs, countries,
-# notifications, push messages, and a change of the network that a watcher notices. At the end it shows the machine itself. It stops
-# everything that it starts.
+# Builds the library with the simulated device and shows what they do on a private message bus: the device, its SIMs, countries,
+# notifications, push messages, and a network change that a watching agent receives. At the end it shows the machine itself. It
+# stops everything that it starts.
 set -euo pipefail
 here=$(dirname "$(readlink -f "$0")")
 cd "$here"
@@ -37,7 +37,7 @@ build()
     exec 9>&-
 }
 
-# Starts a party in the background; what it prints goes to a file of its name.
+# Starts a program in the background. Its output goes to a file with that name.
 start() # name command...
 {
     local name=$1
@@ -47,7 +47,7 @@ start() # name command...
     pids[$name]=$!
 }
 
-# Waits until a party printed that text.
+# Waits until a program in the background has printed that text.
 await() # name text
 {
     local deadline=$((SECONDS + 20))
@@ -76,7 +76,7 @@ prompt() # argument...
     done
 }
 
-# Shows a command of the command line and what it answers; an answer of "no" is one too.
+# Shows a command and its output. A failure is shown too, and the demonstration continues.
 show() # argument...
 {
     prompt "$@"
@@ -84,14 +84,16 @@ show() # argument...
     kivctl "$@" || echo "(exit code $?)"
 }
 
-# The same on one line, for an answer of one line. Progress, which would overwrite that line, is shown on a terminal alone.
-tell() # argument...
+# The same for a command that shows progress on a terminal, here without its progress.
+without_progress() # argument...
 {
-    printf '%-70s  ' "$(prompt "$@")"
+    prompt "$@"
+    echo
     kivctl "$@" 2>&1 | cat
 }
 
-saw() # name
+# Shows what a program in the background has printed since the last time.
+printed_by() # name
 {
     sed "s/^/  $1 | /" "$work/$1"
     : >"$work/$1"
@@ -124,7 +126,7 @@ start_client_services()
     start calls "$kivctl" subscribe --name org.example.Calls --key 8 --kind status --kind auth --push mail
     await calls ready
 
-    title "Client services that subscribed over the bus"
+    title "Two client services have subscribed over the bus"
     show subscribers list
 }
 
@@ -137,13 +139,13 @@ show_device()
 
 show_sims()
 {
-    title "Its SIMs"
+    title "The SIMs of the device"
     show sim
 
-    title "The SIMs of a device whose first one is locked"
+    title "The SIMs of a device whose first SIM is locked"
     show sim --profile dual-first-locked
 
-    title "Waiting for a SIM: of a device that is slow to start, of one that needs its PIN"
+    title "Waiting for a SIM that starts slowly, and for one that needs its PIN"
     show sim wait --profile slow-sim
     show sim wait --profile pin-required --timeout 1
 }
@@ -158,51 +160,51 @@ show_countries()
 
 show_notifications()
 {
-    title "Notifications to the client services that subscribed"
-    tell notify auth-success
-    tell notify auth-fail
-    tell notify on --service 7
-    tell notify off on --service 7 --service 8
-    tell notify policy --service 7 --texts on chat 2 http://example.org
-    tell notify activated
-    tell notify deactivated
-    tell notify number-changed --texts a b c d
-    saw mail
-    saw calls
+    title "Notifications to the client services"
+    without_progress notify auth-success
+    without_progress notify auth-fail
+    without_progress notify on --service 7
+    without_progress notify off on --service 7 --service 8
+    without_progress notify policy --service 7 --texts on chat 2 http://example.org
+    without_progress notify activated
+    without_progress notify deactivated
+    without_progress notify number-changed --texts a b c d
+    printed_by mail
+    printed_by calls
 
     title "Notifications to the platform's service manager"
-    tell notify auth-success --to manager
-    tell notify auth-fail --to manager
-    tell notify on --service 7 --to manager
-    tell notify off --service 7 --to manager
-    tell notify policy --service 7 --texts on chat 2 http://example.org --to manager
-    tell notify activated --to manager
-    tell notify deactivated --to manager
-    saw manager
+    without_progress notify auth-success --to manager
+    without_progress notify auth-fail --to manager
+    without_progress notify on --service 7 --to manager
+    without_progress notify off --service 7 --to manager
+    without_progress notify policy --service 7 --texts on chat 2 http://example.org --to manager
+    without_progress notify activated --to manager
+    without_progress notify deactivated --to manager
+    printed_by manager
 }
 
 show_push()
 {
     title "A push message"
-    tell push mail --data '{"folder":"inbox"}' --message "You have mail" --time 1764000000
-    saw mail
-    saw calls
+    without_progress push mail --data '{"folder":"inbox"}' --message "You have mail" --time 1764000000
+    printed_by mail
+    printed_by calls
 }
 
 show_watch()
 {
-    title "Flight mode goes on while an agent watches"
+    title "Flight mode is switched on while an agent watches"
     show device set --profile ./phone runtime.flight-mode=false
     start watcher "$kivctl" watch --profile ./phone
     await watcher ready
     show network --profile ./phone
-    show device set --profile ./phone runtime.flight-mode=true network.cellular=1
+    show device set --profile ./phone runtime.flight-mode=true network.cellular=flight-mode
     await watcher flight_mode
     show network --profile ./phone
-    saw watcher
+    printed_by watcher
 }
 
-# The machine that this runs on: its own bus, and the daemons of it, if there are any.
+# Shows the machine on which this runs, with its system bus and daemons, if it has any.
 show_machine()
 {
     title "This machine"

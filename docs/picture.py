@@ -14,14 +14,14 @@ COLUMNS = 130
 
 # The sections to show: how many of their lines, and which of them to leave out.
 SECTIONS = {
-    "Its SIMs": (99, None),
-    "Countries": (9, None),
+    "The SIMs of the device": (99, None),
+    "Countries": (10, None),
     "Notifications to the client services": (99, "activate|number|policy|off|calls"),
     "A push message": (99, "calls"),
     "Flight mode": (99, None),
 }
 
-# Like rich's own form, but with the fonts of the machine alone.
+# Like rich's own form, but with fonts of the reader's machine only.
 FORM = """<svg viewBox="0 0 {width} {height}" xmlns="http://www.w3.org/2000/svg">
 <style>
 .{unique_id}-matrix {{ font-family: monospace; font-size: {char_height}px; line-height: {line_height}px; }}
@@ -44,17 +44,19 @@ FORM = """<svg viewBox="0 0 {width} {height}" xmlns="http://www.w3.org/2000/svg"
 
 
 def shown(line):
-    """What a terminal shows of a line: the text after the last carriage return that clears it."""
+    """The part of a line that a terminal shows: the text after the last carriage return that clears the line."""
     return line.rstrip("\r").split("\r\x1b[K")[-1]
 
 
 def part(lines):
-    left, pattern = 0, None
+    left, pattern, hidden = 0, None, False
     for line in lines:
         title = re.search(r"== ([^\x1b]*)", line)
         if title:
             left, pattern = next((how for name, how in SECTIONS.items() if title[1].startswith(name)), (0, None))
-        if left > 0 and not (pattern and re.search(pattern, line)):
+        # The answer below a hidden command is hidden too.
+        hidden = bool(pattern and re.search(pattern, line)) or (hidden and line.startswith("sent "))
+        if left > 0 and not hidden:
             left -= 1
             yield line
 
