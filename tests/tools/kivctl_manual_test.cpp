@@ -122,7 +122,7 @@ TEST_F(KivctlTest, CompletesByTheWordsBefore)
         {"notify on --to ''", "subscribers\nmanager\n"},
         {"notify on --service 7 po", "policy\n"},
         {"--color=a", "--color=auto\n--color=always\n"},
-        {"sim w", "wait\tWait until a SIM is usable, checking once a second\n"},
+        {"sim w", "wait\tWait until a SIM is usable, checking once per second\n"},
         {"sim --sl", "--slot\tUse only this slot, counted from 0\n"},
         {"subscribers remove ''", "auth\npush\nstatus\n"},
         {"subscribers remove status ''", "7\n"},

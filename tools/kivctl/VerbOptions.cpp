@@ -138,24 +138,23 @@ void AddDevice(CLI::App& app, Command& command)
         ->type_name("MIB")
         ->capture_default_str()
         ->check(IsNumber);
-    AddFields(AddVerb(*device, command, "id", "Ask the device daemon on the bus for the device unique ID", ShowDeviceId), command,
+    AddFields(AddVerb(*device, command, "id", "Read the device unique ID from the device daemon on the bus", ShowDeviceId), command,
         {"device_id"});
 
     const auto [set, changes] = AddVerb(
         *device, command, "set", "Change values in the device file that --profile names", SetInDeviceFile, DeviceUse::Leaves);
     set->add_option("GROUP.KEY=VALUE", changes->words,
-        "Values to change; an error in one leaves all unchanged (kivctl device keys lists the keys)");
+        "Values to change; if one is wrong, nothing changes (kivctl device keys lists the keys)");
     set->add_option("--from", changes->from, "Create the file from this profile (default: from the profile in use)")
         ->type_name("PROFILE");
     const auto [unset, removals] = AddVerb(*device, command, "unset",
         "Reset keys of the device file that --profile names to their defaults", UnsetInDeviceFile, DeviceUse::Leaves);
-    unset->add_option("GROUP.KEY", removals->words, "Keys to remove from the file; an error in one leaves all unchanged")
-        ->required();
+    unset->add_option("GROUP.KEY", removals->words, "Keys to remove from the file; if one is wrong, nothing changes")->required();
     const auto [get, value] =
-        AddVerb(*device, command, "get", "Show the device's values as they are in a device file", ShowDeviceValues);
+        AddVerb(*device, command, "get", "Show the device's values under the keys of a device file", ShowDeviceValues);
     AddFields(get, command, {"key", "value"});
     get->add_option("GROUP.KEY", value->key, "Print only this value");
-    AddShowIds(get, command, "Show values that identify a person or a device unmasked, as GROUP.KEY does");
+    AddShowIds(get, command, "Also show values unmasked that identify a person or a device, as with GROUP.KEY");
     AddFields(AddVerb(*device, command, "keys", "List the keys of a device file", ShowDeviceKeys, DeviceUse::Leaves), command,
         {"key", "values", "default", "meaning"});
 
@@ -181,7 +180,7 @@ void AddSim(CLI::App& app, Command& command)
     AddShowIds(sim, command, "Show IMSIs and subscriber numbers unmasked");
 
     const auto [wait, waitOptions] =
-        AddVerb(*sim, command, "wait", "Wait until a SIM is usable, checking once a second", WaitForSim);
+        AddVerb(*sim, command, "wait", "Wait until a SIM is usable, checking once per second", WaitForSim);
     AddFields(wait, command, {"usable_slot", "waited_seconds"});
     addSlot(wait, *waitOptions);
     wait->add_option("--timeout", waitOptions->timeout, "Maximum wait in seconds (default: as long as a SIM may become usable)")
@@ -211,7 +210,7 @@ void AddNotify(CLI::App& app, Command& command)
     Restrict(verb->add_option("--to", options->to, "Receivers of the event")->capture_default_str(), {"subscribers", "manager"});
     verb->add_option("--imsi", options->imsi, "Subscriber that the event is about (default: the first SIM that answers)")
         ->type_name("IMSI");
-    verb->add_option("--service", options->services, "Service ID of on, off and policy; one for each TYPE")
+    verb->add_option("--service", options->services, "Service ID, for on, off and policy; one per TYPE")
         ->type_name("ID")
         ->check(IsServiceId);
     verb->add_option("--texts", options->texts,
@@ -273,7 +272,8 @@ void AddServices(CLI::App& app, Command& command)
 {
     const auto [verb, options] = AddVerb(
         app, command, "services", "Run the device daemon and the service manager, and print each event until Ctrl-C", RunServices);
-    verb->add_option("--serial", options->serial, "Serial number that the device daemon returns (default: the device's own)");
+    verb->add_option(
+        "--serial", options->serial, "Serial number that the device daemon returns (default: that of the device in use)");
 }
 
 void AddDoctor(CLI::App& app, Command& command)
