@@ -8,7 +8,7 @@
 
 PLATFORM_BEGIN_DECLS
 
-/// The subscription that voice calls go out on, by slot.
+/// The slot whose subscription is used for outgoing voice calls.
 typedef enum PLATFORM_OPEN_ENUM
 {
     TAPI_CALL_PREFERRED_VOICE_SUBS_UNKNOWN = -1,
@@ -17,7 +17,7 @@ typedef enum PLATFORM_OPEN_ENUM
 } TelCallPreferredVoiceSubs_t;
 
 /// @param handle  open handle
-/// @param subscription  receives a TelCallPreferredVoiceSubs_t, possibly a value without a name here
+/// @param subscription  receives a TelCallPreferredVoiceSubs_t, possibly one without a name in the enumeration
 int tel_get_call_preferred_voice_subscription(TapiHandle* handle, TelCallPreferredVoiceSubs_t* subscription);
 
 PLATFORM_END_DECLS

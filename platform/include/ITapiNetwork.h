@@ -8,7 +8,7 @@
 
 PLATFORM_BEGIN_DECLS
 
-/// The main subscription, by slot.
+/// The slot of the main subscription.
 typedef enum PLATFORM_OPEN_ENUM
 {
     TAPI_NETWORK_DEFAULT_SUBS_UNKNOWN = -1,
@@ -16,7 +16,7 @@ typedef enum PLATFORM_OPEN_ENUM
     TAPI_NETWORK_DEFAULT_SUBS_SIM2 = 1
 } TelNetworkDefaultSubs_t;
 
-/// The subscription that carries mobile data, by slot.
+/// The slot whose subscription carries mobile data.
 typedef enum PLATFORM_OPEN_ENUM
 {
     TAPI_NETWORK_DEFAULT_DATA_SUBS_UNKNOWN = -1,
@@ -25,11 +25,11 @@ typedef enum PLATFORM_OPEN_ENUM
 } TelNetworkDefaultDataSubs_t;
 
 /// @param handle  open handle
-/// @param subscription  receives a TelNetworkDefaultSubs_t, possibly a value without a name here
+/// @param subscription  receives a TelNetworkDefaultSubs_t, possibly one without a name in the enumeration
 int tel_get_network_default_subscription(TapiHandle* handle, TelNetworkDefaultSubs_t* subscription);
 
 /// @param handle  open handle
-/// @param subscription  receives a TelNetworkDefaultDataSubs_t, possibly a value without a name here
+/// @param subscription  receives a TelNetworkDefaultDataSubs_t, possibly one without a name in the enumeration
 int tel_get_network_default_data_subscription(TapiHandle* handle, TelNetworkDefaultDataSubs_t* subscription);
 
 PLATFORM_END_DECLS

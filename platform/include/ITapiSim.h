@@ -29,7 +29,7 @@ typedef enum PLATFORM_OPEN_ENUM
     TAPI_SIM_STATUS_UNKNOWN = 255 ///< before the first answer of the card
 } TelSimCardStatus_t;
 
-/// The identity on the SIM, as NUL-terminated digits. The three parts in a row are the IMSI.
+/// The identity on the SIM, as NUL-terminated digits. The three parts joined are the IMSI.
 typedef struct
 {
     char szMcc[3 + 1];   ///< mobile country code, 3 digits
@@ -38,7 +38,7 @@ typedef struct
 } TelSimImsiInfo_t;
 
 /// @param handle  open handle
-/// @param status        receives a TelSimCardStatus_t, possibly a value without a name here
+/// @param status        receives a TelSimCardStatus_t, possibly one without a name in the enumeration
 /// @param card_changed  receives 1 when the card has changed since the last start, else 0
 int tel_get_sim_init_info(TapiHandle* handle, TelSimCardStatus_t* status, int* card_changed);
 

@@ -12,7 +12,7 @@ PLATFORM_BEGIN_DECLS
 /// An open modem.
 typedef struct tapi_handle TapiHandle;
 
-/// The service the modem has: 0 unknown, 1 none, 2 emergency only, 3 searching, 4 and above service of increasing generation.
+/// The service of the modem: 0 unknown, 1 none, 2 emergency only, 3 searching, 4 and above service of increasing generation.
 #define TAPI_PROP_NETWORK_SERVICE_TYPE "org.tizen.telephony.Network:service_type"
 
 /// @return the CP names, one per slot in the order of the slots: a new null-terminated array, which the caller releases with

@@ -27,7 +27,7 @@ typedef enum
     DLOG_FATAL = 7
 } log_priority;
 
-/// Appends one line to a log buffer. The caller ends the line itself.
+/// Appends one line to a log buffer. The text must contain the newline.
 /// @param log_id  a log_id_t
 /// @param prio    a log_priority
 /// @param tag     name of the writer; borrowed

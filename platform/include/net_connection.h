@@ -45,15 +45,15 @@ int connection_create(connection_h* connection);
 int connection_destroy(connection_h connection);
 
 /// @param connection  open handle
-/// @param state  receives a connection_cellular_state_e, possibly a value without a name here
+/// @param state  receives a connection_cellular_state_e, possibly one without a name in the enumeration
 int connection_get_cellular_state(connection_h connection, connection_cellular_state_e* state);
 
 /// @param connection  open handle
-/// @param state  receives a connection_wifi_state_e, possibly a value without a name here
+/// @param state  receives a connection_wifi_state_e, possibly one without a name in the enumeration
 int connection_get_wifi_state(connection_h connection, connection_wifi_state_e* state);
 
 /// @param connection  open handle
-/// @param state  receives a connection_bt_state_e, possibly a value without a name here
+/// @param state  receives a connection_bt_state_e, possibly one without a name in the enumeration
 int connection_get_bt_state(connection_h connection, connection_bt_state_e* state);
 
 PLATFORM_END_DECLS

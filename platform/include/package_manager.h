@@ -7,7 +7,7 @@
 
 PLATFORM_BEGIN_DECLS
 
-/// Results of the package services. Other negative values are errors without a name here.
+/// Results of the package services. Other negative values are errors without a name in this header.
 typedef enum PLATFORM_OPEN_ENUM
 {
     PACKAGE_MANAGER_ERROR_NONE = 0,

@@ -4,9 +4,9 @@
 #define KIV_PLATFORM_DECLS_H
 
 /// @def PLATFORM_BEGIN_DECLS
-/// Begins declarations of C.
+/// Begins C declarations.
 /// @def PLATFORM_END_DECLS
-/// Ends declarations of C.
+/// Ends C declarations.
 /// @def PLATFORM_OPEN_ENUM
 /// Makes an enumeration an open one. Services may return values that its header does not name, so its underlying type in C++ is
 /// int: any int may be stored in it and read from it.

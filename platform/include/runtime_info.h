@@ -26,7 +26,7 @@ typedef enum PLATFORM_OPEN_ENUM
 } runtime_info_wifi_status_e;
 
 /// @param key  the value in question
-/// @param user_data  that of the registration
+/// @param user_data  from the registration
 typedef void (*runtime_info_changed_cb)(runtime_info_key_e key, void* user_data);
 
 /// Reads a number.

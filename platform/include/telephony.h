@@ -1,7 +1,7 @@
 /// @file
 /// Telephony, one handle per SIM slot.
-/// Every function returns 0 on success, else an error code, and then leaves its out-parameters untouched unless it says otherwise.
-/// All block on the modem. Any thread.
+/// Every function returns 0 on success, else an error code, and then leaves its out-parameters untouched unless documented
+/// otherwise. All block on the modem. Any thread.
 #ifndef KIV_PLATFORM_TELEPHONY_H
 #define KIV_PLATFORM_TELEPHONY_H
 
@@ -22,7 +22,7 @@ typedef struct
     telephony_h* handle; ///< count handles
 } telephony_handle_list_s;
 
-/// Results of this service. Other values than 0 are errors without a name here.
+/// Results of this service. Other values than 0 are errors without a name in this header.
 typedef enum PLATFORM_OPEN_ENUM
 {
     TELEPHONY_ERROR_NONE = 0,
@@ -59,7 +59,7 @@ int telephony_deinit(telephony_handle_list_s* list);
 int telephony_modem_get_imei(telephony_h handle, char** imei);
 
 /// @param handle  open handle
-/// @param state  receives a telephony_sim_state_e, possibly a value without a name here
+/// @param state  receives a telephony_sim_state_e, possibly one without a name in the enumeration
 int telephony_sim_get_state(telephony_h handle, telephony_sim_state_e* state);
 
 /// @param handle  open handle
@@ -67,7 +67,7 @@ int telephony_sim_get_state(telephony_h handle, telephony_sim_state_e* state);
 int telephony_sim_get_subscriber_number(telephony_h handle, char** number);
 
 /// @param handle  open handle
-/// @param state  receives a telephony_network_service_state_e, possibly a value without a name here
+/// @param state  receives a telephony_network_service_state_e, possibly one without a name in the enumeration
 int telephony_network_get_service_state(telephony_h handle, telephony_network_service_state_e* state);
 
 /// @param handle  open handle

@@ -29,12 +29,12 @@ typedef enum PLATFORM_OPEN_ENUM
 } wifi_connection_state_e;
 
 /// @param state  the new state
-/// @param user_data  that of the registration
+/// @param user_data  from the registration
 typedef void (*wifi_device_state_changed_cb)(wifi_device_state_e state, void* user_data);
 
 /// @param state  the new state
 /// @param ap         the access point in question, possibly null
-/// @param user_data  that of the registration
+/// @param user_data  from the registration
 typedef void (*wifi_connection_state_changed_cb)(wifi_connection_state_e state, wifi_ap_h ap, void* user_data);
 
 /// Prepares the other functions; may be called again.

@@ -10,8 +10,8 @@
 class KIV_SYSTEM_API DAConnectionManager
 {
 public:
-    /// Returns the one instance, made on first use and never deleted; null when there is no memory for it, and the next call tries
-    /// again. Any thread; holds a lock of its own.
+    /// Returns the single instance. The first call creates it, and it is never deleted. Null when there is no memory for it; then
+    /// the next call tries again. Any thread; holds a separate lock.
     static DAConnectionManager* GetInstance();
 
     DAConnectionManager();          ///< holds nothing; use GetInstance() instead

@@ -15,12 +15,12 @@
 ///
 /// Connecting takes at most 25 seconds, but has no time limit on a bus that accepts connections and never answers. A call works
 /// even if the process's shared connection is dead. In a child made by fork, bus calls fail at once if the parent used the bus
-/// through the library; if the parent used GDBus only by itself, they wait for an answer that never comes.
+/// through the library; if the parent used GDBus without the library, they wait forever.
 class KIV_SYSTEM_API DADBusManager
 {
 public:
-    /// Returns the one instance, made on first use and never deleted; null when there is no memory for it, and the next call tries
-    /// again. Any thread; holds a lock of its own.
+    /// Returns the single instance. The first call creates it, and it is never deleted. Null when there is no memory for it; then
+    /// the next call tries again. Any thread; holds a separate lock.
     static DADBusManager* GetInstance();
 
     DADBusManager();          ///< holds nothing; use GetInstance() instead
@@ -28,7 +28,7 @@ public:
 
     /// Takes the process's shared system-bus connection, or a private one when that is dead or unavailable.
     /// @param error  receives 1 or 3 on failure; otherwise unchanged
-    /// @return a new reference, released with g_object_unref(), or null. It does not end the process when the bus goes away.
+    /// @return a new reference, released with g_object_unref(), or null. It does not end the process when the bus stops.
     /// Blocks while connecting.
     GDBusConnection* InitDbusConnection(int* error);
 

@@ -14,14 +14,15 @@
 
 /// Reads SIM state, identity and subscriptions, opens telephony handles, and searches the country tables.
 ///
-/// A slot is a 0-based index, the same in the handle list and in the list of modem (CP) names. Reading a slot that either list
-/// lacks fails. Every operation blocks on the modem unless documented otherwise, and may be called from any thread: the named lock
-/// "CORE_MUTEX_NAME_SIM_ACCESS" serialises SIM access. Each operation documents whether it holds the lock throughout or per read.
+/// A slot is a 0-based index, the same in the handle list and in the list of modem (CP) names. A read fails if either list
+/// lacks the slot. Every operation blocks on the modem unless documented otherwise, and may be called from any thread: the named
+/// lock "CORE_MUTEX_NAME_SIM_ACCESS" serialises SIM access. Each operation documents whether it holds the lock throughout or per
+/// read.
 class KIV_SYSTEM_API DASimManager
 {
 public:
-    /// Returns the one instance, made on first use and never deleted; null when there is no memory for it, and the next call tries
-    /// again. Any thread; holds a lock of its own.
+    /// Returns the single instance. The first call creates it, and it is never deleted. Null when there is no memory for it; then
+    /// the next call tries again. Any thread; holds a separate lock.
     static DASimManager* GetInstance();
 
     DASimManager();          ///< holds nothing; use GetInstance() instead
@@ -75,8 +76,8 @@ public:
     /// @param slot    0-based
     /// @param status  receives the last status read
     /// @return whether the card's initialisation is completed; false also when 100 attempts to open the modem failed
-    /// Waits without a time limit once the modem is open, for example for a card's PIN. A slot that does not exist takes 100
-    /// attempts as well. The second argument is ignored. Takes no lock.
+    /// Once the modem is open, waits without a time limit, for example for a card's PIN. Makes 100 attempts also for a slot that
+    /// does not exist. Ignores the second argument. Takes no lock.
     bool IsAvaliableSimStateOnPolling(int slot, int, TelSimCardStatus_t* status);
 
     /// @return whether a card with that status may become usable later. Does not block; takes no lock.

@@ -19,13 +19,14 @@
 /// The facade of the library: answers the agent's queries about device, SIMs, countries and network, and sends its notifications.
 ///
 /// It keeps no state between calls. Results are copies, released with free(), unless documented otherwise. Any thread may call any
-/// member; SetConnectionEventListener() has restrictions. When there is no memory for a manager behind the facade, a member returns
-/// its failure result: false, null, code 4 or KIV_CONNECTION_STATE_UNKNOWN. A member that always returns 0 still does.
+/// member; SetConnectionEventListener() has restrictions. When there is no memory for a manager, a member that calls the manager
+/// returns its failure result: false, null, code 4 or KIV_CONNECTION_STATE_UNKNOWN. A member that always returns 0 also returns 0
+/// then.
 class KIV_SYSTEM_API DASystem
 {
 public:
-    /// Returns the one instance, made on first use and never deleted; null when there is no memory for it, and the next call tries
-    /// again. Any thread; holds a lock of its own.
+    /// Returns the single instance. The first call creates it, and it is never deleted. Null when there is no memory for it; then
+    /// the next call tries again. Any thread; holds a separate lock.
     static DASystem* GetInstance();
 
     DASystem();          ///< holds nothing; use GetInstance() instead
@@ -234,7 +235,7 @@ public:
     /// Reads the font size setting; not meaningful on failure.
     int GetFontSize(int* size);
 
-    /// Reads the current local time; all zero when the platform returns none, as after 19 January 2038 with a time_t of 32 bits.
+    /// Reads the current local time; all zero when the platform returns none, as after 19 January 2038 with a 32-bit time_t.
     int GetCurrentTime(tm* now);
 
     /// Reads the platform's name; null when the platform returns none.

@@ -31,7 +31,7 @@ public:
     /// The device joined or left a Wi-Fi network.
     virtual void OnWifiConnectedChanged(bool connected, void* userData) = 0;
 
-    /// The library never deletes a listener.
+    /// The library does not delete listeners.
     virtual ~IDAConnectionStateListener() = default;
 };
 

@@ -3,8 +3,8 @@
 #ifndef KIV_RESULTCODE_H
 #define KIV_RESULTCODE_H
 
-/// Result codes of DADBusManager. DASystem and DASimManager use 0 and 4 of them. Members that return platform codes instead
-/// document it.
+/// Result codes of DADBusManager. DASystem and DASimManager use only 0 and 4. The comments of members that return platform codes
+/// say so.
 enum _KIV_RESULT_E : int
 {
     KIV_RESULT_SUCCESS = 0,          ///< done

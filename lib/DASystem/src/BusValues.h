@@ -40,7 +40,7 @@ inline bool HaveTexts(const Place& here, Values values)
     return true;
 }
 
-/// Whether every text is null or valid UTF-8; logs the first that is not. GLib would replace such a text by another.
+/// Whether every text is null or valid UTF-8; logs the first that is not. GLib would replace an invalid text by another.
 inline bool AreUtf8(const Place& here, Values values)
 {
     for (const Value& value : values)
@@ -78,7 +78,7 @@ inline GVariant* StructureArgument(Values values)
     return g_variant_new_tuple(&structure, 1);
 }
 
-/// Returns the reason of a failure in words. GDBus sets no GError when a name, path or interface is malformed.
+/// Returns the reason for a failure as text. GDBus sets no GError when a name, path or interface is malformed.
 inline const char* Reason(const GError* error)
 {
     return error == nullptr || error->message == nullptr ? "no reason given" : error->message;

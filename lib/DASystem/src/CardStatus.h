@@ -47,7 +47,7 @@ inline constexpr CardStatus CardStatusTable[] = {
 };
 // clang-format on
 
-/// Returns the row of a status; an unknown status counts as a definite failure.
+/// Returns the row of a status; an unknown status counts as one that never becomes usable.
 inline CardStatus Judge(TelSimCardStatus_t status)
 {
     for (const CardStatus& row : CardStatusTable)

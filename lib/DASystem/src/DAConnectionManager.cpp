@@ -12,7 +12,7 @@ IDAConnectionStateListener* DAConnectionManager::__pListener = nullptr;
 namespace
 {
 
-/// Reads one state with a connection handle of its own; KIV_CONNECTION_STATE_UNKNOWN when it cannot be read.
+/// Reads one state with a new connection handle; KIV_CONNECTION_STATE_UNKNOWN when it cannot be read.
 template <class State>
 int ReadState(int (*read)(connection_h, State*))
 {

@@ -350,7 +350,7 @@ bool DASimManager::GetSimInfo(const char* cpName, std::string* mcc, std::string*
         KIV_ERROR("tel_get_sim_imsi errno [%d]", code);
         return false;
     }
-    // Copied first, then moved: when there is no memory for a text, all three of the caller's stay unchanged.
+    // Copies all texts first and then moves them, so that the caller's three texts stay unchanged when there is no memory.
     return kiv::NoThrow(false,
         [&]
         {
@@ -421,7 +421,7 @@ bool DASimManager::CheckSmsEnabled(char* cpName, int* status)
 
 bool DASimManager::IsAvaliableSendSMS(int slot, TelSimCardStatus_t* status, int* serviceType)
 {
-    constexpr int kSearching = 3; // higher service types mean service
+    constexpr int kSearching = 3; // a modem with a higher service type has service
     const SimAccess access;
     if (!access)
         return false;

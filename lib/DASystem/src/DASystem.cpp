@@ -184,7 +184,7 @@ void DASystem::GetCountryNameAlpha2FromCountryCallingCode(const char* countryCal
     const CString mcc = MccOfCallingCode(countryCallingCode, KIV_HERE);
     if (mcc == nullptr)
         return;
-    // Of two countries that share an MCC, the last is the answer.
+    // If two countries share an MCC, returns the last one.
     const std::size_t row = kiv::CountryInfoTable::mcc.LastRow(mcc.get());
     *countryCode = row == kiv::kNoRow ? nullptr : const_cast<char*>(kiv::CountryInfoTable::countryCode[row]);
 }
@@ -244,7 +244,7 @@ int DASystem::SendMultiOnOffNotiToServiceManager(const char* imsi, int count, in
 namespace
 {
 
-/// Reads the IMEI of the first modem that answers, the platform's own text.
+/// Reads the IMEI of the first modem that answers, the platform's text without a copy.
 /// @return whether one answered
 bool FirstImei(const Place& here, char** imei)
 {

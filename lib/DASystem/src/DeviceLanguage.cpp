@@ -49,7 +49,7 @@ int DASystem::GetTagStartPosition(std::string source, std::string tag)
 
 std::string DASystem::GetValueFromPosition(std::string source, int startPosition, int endPosition)
 {
-    // Computed in a wider type: converted, a negative length reaches to the end.
+    // Computed in a wider type. A negative length becomes a very large one and selects the text up to the end.
     const long long length = static_cast<long long>(endPosition) - startPosition + 1;
     return source.substr(static_cast<std::size_t>(startPosition), static_cast<std::size_t>(length));
 }

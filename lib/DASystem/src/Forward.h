@@ -1,5 +1,5 @@
 /// @file
-/// How the facade forwards to a manager.
+/// Forwards calls of the facade to a manager.
 #ifndef KIV_FORWARD_H
 #define KIV_FORWARD_H
 

@@ -18,7 +18,7 @@ struct Place
 
 } // namespace kiv
 
-/// The place of this very line; the compiler finds the base name.
+/// The place of the line that contains the macro; the compiler finds the base name.
 #define KIV_HERE (::kiv::Place{__builtin_strrchr("/" __FILE__, '/') + 1, __func__, __LINE__})
 
 /// Logs an error or information line: a printf format without the final newline, and at most five values.

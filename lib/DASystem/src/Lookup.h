@@ -57,7 +57,7 @@ class KeyColumn
 {
     static constexpr std::size_t kRows = std::size(Rows);
 
-    /// Whether every text fits into such an integer together with its terminating zero.
+    /// Whether every text fits into the integer together with its terminating zero.
     template <class Word>
     static constexpr bool Fits()
     {

@@ -26,7 +26,7 @@ inline constexpr Notification kActivated     {"activated",      "all",   "activa
 inline constexpr Notification kNumberChanged {"number_changed", "all",   "number_change"};
 // clang-format on
 
-/// The values sent besides the IMSI.
+/// The values that are sent in addition to the IMSI.
 enum class Body
 {
     Flag,   ///< a number

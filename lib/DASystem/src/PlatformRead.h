@@ -28,7 +28,7 @@ bool ReadSwitch(int (*read)(Key, bool*), Key key)
     return isOn;
 }
 
-/// Copies a platform's text for the caller; null stays null.
+/// Copies a text of the platform for the caller; copies null as null.
 inline int CopyOut(const char* text, char** out)
 {
     char* const copy = text == nullptr ? nullptr : strdup(text);

@@ -30,7 +30,7 @@ void BeginTaking()
     ++takers;
 }
 
-/// Whether GDBus lacks its thread here, because a parent of this process took a connection.
+/// Whether this process lacks GDBus's thread, because a parent of the process took a connection.
 bool IsForked(GError** error)
 {
     static std::atomic<pid_t> user{0};

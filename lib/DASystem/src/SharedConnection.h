@@ -1,6 +1,6 @@
 /// @file
-/// The one place that takes the connection to the system bus. GDBus shares a connection within the process. As long as anybody
-/// holds a dead one, GDBus keeps sharing it until the main context in which it was made is iterated.
+/// The only code that takes the connection to the system bus. GDBus shares one connection within the process. While a dead one is
+/// still referenced, GDBus continues to share it until the main context in which it was made is iterated.
 #ifndef KIV_SHAREDCONNECTION_H
 #define KIV_SHAREDCONNECTION_H
 

@@ -44,7 +44,7 @@ public:
     {
         Char* value = nullptr;
         const int code = Ask<DASimManager, int>(KIV_RESULT_INVALID_ARGUMENT, reader, list_, slot, &value);
-        text.reset(const_cast<char*>(value)); // the MCC's reader returns const, which the caller releases as well
+        text.reset(const_cast<char*>(value)); // the reader of the MCC returns const, but the caller owns the text
         return code;
     }
 

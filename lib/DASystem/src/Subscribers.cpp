@@ -14,7 +14,7 @@ using namespace kiv;
 namespace
 {
 
-/// Takes a new connection unless the present one is alive.
+/// Takes a new connection if the present one is closed.
 bool IsConnected(GDBusConnection*& connection, GError** error)
 {
     if (connection != nullptr && g_dbus_connection_is_closed(connection))
@@ -32,7 +32,7 @@ bool IsCallable(const _SubscriberInfo& subscriber, GError** error)
     return flaw == nullptr;
 }
 
-/// Calls every subscriber in order, and goes on after failures.
+/// Calls every subscriber in order, and continues after failures.
 void CallEach(const Place& here, const std::list<_SubscriberInfo>& subscribers, const char* method, GVariant* body)
 {
     g_autoptr(GDBusConnection) connection = nullptr;

@@ -26,7 +26,7 @@ struct DASubscription
 /// the store (its name ends in -journal). Each change locks the store's directory with flock() while it runs.
 ///
 /// To read, a process needs only the right to read the file, and no disk space. It also needs the right to write the file and its
-/// directory if a change has to be undone or a log of version 1.0.0 has to be folded in. The first change converts a store of that
+/// directory if it must undo a change or merge a log of version 1.0.0. The first change converts a store of that
 /// version, unless a process of that version has it open.
 ///
 /// A reading process keeps the file open between calls. A child made by fork inherits no descriptor of it and can use the store.
@@ -35,7 +35,7 @@ struct DASubscription
 class __attribute__((visibility("default"))) DASubscriberStore
 {
 public:
-    /// What became of a call.
+    /// The outcome of a call.
     enum class Outcome
     {
         Done,

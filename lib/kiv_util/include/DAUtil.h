@@ -3,7 +3,7 @@
 
 #include <string>
 
-/// Text functions.
+/// Functions for texts.
 class __attribute__((visibility("default"))) DAUtil
 {
 public:

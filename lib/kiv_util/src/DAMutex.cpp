@@ -25,7 +25,7 @@ std::array<std::atomic<NamedLock*>, 256> buckets; // lists that grow at the head
 std::array<std::atomic<NamedLock*>, 64> recent;   // the lock found last for each group of similar names
 
 /// Returns the place of a name in `recent`, from its first bytes only. The name often comes from a buffer that was just filled, and
-/// reading all of it would take longer than all the rest.
+/// reading all of it would take longer than the rest of the search.
 std::size_t PlaceOf(const char* name)
 {
     std::size_t sum = 0;

@@ -13,7 +13,7 @@ namespace
 {
 
 constexpr const char* kSchemaVersion = "1";
-constexpr int kPatienceMs = 5000; // for other processes that use the file
+constexpr int kPatienceMs = 5000; // maximum wait for other processes that use the file
 
 constexpr const char* kPermit = "allow this user to read and write the file and its directory";
 constexpr const char* kTryAgain = "try again when no other process keeps it busy";
@@ -189,8 +189,8 @@ bool StoreConnection::Remove(const DASubscription& subscription)
 
 bool StoreConnection::Change(const char* sql, const DASubscription& subscription)
 {
-    // Folds a log of version 1.0.0 into the file. If a process of that version has the store open, a later change folds it. Readers
-    // of this version close the store soon, but SQLite itself does not wait for them here.
+    // Merges a log of version 1.0.0 into the file. If a process of that version has the store open, a later change merges it.
+    // Readers of this version close the store soon, but SQLite does not wait for them here.
     const auto fold = [this] { return sqlite3_exec(db_.get(), "PRAGMA journal_mode = DELETE", nullptr, nullptr, nullptr); };
     for (int tries = 0; fold() == SQLITE_BUSY && tries < kPatienceMs; ++tries)
         g_usleep(1000);

@@ -54,7 +54,7 @@ public:
     enum class Use
     {
         Read,       ///< throws JournalTrouble if there is a journal
-        ReadFrozen, ///< reads the file alone, without any journal or log
+        ReadFrozen, ///< reads only the file, without a journal or log
         Change,     ///< holds the directory's lock, and plays a journal back
         Make        ///< like Change; makes the store first if there is none
     };
@@ -69,7 +69,7 @@ public:
     /// another store that is copied into the file.
     bool IsUpToDate(const std::string& path) const;
 
-    /// Whether the store has a write-ahead log, as in version 1.0.0. While it is open, nobody can convert it.
+    /// Whether the store has a write-ahead log, as in version 1.0.0. While it is open, no process can convert it.
     bool HasLog() const { return hasLog_; }
 
     /// Whether the subscription is new.
@@ -107,7 +107,7 @@ private:
     bool hasLog_ = false;
     std::unique_ptr<DirectoryLock> lock_; // released after the database is closed
     Database db_;
-    Statement find_; // kept, since every notification starts with a search
+    Statement find_; // kept, because every notification starts with a search
 };
 
 #endif
