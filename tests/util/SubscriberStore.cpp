@@ -98,4 +98,29 @@ TEST_F(SubscriberStore, ExplainsWhatToDoAboutAnUnusableFile)
     }
 }
 
+TEST_F(SubscriberStore, ChecksWhetherItCanBeChangedWithoutAChange)
+{
+    fs::create_symlink("nowhere", directory / "dangling");
+    const std::tuple<const char*, Outcome, const char*> rows[] = {
+        {"new/directory/subscribers.db", Outcome::Done, ""},
+        {"dangling", Outcome::Failed, "dangling: the file cannot be changed: No such file or directory; set KIV_SUBSCRIBERS to"},
+        {"dangling/x", Outcome::Done, ""},
+        {"/proc/x/y", Outcome::Failed, "/proc: no file can be made there: No such file or directory; set KIV_SUBSCRIBERS to"},
+    };
+    for (const auto& [name, outcome, trouble] : rows)
+    {
+        Use(name);
+        reason.clear();
+        EXPECT_EQ(outcome, store.Check(reason)) << name;
+        EXPECT_NE(reason.npos, reason.find(trouble)) << reason;
+    }
+    EXPECT_EQ(1, std::distance(fs::directory_iterator(directory), {}));
+    Use("made");
+    ASSERT_EQ(Outcome::Done, Add("push", "7", ":1.7")) << reason;
+    const std::string content = Contents(store.Path());
+    EXPECT_EQ(Outcome::Done, store.Check(reason)) << reason;
+    EXPECT_EQ(content, Contents(store.Path()));
+    EXPECT_EQ(2, std::distance(fs::directory_iterator(directory), {}));
+}
+
 } // namespace

@@ -182,7 +182,9 @@ Finding CheckStore(const Command&)
 {
     std::vector<DASubscription> subscriptions;
     std::string reason;
-    if (DASubscriberStore().List(subscriptions, reason) == DASubscriberStore::Outcome::Done)
+    DASubscriberStore store;
+    if (store.List(subscriptions, reason) == DASubscriberStore::Outcome::Done &&
+        store.Check(reason) == DASubscriberStore::Outcome::Done)
         return {DASubscriberStore::Path() + ", subscriptions: " + std::to_string(subscriptions.size())};
     const std::size_t end = reason.rfind("; "); // what to do follows, as the store knows the cause
     return {reason.substr(0, end), reason.substr(end + 2)};

@@ -62,6 +62,10 @@ public:
     /// Removes a subscription; all five fields must be equal.
     Outcome Remove(const DASubscription& subscription, std::string& reason);
 
+    /// Checks that subscriptions can be added and removed, without changing the store. If the store does not exist, checks that it
+    /// can be made.
+    Outcome Check(std::string& reason);
+
     /// Appends all subscriptions, in the order in which they were added. A store that does not exist counts as empty.
     Outcome List(std::vector<DASubscription>& subscriptions, std::string& reason);
 

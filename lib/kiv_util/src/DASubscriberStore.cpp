@@ -165,6 +165,16 @@ Outcome DASubscriberStore::Remove(const DASubscription& subscription, std::strin
     return Changing(StoreConnection::Use::Change, reason, [&](StoreConnection& store) { return store.Remove(subscription); });
 }
 
+Outcome DASubscriberStore::Check(std::string& reason)
+{
+    return Guarded(reason,
+        [](const std::string& path)
+        {
+            StoreConnection::RequireChangeable(path);
+            return Outcome::Done;
+        });
+}
+
 Outcome DASubscriberStore::List(std::vector<DASubscription>& subscriptions, std::string& reason)
 {
     return Reading(reason,

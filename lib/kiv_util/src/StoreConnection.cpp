@@ -18,6 +18,7 @@ constexpr int kPatienceMs = 5000; // maximum wait for other processes that use t
 constexpr const char* kPermit = "allow this user to read and write the file and its directory";
 constexpr const char* kTryAgain = "try again when no other process keeps it busy";
 constexpr const char* kNameAnother = "set KIV_SUBSCRIBERS to another file";
+constexpr const char* kMakeRoom = "make room on the disk";
 
 constexpr const char* kSchema =
     "BEGIN;"
@@ -47,6 +48,12 @@ _SubscriberInfo Subscriber(sqlite3_stmt* row, int column)
     return {Text(row, column), Text(row, column + 1), Text(row, column + 2)};
 }
 
+/// Returns advice about a failure of a system call.
+const char* Advice(int cause)
+{
+    return cause == EACCES || cause == EPERM ? kPermit : cause == ENOSPC ? kMakeRoom : kNameAnother;
+}
+
 /// Returns advice about a failure of SQLite.
 const char* Advice(int code, int cause)
 {
@@ -55,7 +62,7 @@ const char* Advice(int code, int cause)
     if (code == SQLITE_BUSY)
         return kTryAgain;
     if (code == SQLITE_FULL || cause == ENOSPC)
-        return "make room on the disk";
+        return kMakeRoom;
     if (code == SQLITE_READONLY || code == SQLITE_CANTOPEN)
         return kPermit;
     return "check the disk and its file system";
@@ -78,7 +85,7 @@ void MakeFile(const std::string& path)
     if (file >= 0)
         close(file);
     else if (errno != EEXIST)
-        throw StoreTrouble(path, std::string("the file cannot be made: ") + g_strerror(errno), kPermit);
+        throw StoreTrouble(path, std::string("the file cannot be made: ") + g_strerror(errno), Advice(errno));
 }
 
 } // namespace
@@ -86,7 +93,7 @@ void MakeFile(const std::string& path)
 DirectoryLock::DirectoryLock(const std::string& path) : directory_(open(path.c_str(), O_RDONLY | O_DIRECTORY | O_CLOEXEC))
 {
     if (directory_ < 0)
-        throw StoreTrouble(path, g_strerror(errno), kPermit);
+        throw StoreTrouble(path, g_strerror(errno), Advice(errno));
     for (int waitedMs = 0; flock(directory_, LOCK_EX | LOCK_NB) != 0 && errno == EWOULDBLOCK; ++waitedMs)
     {
         if (waitedMs == kPatienceMs)
@@ -123,7 +130,7 @@ StoreConnection::StoreConnection(std::string path, Use use) : path_(std::move(pa
 {
     const g_autofree char* directory = g_path_get_dirname(path_.c_str());
     if (use == Use::Make && g_mkdir_with_parents(directory, 0700) != 0)
-        throw StoreTrouble(directory, std::string("the directory cannot be made: ") + g_strerror(errno), kPermit);
+        throw StoreTrouble(directory, std::string("the directory cannot be made: ") + g_strerror(errno), Advice(errno));
     if (use == Use::Change || use == Use::Make)
         lock_ = std::make_unique<DirectoryLock>(directory);
     if (use == Use::Make)
@@ -131,7 +138,7 @@ StoreConnection::StoreConnection(std::string path, Use use) : path_(std::move(pa
 
     // Before the file is opened, so that IsInPlace() and IsUpToDate() notice if it is replaced in between.
     if (stat(path_.c_str(), &file_) != 0)
-        throw StoreTrouble(path_, g_strerror(errno), errno == EACCES ? kPermit : kNameAnother);
+        throw StoreTrouble(path_, g_strerror(errno), Advice(errno));
     if (!S_ISREG(file_.st_mode))
         throw StoreTrouble(path_, "not a regular file", kNameAnother);
 
@@ -144,6 +151,27 @@ StoreConnection::StoreConnection(std::string path, Use use) : path_(std::move(pa
     if (result != SQLITE_OK)
         Fail();
     sqlite3_busy_timeout(db, kPatienceMs);
+}
+
+void StoreConnection::RequireChangeable(const std::string& path)
+{
+    struct stat file;
+    if (lstat(path.c_str(), &file) == 0 && access(path.c_str(), R_OK | W_OK) != 0)
+        throw StoreTrouble(path, std::string("the file cannot be changed: ") + g_strerror(errno), Advice(errno));
+
+    std::string directory = path;
+    do
+    {
+        const g_autofree char* above = g_path_get_dirname(directory.c_str());
+        directory = above;
+    } while (stat(directory.c_str(), &file) != 0 && errno == ENOENT); // missing ones are made together with the store
+    // Only an attempt shows whether the file system and the user's rights allow new files.
+    std::string attempt = directory + "/.kiv-XXXXXX";
+    const int made = mkostemp(attempt.data(), O_CLOEXEC);
+    if (made < 0)
+        throw StoreTrouble(directory, std::string("no file can be made there: ") + g_strerror(errno), Advice(errno));
+    unlink(attempt.c_str());
+    close(made);
 }
 
 /// Whether the log can be read. For that, SQLite must be able to write a file next to the store.

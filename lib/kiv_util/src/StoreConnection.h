@@ -62,6 +62,9 @@ public:
     /// Opens the store at an absolute path; null if there is none.
     static std::unique_ptr<StoreConnection> Open(const std::string& path, Use use);
 
+    /// Throws StoreTrouble unless the store at an absolute path can be changed, or made if there is none. Changes nothing.
+    static void RequireChangeable(const std::string& path);
+
     /// Whether the opened file is still the one at its path.
     bool IsInPlace() const;
 
