@@ -76,6 +76,20 @@ inline Outcome Kivctl(const std::string& arguments)
     return Outcome(KIVCTL " " + arguments);
 }
 
+/// Every verb, with the words before it. The first one is the program itself, as an empty text.
+inline std::vector<std::string> Verbs()
+{
+    std::vector<std::string> verbs{""};
+    const std::regex rows("\n  ([a-z]+)  ");
+    for (size_t i = 0; i < verbs.size(); ++i)
+    {
+        const std::string verb = verbs[i], help = Kivctl(verb + " --help").out;
+        for (std::sregex_iterator row(help.begin(), help.end(), rows), end; row != end; ++row)
+            verbs.push_back(verb + (verb.empty() ? "" : " ") + row->str(1));
+    }
+    return verbs;
+}
+
 /// Each test has its own bus, subscriber store and directory.
 struct KivctlTest : testing::Test
 {

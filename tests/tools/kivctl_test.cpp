@@ -143,15 +143,32 @@ std::vector<std::string> OnTerminal(const std::string& columns, const std::strin
     return {std::sregex_token_iterator(out.begin(), out.end(), ends, -1), std::sregex_token_iterator()};
 }
 
-TEST_F(KivctlTest, PrintsNoLineThatIsWiderThanTheTerminal)
+/// The words of a text, in which "," and "|" end a word too.
+std::vector<std::string> Words(const std::string& text)
 {
-    for (const char* columns : {"80", "40"})
+    const std::regex ends("[\\s,|]+");
+    return {std::sregex_token_iterator(text.begin(), text.end(), ends, -1), std::sregex_token_iterator()};
+}
+
+TEST_F(KivctlTest, WrapsLinesAtTheWidthOfTheTerminal)
+{
+    std::vector<std::string> commands{"notify wrong", "sim", "device", "device keys", "-p pin-required sim"};
+    for (const std::string& verb : Verbs())
+        commands.push_back(verb + " --help");
+    for (const std::string columns : {"80", "40"})
     {
-        for (const char* arguments : {"--color never sim", "--color never device", "--color never device keys", "--help",
-                 "notify --help", "notify wrong", "--color never -p pin-required sim"})
+        for (const std::string& arguments : commands)
         {
-            for (const std::string& line : OnTerminal(columns, arguments))
+            std::string printed;
+            for (const std::string& line : OnTerminal(columns, "--color never " + arguments))
+            {
                 EXPECT_LE(line.size(), std::stoul(columns)) << arguments << "\n" << line;
+                printed += line + '\n';
+            }
+            if (arguments.find("--help") != arguments.npos)
+            {
+                EXPECT_EQ(Words(Kivctl(arguments).out), Words(printed));
+            }
         }
     }
     EXPECT_EQ((std::vector<std::string>{"slot  0", "card  ready", "", "slot  1", "card  ready"}),
@@ -160,6 +177,19 @@ TEST_F(KivctlTest, PrintsNoLineThatIsWiderThanTheTerminal)
         OnTerminal("80", "--color never --fields slot,card sim"));
     EXPECT_THAT(OnTerminal("40", "sim --help"), testing::IsSupersetOf({"  --slot N", "    Use only this slot, counted from 0"}));
     EXPECT_THAT(OnTerminal("80", "--help"), testing::Contains(std::string(28, ' ') + "(default: auto)"));
+
+    EXPECT_THAT(OnTerminal("20", "push m --data d --message m"), testing::Contains("  delivered=0"));
+
+    // A word that is longer than its column begins further left; one that is longer than the line ends after a slash.
+    const std::string word = "./" + std::string(35, 'w'), folder(20, 'd'), file(25, 'f');
+    std::filesystem::create_directory(folder);
+    for (const auto& [device, lines] :
+        {std::pair<std::string, std::vector<std::string>>(word, {"finding  file", "  " + word + ","}),
+            {"./" + folder + "/" + file, {"finding  file ./" + folder + "/", "         " + file + ", two"}}})
+    {
+        Kivctl("device set runtime.flight-mode=false -p " + device);
+        EXPECT_THAT(OnTerminal("40", "doctor --color never --fields finding -p " + device), testing::IsSupersetOf(lines));
+    }
 }
 
 TEST_F(KivctlTest, PausesBetweenTwoChecksWhileItWaitsForASim)

@@ -30,16 +30,23 @@ size_t BytesThatFit(const std::string& text, size_t width)
     return static_cast<size_t>(at - begin);
 }
 
+/// Number of bytes up to and including the last of the marks within those that fit; 0 when there is none.
+size_t EndAfter(const char* marks, const std::string& line, size_t fits)
+{
+    return line.find_last_of(marks, fits - 1) + 1;
+}
+
 /// Where the description in a line of help begins: after two or more blanks, or in the column of descriptions when the heading ends
-/// right before it. The line's indentation when there is no description.
+/// right before it. Where a line without a description continues: below its beginning, a heading a little to the right.
 size_t DescriptionBegin(const std::string& line, size_t column)
 {
     const size_t heading = std::min(line.find_first_not_of(' '), line.size());
     const size_t gap = line.find("  ", heading);
     if (gap != line.npos)
         return std::min(line.find_first_not_of(' ', gap), line.size());
-    const bool isFullHeading = heading > 0 && heading < column && line.size() > column && line[column - 1] == ' ';
-    return isFullHeading ? column : heading;
+    if (heading == 0 || heading >= column)
+        return heading;
+    return line.size() > column && line[column - 1] == ' ' ? column : heading + 4;
 }
 
 } // namespace
@@ -68,16 +75,30 @@ std::vector<std::string> Wrapped(const std::string& text, size_t width, size_t i
 {
     std::vector<std::string> lines;
     std::string line = text;
+    bool isSplit = false; // the line begins with the rest of a word
     indent = std::min(indent, width / 2);
     while (Width(line) > width)
     {
+        const size_t begin = std::min(line.find_first_not_of(' '), line.size());
         const size_t fits = BytesThatFit(line, width);
-        size_t end = line.rfind(' ', fits);
-        if (end == line.npos || end <= std::max(indent, line.find_first_not_of(' ')))
-            end = fits;
-        const size_t next = std::min(line.find_first_not_of(' ', end), line.size());
-        lines.push_back(line.substr(0, end));
-        line = std::string(indent, ' ') + line.substr(next);
+        const size_t blank = line.find_last_of(' ', fits);
+        const bool hasBlank = blank != line.npos && blank > begin;
+        const size_t word = hasBlank ? std::min(line.find_first_not_of(' ', blank), line.size()) : begin; // that does not fit
+        const size_t columns = Width(line.substr(word, line.find(' ', word) - word));
+        const bool staysWhole = columns <= width && (hasBlank || !isSplit);
+        size_t end = hasBlank ? blank : 0;
+        const size_t mark = EndAfter(staysWhole ? ",|" : ",|/", line, fits);
+        if (mark > word + 1 && !(hasBlank && staysWhole))
+            end = mark;
+        if (end == 0 && staysWhole && begin > 0)
+        {
+            line.erase(0, begin + columns - width); // the word begins further left
+            continue;
+        }
+        end = end == 0 ? fits : end;
+        isSplit = line[end] != ' ';
+        lines.push_back(line.substr(0, line.find_last_not_of(' ', end - 1) + 1));
+        line.replace(0, std::min(line.find_first_not_of(' ', end), line.size()), indent, ' ');
     }
     lines.push_back(std::move(line));
     return lines;
@@ -87,7 +108,8 @@ std::vector<std::string> WrappedBehindHeading(const std::string& text, size_t wi
 {
     constexpr size_t kReadable = 20; // columns
     constexpr size_t kNarrowIndent = 4;
-    if (Width(text) <= width || indent == 0 || indent + kReadable <= width)
+    const bool hasHeading = indent > 0 && indent <= text.size() && text[indent - 1] == ' ';
+    if (Width(text) <= width || !hasHeading || indent + kReadable <= width)
         return Wrapped(text, width, indent);
     const std::string heading = text.substr(0, text.find_last_not_of(' ', indent - 1) + 1);
     std::vector<std::string> lines = heading.empty() ? std::vector<std::string>() : Wrapped(heading, width, kNarrowIndent);

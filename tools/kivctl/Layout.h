@@ -21,7 +21,8 @@ size_t Width(const std::string& text);
 /// Pads a text with blanks to a width.
 std::string Padded(const std::string& text, size_t width);
 
-/// Breaks a text into lines of at most `width` columns, at blanks where possible.
+/// Breaks a text into lines of at most `width` columns: at blanks, or else after a comma or "|". A word that is longer than the
+/// room in a line begins further left. Only a word that is longer than a line is split, after a slash if there is one.
 /// @param indent  number of blanks before each line but the first; less than `width`
 std::vector<std::string> Wrapped(const std::string& text, size_t width, size_t indent = 0);
 

@@ -322,13 +322,16 @@ void PrintTable(const std::vector<Record>& records, const Form& form)
 
 void PrintLine(const Record& record, const Form& form)
 {
-    std::string line;
+    std::string text;
     if (form.notation == Form::Notation::Json)
-        line = Dump(ToJson(record), -1);
+        text = Dump(ToJson(record), -1);
     else
+    {
         for (const Field& field : record)
-            line += line.empty() ? CellText(field) : " " + field.name + "=" + LineText(field.value);
-    Write(line + '\n');
+            text += text.empty() ? CellText(field) : " " + field.name + "=" + LineText(field.value);
+        text = Joined(Wrapped(text, TerminalWidth(STDOUT_FILENO), 2), "\n");
+    }
+    Write(text + '\n');
     if (kiv::StandardOutput::Error() != 0)
         g_main_context_wakeup(nullptr); // a main loop that only serves the output then ends
 }
