@@ -1,6 +1,8 @@
 #include "support/Peer.h"
 #include "tools/KivctlTest.h"
 
+#include <gio/gunixsocketaddress.h>
+
 namespace kiv::test
 {
 namespace
@@ -19,23 +21,24 @@ TEST_F(KivctlTest, CarriesEveryNotificationToItsReceivers)
 
     const std::pair<std::string, const char*> cases[] = {
         {"activated", "activated imsi='1' active=1\n"},
-        {"auth", "auth imsi='1' success=1\n"},
         {"auth-fail", "auth imsi='1' success=0\n"},
         {"auth-success", "auth imsi='1' success=1\n"},
         {"deactivated", "activated imsi='1' active=0\n"},
-        {"number-changed --texts w x y z", "number_changed imsi='1' text1='w' text2='x' text3='y' text4='z'\n"},
         {"number_changed --texts a b c d", "number_changed imsi='1' text1='a' text2='b' text3='c' text4='d'\n"},
         {"off --service 7", "status imsi='1' service_id=7 status='off'\n"},
         {"on --service 7", "status imsi='1' service_id=7 status='on'\n"},
         {"policy --service 7 --texts w x y z",
             "policy imsi='1' service_id=7 service_status='w' policy_feature='x' policy_version='y' policy_doc_url='z'\n"},
+        {"auth", "auth imsi='1' success=1\n"}, // from here on, other words for these events
+        {"number-changed --texts w x y z", "number_changed imsi='1' text1='w' text2='x' text3='y' text4='z'\n"},
         {"status --service 7", "status imsi='1' service_id=7 status='on'\n"},
     };
     std::string types = "expected one of";
+    bool isListed = true;
     for (const auto& [arguments, call] : cases)
     {
-        const std::string type = arguments.substr(0, arguments.find(' '));
-        types += type == "number_changed" ? "" : ' ' + type + ','; // the other spelling of a type
+        isListed = isListed && arguments != "auth";
+        types += isListed ? ' ' + arguments.substr(0, arguments.find(' ')) + ',' : "";
         const Outcome sent = Kivctl("notify --imsi 1 " + arguments);
         EXPECT_EQ("sent subscribers=1 delivered=1\n", sent.out) << arguments << "\n" << sent.err;
         all.Await(call);

@@ -44,9 +44,37 @@ std::string Footer()
     return text;
 }
 
-constexpr char kVerbFooter[] = R"(Options of every verb: --json, --color WHEN, --profile NAME|FILE
-Options of every query: --terse, --fields NAME,NAME
-kivctl --help describes these options, the exit codes and the environment.)";
+constexpr char kVerbFooter[] = "Options of every verb: --json, --color WHEN, --profile NAME|FILE\n"
+                               "kivctl --help describes these options, the exit codes and the environment.";
+
+/// Describes options and operands as this program's help does.
+class HelpFormatter : public CLI::Formatter
+{
+public:
+    HelpFormatter()
+    {
+        column_width(kHelpColumn);
+        label("SUBCOMMAND", "VERB");
+        label("Positionals", "Operands");
+    }
+
+    std::string make_option_name(const CLI::Option* option, bool isOperand) const override
+    {
+        return CLI::detail::find_and_replace(Formatter::make_option_name(option, isOperand), ",", ", ");
+    }
+
+    std::string make_option_opts(const CLI::Option* option) const override
+    {
+        std::string text;
+        const bool isOperand = option->get_positional(); // the usage shows whether it may be left out
+        const bool isNamedAfterValue = isOperand && option->get_type_name() == "TEXT";
+        for (int i = 0; i < option->get_items_expected_min() && option->get_type_size() != 0 && !isNamedAfterValue; ++i)
+            text += " " + option->get_type_name();
+        if (option->get_items_expected_max() > option->get_items_expected_min())
+            text += " ...";
+        return text + (option->get_required() && !isOperand ? " (required)" : "");
+    }
+};
 
 OptionManual Describe(const CLI::Option& option, const CLI::Formatter& formatter)
 {
@@ -116,7 +144,8 @@ void AddGlobalOptions(CLI::App& app, Command& command)
         "-j,--json", [&form] { form.notation = Form::Notation::Json; }, "Print JSON; for events, one object per line");
     app.add_flag_callback(
            "-t,--terse", [&form] { form.notation = Form::Notation::Terse; },
-           "In queries, print only values, one record per line, separated by \":\" (\":\" in a value becomes \"\\:\")")
+           "In queries, print only values, one record per line, separated by \":\" (\":\" in a value becomes \"\\:\"); not with "
+           "--json")
         ->excludes(json);
     app.add_option_function<std::string>(
            "--fields", [&form](const std::string& text) { form.fields = FieldNames(text); },
@@ -161,24 +190,24 @@ Place FindPlace(const CLI::App& program)
     return place;
 }
 
-/// Rewords the parser's messages about missing values.
-std::string Plain(const std::string& text)
+/// The parser's message in the words of this program.
+std::string Reworded(const CLI::App& verb, const CLI::ParseError& error)
 {
-    const std::string atLeast = ": At least ", received = " required but received ";
-    if (const size_t least = text.find(atLeast), but = text.find(received); least != text.npos && but != text.npos)
-    {
-        const size_t count = least + atLeast.size();
-        return text.substr(0, least) + " needs " + text.substr(count, but - count) + " values, not " +
-               text.substr(but + received.size());
-    }
-    const std::string number = " required ", missing = " missing";
-    const size_t name = text.find(": "), words = text.find(number);
-    if (name == text.npos || words == text.npos || text.rfind(missing) != text.size() - missing.size())
+    const std::string text = error.what();
+    if (dynamic_cast<const CLI::ExcludesError*>(&error) != nullptr)
+        return CLI::detail::find_and_replace(text, "excludes", "cannot be used with");
+    const std::string name = text.substr(0, text.find_first_of(": "));
+    if (text.find("disallowed flag override") != text.npos) // names the flag without its dashes
+        return (name.size() > 1 ? "--" : "-") + name + " takes no value";
+    const CLI::Option* option = nullptr;
+    for (const CLI::App* app = &verb; app != nullptr && option == nullptr; app = app->get_parent())
+        option = app->get_option_no_throw(name);
+    if (option == nullptr || dynamic_cast<const CLI::ArgumentMismatch*>(&error) == nullptr)
         return text;
-    const std::string count = text.substr(name + 2, words - name - 2);
-    const size_t type = words + number.size();
-    return text.substr(0, name) + (count == "1" ? " needs a value: " : " needs " + count + " values: ") +
-           text.substr(type, text.rfind(missing) - type);
+    const int least = option->get_items_expected_min();
+    if (least > 1)
+        return name + " needs " + std::to_string(least) + " values, not " + std::to_string(option->count());
+    return name + (option->count() == 0 ? " needs a value: " + option->get_type_name() : " is given more than once");
 }
 
 /// Says what is wrong with the command line and what is expected. Reports an unknown word first, because it causes other errors.
@@ -195,8 +224,9 @@ std::string Explain(const CLI::App& program, const CLI::ParseError& error)
         return "unexpected word \"" + unknown.front() + "\" after " + place.verb + more;
     if (!unknown.empty())
         return "unknown verb \"" + unknown.front() + "\" of " + place.verb + DidYouMean(unknown.front(), place.verbs) + more;
-    const bool lacksVerb = place.app->get_require_subcommand_min() > 0 && place.app->get_subcommands().empty();
-    return (lacksVerb ? "missing verb; expected one of " + Joined(place.verbs, ", ") : Plain(error.what())) + more;
+    const bool lacksVerb = dynamic_cast<const CLI::RequiredError*>(&error) != nullptr &&
+                           place.app->get_require_subcommand_min() > 0 && place.app->get_subcommands().empty();
+    return (lacksVerb ? "missing verb; expected one of " + Joined(place.verbs, ", ") : Reworded(*place.app, error)) + more;
 }
 
 /// Refuses the wrong fields before the verb runs, because some verbs take long.
@@ -215,16 +245,12 @@ void CheckForm(const CLI::App& program, const Command& command)
 
 void ReadCommandLine(int argc, char** argv, Command& command)
 {
-    const auto formatter = std::make_shared<CLI::Formatter>();
-    formatter->column_width(kHelpColumn);
-    formatter->label("REQUIRED", "(required)");
-    formatter->label("SUBCOMMAND", "VERB");
-    formatter->label("Excludes", "Not with");
-    formatter->label("Positionals", "Operands");
+    const auto formatter = std::make_shared<HelpFormatter>();
     CLI::App app(kAbout, "kivctl");
     app.formatter(formatter);
     app.footer(kVerbFooter);
     app.fallthrough();
+    app.option_defaults()->disable_flag_override();
     app.require_subcommand(1);
     AddGlobalOptions(app, command);
     AddVerbs(app, command);

@@ -10,48 +10,50 @@
 
 #include <algorithm>
 #include <array>
-#include <map>
+#include <iterator>
 
 namespace
 {
 
-/// The types by name. The name of a kind means its usual type.
-const std::map<std::string, _KIV_NOTI_TYPE_E> kTypes = {
-    {"auth", KIV_NOTI_TYPE_AUTH_SUCCESS},
-    {"auth-success", KIV_NOTI_TYPE_AUTH_SUCCESS},
-    {"auth-fail", KIV_NOTI_TYPE_AUTH_FAIL},
-    {"on", KIV_NOTI_TYPE_STATUS_ON},
-    {"status", KIV_NOTI_TYPE_STATUS_ON},
-    {"off", KIV_NOTI_TYPE_STATUS_OFF},
-    {"policy", KIV_NOTI_TYPE_POLICY},
-    {"activated", KIV_NOTI_TYPE_ACTIVATED},
-    {"deactivated", KIV_NOTI_TYPE_DEACTIVATED},
-    {"number-changed", KIV_NOTI_TYPE_NUMBER_CHANGED},
+/// An event that can be sent, and the kind of the subscriptions that receive it.
+struct Type
+{
+    const char* word;
+    _KIV_NOTI_TYPE_E type;
+    const char* kind;
 };
 
-bool IsSwitch(const std::string& type)
+constexpr Type kTypes[] = {
+    {"activated", KIV_NOTI_TYPE_ACTIVATED, "activated"},
+    {"auth-fail", KIV_NOTI_TYPE_AUTH_FAIL, "auth"},
+    {"auth-success", KIV_NOTI_TYPE_AUTH_SUCCESS, "auth"},
+    {"deactivated", KIV_NOTI_TYPE_DEACTIVATED, "activated"},
+    {"number_changed", KIV_NOTI_TYPE_NUMBER_CHANGED, "number_changed"},
+    {"off", KIV_NOTI_TYPE_STATUS_OFF, "status"},
+    {"on", KIV_NOTI_TYPE_STATUS_ON, "status"},
+    {"policy", KIV_NOTI_TYPE_POLICY, "policy"},
+};
+
+const Type& TypeOf(const std::string& word)
 {
-    return type == "on" || type == "off" || type == "status";
+    return *std::find_if(std::begin(kTypes), std::end(kTypes), [&word](const Type& type) { return word == type.word; });
 }
 
-/// The kind and key of the subscriptions that receive a type.
-struct Audience
+bool IsSwitch(const std::string& word)
 {
-    const char* kind;
-    std::string key;
-};
+    return std::string("status") == TypeOf(word).kind;
+}
 
-Audience AudienceOf(const NotifyOptions& options)
+/// The key of the subscriptions that receive the event; empty for several events, whose keys differ.
+std::string KeyOf(const NotifyOptions& options)
 {
-    const std::string& type = options.types.front();
-    if (IsSwitch(type) || type == "policy")
-        return {type == "policy" ? "policy" : "status", std::to_string(options.services.front())};
-    return {type.rfind("auth", 0) == 0 ? "auth" : type == "number-changed" ? "number_changed" : "activated", "all"};
+    const size_t services = options.services.size();
+    return services == 0 ? "all" : services == 1 ? std::to_string(options.services.front()) : "";
 }
 
 bool TakesTexts(const std::string& type)
 {
-    return type == "policy" || type == "number-changed";
+    return type == "policy" || type == "number_changed";
 }
 
 void Require(bool holds, const char* text)
@@ -72,7 +74,7 @@ void CheckOptions(const NotifyOptions& options)
                                                  : services  ? "\"policy\" needs one --service"
                                                              : "only \"on\", \"off\" and \"policy\" have a --service");
     Require(options.texts.size() == (TakesTexts(first) ? 4 : 0),
-        "\"policy\" and \"number-changed\" need four --texts; the others have none");
+        "\"policy\" and \"number_changed\" need four --texts; the others have none");
 }
 
 /// The result of the call to one subscriber.
@@ -117,8 +119,7 @@ std::string Explained(const Delivery& delivery, const NotifyOptions& options, bo
 {
     if (wasMissed && IsClosed(delivery.trouble))
         return "no answer in time";
-    const Audience audience = AudienceOf(options);
-    return DeliveryTrouble(delivery.trouble, audience.kind, audience.key, delivery.busName);
+    return DeliveryTrouble(delivery.trouble, TypeOf(options.types.front()).kind, KeyOf(options), delivery.busName);
 }
 
 /// Sends the notifications through the facade. @return its result code
@@ -127,13 +128,12 @@ int SendToSubscribers(const NotifyOptions& options, std::string imsi, const std:
     DASystem* const system = DASystem::GetInstance();
     if (options.types.size() == 1)
     {
-        return system->SendNotiToServiceManager(kTypes.at(options.types.front()), imsi.c_str(),
+        return system->SendNotiToServiceManager(TypeOf(options.types.front()).type, imsi.c_str(),
             options.services.empty() ? 0 : options.services.front(), texts[0], texts[1], texts[2], texts[3]);
     }
     std::vector<int> services = options.services;
     std::vector<std::string> words = options.types;
     std::vector<char*> statuses(words.size());
-    std::replace(words.begin(), words.end(), std::string("status"), std::string("on"));
     std::transform(words.begin(), words.end(), statuses.begin(), [](std::string& word) { return word.data(); });
     return system->SendMultiOnOffNotiToServiceManager(
         imsi.c_str(), static_cast<int>(statuses.size()), services.data(), statuses.data());
@@ -189,7 +189,7 @@ Exit NotifyManager(const NotifyOptions& options, const std::string& imsi, const 
     RequireSuccess(connection != nullptr ? 0 : code, log.Errors());
 
     Deadline deadline(connection, options.timeout);
-    code = DADBusManager::GetInstance()->SendNotiToServiceManager(kTypes.at(options.types.front()), imsi.c_str(),
+    code = DADBusManager::GetInstance()->SendNotiToServiceManager(TypeOf(options.types.front()).type, imsi.c_str(),
         options.services.empty() ? 0 : options.services.front(), texts[0], texts[1], texts[2], texts[3]);
     if (deadline.WasMissed() && code != 0)
         throw Failure(Exit::TimeUp, "the service manager did not answer in time");
@@ -215,9 +215,14 @@ std::string Imsi(const NotifyOptions& options)
 
 std::vector<std::string> NotificationTypes()
 {
-    std::vector<std::string> words(kTypes.size());
-    std::transform(kTypes.begin(), kTypes.end(), words.begin(), [](const auto& type) { return type.first; });
+    std::vector<std::string> words(std::size(kTypes));
+    std::transform(std::begin(kTypes), std::end(kTypes), words.begin(), [](const Type& type) { return type.word; });
     return words;
+}
+
+std::string KindOf(const std::string& type)
+{
+    return TypeOf(type).kind;
 }
 
 Exit Notify(const NotifyOptions& options, const Command& command)

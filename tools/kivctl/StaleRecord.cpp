@@ -41,7 +41,7 @@ std::string DeliveryTrouble(const std::string& trouble, const std::string& kind,
         const _SubscriberInfo& who = subscription.subscriber;
         const bool isNamed =
             busName.empty() ? trouble.find("The name " + who.busname + " ") != trouble.npos : who.busname == busName;
-        if (subscription.kind != kind || subscription.key != key || !isNamed)
+        if (subscription.kind != kind || (!key.empty() && subscription.key != key) || !isNamed)
             continue;
         return "nobody on the bus owns the name, and nothing starts it; start the service, or remove its record: " +
                RemovalOf(subscription);

@@ -7,44 +7,32 @@
 #include <DASubscriberStore.h>
 
 #include <algorithm>
+#include <charconv>
 #include <cmath>
+#include <limits>
+#include <type_traits>
 #include <utility>
 
 namespace
 {
 
-/// Checks an option's text. @return what is wrong with it; empty when it is right
+/// Limits an option to numbers, in decimal notation.
+/// @param expected  describes them
 template <typename Number>
-std::string Check(const std::string& text, bool mayBeNegative, const char* expected)
+CLI::Validator Numbers(Number least, const std::string& expected)
 {
-    Number number{};
-    const bool isNumber = CLI::detail::lexical_cast(text, number) && std::isfinite(static_cast<double>(number));
-    return isNumber && (mayBeNegative || number >= 0) ? "" : '"' + text + "\" is invalid; expected " + expected;
-}
-
-std::string IsNumber(const std::string& text)
-{
-    return Check<double>(text, true, "a number");
-}
-
-std::string IsZeroOrMore(const std::string& text)
-{
-    return Check<double>(text, false, "0 or a positive number");
-}
-
-std::string IsWhole(const std::string& text)
-{
-    return Check<std::int64_t>(text, true, "a 64-bit whole number");
-}
-
-std::string IsServiceId(const std::string& text)
-{
-    return Check<int>(text, true, "a 32-bit whole number");
-}
-
-std::string IsSlot(const std::string& text)
-{
-    return Check<int>(text, false, "0 or a positive whole number");
+    const auto check = [least, expected](std::string& text) -> std::string
+    {
+        Number number{};
+        const char* const end = text.data() + text.size();
+        const auto [stop, error] = std::from_chars(text.data(), end, number);
+        if (error != std::errc() || stop != end || !std::isfinite(static_cast<double>(number)) || number < least)
+            return '"' + text + "\" is invalid; expected " + expected;
+        if constexpr (std::is_integral_v<Number>)
+            text = std::to_string(number); // the parser reads leading zeros as octal notation
+        return "";
+    };
+    return CLI::Validator(check, "");
 }
 
 /// Refuses options of a verb when a verb below it runs, which ignores them.
@@ -70,7 +58,8 @@ CLI::App* AddToHelp(CLI::App& app, const char* name, const char* help)
 void AddFields(CLI::App* verb, Command& command, const std::vector<std::string>& fields)
 {
     command.fields[verb] = fields;
-    verb->footer([fields] { return "Fields: " + Joined(fields, ", "); });
+    verb->footer([fields, rest = verb->get_footer()]
+        { return "Fields: " + Joined(fields, ", ") + "\nOptions of every query: --terse, --fields NAME,NAME\n" + rest; });
 }
 
 /// Adds a verb with options of its own, which live as long as the command.
@@ -114,6 +103,15 @@ void AddShowIds(CLI::App* verb, Command& command, const char* help)
         "--show-ids", [&command] { command.identifiers = Identifiers::Shown; }, help);
 }
 
+/// Limits the option to the kinds of events; each type of an event means its kind.
+void RestrictToKinds(CLI::Option* option)
+{
+    std::map<std::string, std::string> kinds;
+    for (const std::string& type : NotificationTypes())
+        kinds[type] = KindOf(type);
+    Restrict(option, DASubscriberStore::Kinds(), kinds);
+}
+
 void AddCountry(CLI::App& app, Command& command)
 {
     const auto [verb, options] = AddVerb(app, command, "country", "Show the data about a country", ShowCountry);
@@ -134,10 +132,9 @@ void AddDevice(CLI::App& app, Command& command)
     AddShowIds(device, command, "Show serial number, IMEI and platform device ID unmasked");
     device->add_option("--package", options->package, "Also show whether this package is installed, and its version")
         ->type_name("ID");
-    device->add_option("--storage", options->storageMiB, "Check that more than this is free in the internal storage")
+    device->add_option("--storage", options->storageMiB, "Check that more than this is free in the internal storage (default: 100)")
         ->type_name("MIB")
-        ->capture_default_str()
-        ->check(IsNumber);
+        ->transform(Numbers(std::numeric_limits<double>::lowest(), "a number"));
     AddFields(AddVerb(*device, command, "id", "Read the device unique ID from the device daemon on the bus", ShowDeviceId), command,
         {"device_id"});
 
@@ -170,7 +167,11 @@ void AddDevice(CLI::App& app, Command& command)
 void AddSim(CLI::App& app, Command& command)
 {
     const auto addSlot = [](CLI::App* verb, SimOptions& options)
-    { verb->add_option("--slot", options.slot, "Use only this slot, counted from 0")->type_name("N")->check(IsSlot); };
+    {
+        verb->add_option("--slot", options.slot, "Use only this slot, counted from 0")
+            ->type_name("N")
+            ->transform(Numbers(0, "0 or a positive whole number"));
+    };
 
     const auto [sim, options] = AddVerb(app, command, "sim", "List the SIMs, one row per slot", ShowSims);
     AddFields(sim, command,
@@ -185,7 +186,7 @@ void AddSim(CLI::App& app, Command& command)
     addSlot(wait, *waitOptions);
     wait->add_option("--timeout", waitOptions->timeout, "Maximum wait in seconds (default: as long as a SIM may become usable)")
         ->type_name("SECONDS")
-        ->check(IsZeroOrMore);
+        ->transform(Numbers(0.0, "0 or a positive number"));
 }
 
 void AddNetwork(CLI::App& app, Command& command)
@@ -195,7 +196,7 @@ void AddNetwork(CLI::App& app, Command& command)
     AddFields(verb, command, {"cellular", "wifi", "bluetooth", "connected"});
     verb->add_flag("--wifi", options->countsWifi, "Also count Wi-Fi as a connection");
     verb->add_flag("--bluetooth,--bt", options->countsBluetooth, "Also count Bluetooth as a connection");
-    AddVerb(app, command, "watch", "Print changes of the network and the SIMs until Ctrl-C", Watch);
+    AddVerb(app, command, "watch", "Print changes of the network and the SIMs until Ctrl-C; reads the SIMs once a second", Watch);
 }
 
 void AddNotify(CLI::App& app, Command& command)
@@ -203,23 +204,23 @@ void AddNotify(CLI::App& app, Command& command)
     const auto [verb, options] =
         AddVerb(app, command, "notify", "Send an event to the subscribers or to the service manager", Notify);
     Restrict(verb->add_option("TYPE", options->types,
-                     "Event to send; \"status\" means on, \"auth\" means auth-success; on and off may be repeated, each with its "
-                     "--service")
+                     "Event to send; on and off may be repeated, each with its --service. A kind is accepted too: status means on, "
+                     "auth means auth-success")
                  ->required(),
-        NotificationTypes());
-    Restrict(verb->add_option("--to", options->to, "Receivers of the event")->capture_default_str(), {"subscribers", "manager"});
+        NotificationTypes(), {{"status", "on"}, {"auth", "auth-success"}});
+    Restrict(verb->add_option("--to", options->to, "Receivers of the event (default: subscribers)"), {"subscribers", "manager"});
     verb->add_option("--imsi", options->imsi, "Subscriber that the event is about (default: the first SIM that answers)")
         ->type_name("IMSI");
     verb->add_option("--service", options->services, "Service ID, for on, off and policy; one per TYPE")
         ->type_name("ID")
-        ->check(IsServiceId);
+        ->transform(Numbers(std::numeric_limits<int>::min(), "a 32-bit whole number"));
     verb->add_option("--texts", options->texts,
-            "Texts of the event; policy: status, feature, version, document URL; number-changed: any four")
+            "Texts of the event; policy: status, feature, version, document URL; number_changed: any four")
         ->type_name("TEXT")
         ->expected(4);
     verb->add_option("--timeout", options->timeout, "Maximum wait for all answers in seconds, then exit code 3 (default: no limit)")
         ->type_name("SECONDS")
-        ->check(IsZeroOrMore);
+        ->transform(Numbers(0.0, "0 or a positive number"));
 }
 
 void AddPush(CLI::App& app, Command& command)
@@ -231,15 +232,15 @@ void AddPush(CLI::App& app, Command& command)
     verb->add_option("--message", options->message, "Message for the user")->required();
     verb->add_option("--time", options->time, "Time of sending, a 64-bit number (default: now, in seconds since 1970)")
         ->type_name("NUMBER")
-        ->check(IsWhole);
+        ->transform(Numbers(std::numeric_limits<std::int64_t>::min(), "a 64-bit whole number"));
 }
 
 void AddSubscribe(CLI::App& app, Command& command)
 {
     const auto [verb, options] =
         AddVerb(app, command, "subscribe", "Run a client service that prints each event until Ctrl-C", Subscribe);
-    Restrict(
-        verb->add_option("--kind", options->kinds, "Kind of event to subscribe to; may be repeated"), DASubscriberStore::Kinds());
+    RestrictToKinds(verb->add_option("--kind", options->kinds,
+        "Kind of event to subscribe to; may be repeated. A TYPE of notify is accepted too, such as on for status"));
     verb->add_option("--key", options->key, "Service to subscribe to: a number for policy and status, a name for push")
         ->type_name("SERVICE");
     verb->add_option("--push", options->pushes, "Same as --kind push --key SERVICE")->type_name("SERVICE");
@@ -256,7 +257,9 @@ void AddSubscribers(CLI::App& app, Command& command)
 
     const auto addFields = [](CLI::App* verb, SubscriptionOptions& options)
     {
-        Restrict(verb->add_option("KIND", options.kind, "Kind of event")->required(), DASubscriberStore::Kinds());
+        RestrictToKinds(
+            verb->add_option("KIND", options.kind, "Kind of event; a TYPE of notify is accepted too, such as on for status")
+                ->required());
         verb->add_option("KEY", options.key, "Service ID for policy and status, service name for push, or \"all\"")->required();
         verb->add_option("BUS_NAME", options.busName, "Bus name of the client service, such as org.example.Client")->required();
         verb->add_option("OBJECT_PATH", options.objectPath, "Path of its object, such as /org/example/Client")->required();
@@ -285,18 +288,19 @@ void AddDoctor(CLI::App& app, Command& command)
 
 } // namespace
 
-/// Limits the option to these words; "-" and "_" are the same in them.
-void Restrict(CLI::Option* option, const std::vector<std::string>& words)
+void Restrict(CLI::Option* option, const std::vector<std::string>& words, std::map<std::string, std::string> meanings)
 {
-    const auto check = [words](std::string& typed) -> std::string
+    for (const std::string& word : words)
+        meanings[word] = word;
+    const auto check = [words, meanings](std::string& typed) -> std::string
     {
         const auto same = [](char one, char other)
         { return one == other || (one == '-' && other == '_') || (one == '_' && other == '-'); };
-        for (const std::string& word : words)
+        for (const auto& [word, meaning] : meanings)
         {
             if (std::equal(typed.begin(), typed.end(), word.begin(), word.end(), same))
             {
-                typed = word;
+                typed = meaning;
                 return "";
             }
         }

@@ -16,6 +16,7 @@ inline constexpr char kOr[] = "|";
 void AddVerbs(CLI::App& app, Command& command);
 
 /// Limits the option to these words; "-" and "_" are the same in them.
-void Restrict(CLI::Option* option, const std::vector<std::string>& words);
+/// @param meanings  other words that are accepted, and the word that each stands for
+void Restrict(CLI::Option* option, const std::vector<std::string>& words, std::map<std::string, std::string> meanings = {});
 
 #endif

@@ -95,6 +95,7 @@ struct NotifyOptions
     std::optional<double> timeout; ///< seconds
 };
 std::vector<std::string> NotificationTypes();
+std::string KindOf(const std::string& type); ///< of the subscriptions that receive it
 Exit Notify(const NotifyOptions& options, const Command& command);
 /// @}
 
