@@ -33,8 +33,8 @@ try
     if (argc > 1)
         return Fail("unexpected argument; --help lists the options");
 
+    const std::unique_ptr<BusParty> service = start(); // until then a signal ends the process: a bus may never answer
     StopSignals signals;
-    const std::unique_ptr<BusParty> service = start();
     StandardOutput::Write("ready bus_names=" + service->Name() + '\n'); // the same line as kivctl services prints
     const bool wasStopped = signals.IterateWhile([&service] { return service->IsConnected() && service->GoOn(); });
     StandardOutput::EndStream();

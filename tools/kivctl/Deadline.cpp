@@ -2,12 +2,13 @@
 
 #include <algorithm>
 #include <chrono>
+#include <utility>
 
-Deadline::Deadline(GDBusConnection* connection, std::optional<double> seconds)
+Deadline::Deadline(std::optional<double> seconds, std::function<void()> onMiss) : onMiss_(std::move(onMiss))
 {
     constexpr double kYear = 365.0 * 24 * 60 * 60; // longer waits would overflow the clock
     if (seconds)
-        thread_ = std::thread(&Deadline::Wait, this, connection, std::min(*seconds, kYear));
+        thread_ = std::thread(&Deadline::Wait, this, std::min(*seconds, kYear));
 }
 
 Deadline::~Deadline()
@@ -27,12 +28,12 @@ bool Deadline::WasMissed()
     return wasMissed_;
 }
 
-void Deadline::Wait(GDBusConnection* connection, double seconds)
+void Deadline::Wait(double seconds)
 {
     std::unique_lock<std::mutex> lock(mutex_);
     if (change_.wait_for(lock, std::chrono::duration<double>(seconds), [this] { return isOver_; }))
         return;
     wasMissed_ = true;
     lock.unlock();
-    g_dbus_connection_close_sync(connection, nullptr, nullptr);
+    onMiss_();
 }

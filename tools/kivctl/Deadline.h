@@ -1,20 +1,20 @@
 #ifndef DEADLINE_H
 #define DEADLINE_H
 
-#include <gio/gio.h>
-
 #include <condition_variable>
+#include <functional>
 #include <mutex>
 #include <optional>
 #include <thread>
 
-/// Closes a bus connection when the time is up. This ends the calls that wait for answers on it; the library's calls have no time
-/// limit. Waits on a thread of its own, which ends with the object.
+/// Does something when the time is up, such as ending a call that has no time limit of its own. Waits on a thread of its own, which
+/// ends with the object.
 class Deadline
 {
 public:
     /// @param seconds  no deadline when empty
-    Deadline(GDBusConnection* connection, std::optional<double> seconds);
+    /// @param onMiss   called on the thread of the deadline, at most once
+    Deadline(std::optional<double> seconds, std::function<void()> onMiss);
     Deadline(const Deadline&) = delete;
     Deadline& operator=(const Deadline&) = delete;
     ~Deadline();
@@ -23,8 +23,9 @@ public:
     bool WasMissed();
 
 private:
-    void Wait(GDBusConnection* connection, double seconds);
+    void Wait(double seconds);
 
+    const std::function<void()> onMiss_;
     std::mutex mutex_;
     std::condition_variable change_;
     bool isOver_ = false;

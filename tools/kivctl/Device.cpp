@@ -1,8 +1,10 @@
+#include "Bus.h"
 #include "LibraryLog.h"
 #include "Verbs.h"
 
 #include <DASystem.h>
 #include <DeviceControl.h>
+#include <ResultCode.h>
 #include <glib.h>
 
 #include <algorithm>
@@ -51,6 +53,8 @@ struct DeviceId
 
 Field Serial()
 {
+    if (const BusState bus = TryBus(); bus.code != KIV_RESULT_SUCCESS)
+        return Missing("serial", MeaningOf(bus.code));
     const DeviceId id;
     return TextOr("serial", id.text, id.code ? MeaningOf(id.code) : "the device daemon returned none");
 }
@@ -155,6 +159,7 @@ Exit ShowDevice(const DeviceOptions& options, const Command& command)
 
 Exit ShowDeviceId(const Command& command)
 {
+    const BusConnection connection = RequireBus();
     const LibraryLog log;
     const DeviceId id;
     RequireSuccess(id.code, log.Errors());

@@ -1,4 +1,4 @@
-#include "LibraryLog.h"
+#include "Bus.h"
 #include "Progress.h"
 #include "StaleRecord.h"
 #include "Verbs.h"
@@ -8,6 +8,7 @@
 #include <DASubscriberStore.h>
 #include <DASystem.h>
 #include <DeviceControl.h>
+#include <ResultCode.h>
 #include <ServiceManager.h>
 #include <SubscriptionService.h>
 #include <telephony.h>
@@ -30,16 +31,25 @@ using Findings = std::vector<Finding>;
 
 constexpr int kPatienceMs = 3000; ///< how long a service may take to answer
 
+const BusState& Bus()
+{
+    static const BusState state = TryBus();
+    return state;
+}
+
 Finding CheckBus(const Command&)
 {
-    const LibraryLog log;
+    if (Bus().code == KIV_RESULT_SUCCESS)
+        return {Bus().address};
+    return {Bus().address + ": " + MeaningOf(Bus().code) + ": " + Bus().trouble,
+        "start dbus-daemon, and set DBUS_SYSTEM_BUS_ADDRESS to its address"};
+}
+
+/// A new reference to the shared connection; null when the bus does not answer.
+GDBusConnection* Connection()
+{
     int code = 0;
-    g_autoptr(GDBusConnection) connection = DADBusManager::GetInstance()->InitDbusConnection(&code);
-    g_autofree char* address = g_dbus_address_get_for_bus_sync(G_BUS_TYPE_SYSTEM, nullptr, nullptr);
-    const std::string where = address ? address : "no address";
-    if (connection)
-        return {where};
-    return {where + ": " + MeaningOf(code), "start dbus-daemon, and set DBUS_SYSTEM_BUS_ADDRESS to its address"};
+    return Bus().code == KIV_RESULT_SUCCESS ? DADBusManager::GetInstance()->InitDbusConnection(&code) : nullptr;
 }
 
 /// Calls a method of the bus itself. @return the reply; null on an error
@@ -76,7 +86,7 @@ struct Service
 
 Finding CheckService(const Service& service)
 {
-    g_autoptr(GDBusConnection) connection = g_bus_get_sync(G_BUS_TYPE_SYSTEM, nullptr, nullptr);
+    g_autoptr(GDBusConnection) connection = Connection();
     if (!connection)
         return {"not asked without a bus", "start the bus first"};
     const std::string name = service.busName;
@@ -128,7 +138,7 @@ bool AddNames(GDBusConnection* connection, const char* method, std::set<std::str
 /// Checks the subscription service without starting it. `kivctl subscribe` does not depend on it.
 Finding CheckSubscriptionService(const Command&)
 {
-    g_autoptr(GDBusConnection) connection = g_bus_get_sync(G_BUS_TYPE_SYSTEM, nullptr, nullptr);
+    g_autoptr(GDBusConnection) connection = Connection();
     if (!connection)
         return {"not asked without a bus", "start the bus first"};
     const std::string name = kiv::SubscriptionService::kBusName;
@@ -145,7 +155,7 @@ Finding CheckSubscriptionService(const Command&)
 /// Checks a daemon that provides values of the machine itself, without starting it.
 Finding CheckHostDaemon(const char* name, const std::string& unit, const char* interface, const char* path)
 {
-    g_autoptr(GDBusConnection) connection = g_bus_get_sync(G_BUS_TYPE_SYSTEM, nullptr, nullptr);
+    g_autoptr(GDBusConnection) connection = Connection();
     if (!connection)
         return {"not asked without a bus", "start the bus first"};
     g_autoptr(GError) error = nullptr;
@@ -195,7 +205,7 @@ Findings CheckSubscribers(const Command&)
 {
     std::vector<DASubscription> subscriptions;
     std::string reason;
-    g_autoptr(GDBusConnection) connection = g_bus_get_sync(G_BUS_TYPE_SYSTEM, nullptr, nullptr);
+    g_autoptr(GDBusConnection) connection = Connection();
     if (!connection || DASubscriberStore().List(subscriptions, reason) != DASubscriberStore::Outcome::Done)
         return {};
     std::set<std::string> names;

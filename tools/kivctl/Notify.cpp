@@ -1,3 +1,4 @@
+#include "Bus.h"
 #include "Deadline.h"
 #include "LibraryLog.h"
 #include "Progress.h"
@@ -153,12 +154,9 @@ Exit NotifySubscribers(
         });
 
     // The facade's result does not say whether the bus is reachable, so connect first and keep the connection for the walk.
-    int code = 0;
-    g_autoptr(GDBusConnection) connection = DADBusManager::GetInstance()->InitDbusConnection(&code);
-    RequireSuccess(connection ? KIV_RESULT_SUCCESS : code, log.Errors());
-
-    Deadline deadline(connection, options.timeout);
-    code = SendToSubscribers(options, imsi, texts);
+    const BusConnection connection = RequireBus();
+    Deadline deadline(options.timeout, [&connection] { g_dbus_connection_close_sync(connection.get(), nullptr, nullptr); });
+    const int code = SendToSubscribers(options, imsi, texts);
     const bool wasMissed = deadline.WasMissed();
     progress.Show("");
     log.RequireStore();
@@ -184,12 +182,9 @@ Exit NotifySubscribers(
 Exit NotifyManager(const NotifyOptions& options, const std::string& imsi, const std::array<const char*, 4>& texts, const Form& form)
 {
     const LibraryLog log;
-    int code = 0;
-    g_autoptr(GDBusConnection) connection = DADBusManager::GetInstance()->InitDbusConnection(&code);
-    RequireSuccess(connection != nullptr ? 0 : code, log.Errors());
-
-    Deadline deadline(connection, options.timeout);
-    code = DADBusManager::GetInstance()->SendNotiToServiceManager(TypeOf(options.types.front()).type, imsi.c_str(),
+    const BusConnection connection = RequireBus();
+    Deadline deadline(options.timeout, [&connection] { g_dbus_connection_close_sync(connection.get(), nullptr, nullptr); });
+    const int code = DADBusManager::GetInstance()->SendNotiToServiceManager(TypeOf(options.types.front()).type, imsi.c_str(),
         options.services.empty() ? 0 : options.services.front(), texts[0], texts[1], texts[2], texts[3]);
     if (deadline.WasMissed() && code != 0)
         throw Failure(Exit::TimeUp, "the service manager did not answer in time");

@@ -1,3 +1,4 @@
+#include "Bus.h"
 #include "LibraryLog.h"
 #include "Progress.h"
 #include "StaleRecord.h"
@@ -51,13 +52,6 @@ private:
     std::vector<std::string> refusals_;
 };
 
-void RequireBus(const LibraryLog& log)
-{
-    int code = 0;
-    g_autoptr(GDBusConnection) connection = DADBusManager::GetInstance()->InitDbusConnection(&code);
-    RequireSuccess(connection ? KIV_RESULT_SUCCESS : code, log.Errors());
-}
-
 void AwaitEnd(const Deliveries& deliveries)
 {
     const Progress progress;
@@ -74,7 +68,7 @@ Exit Push(const PushOptions& options, const Command& command)
 {
     Deliveries deliveries;
     const LibraryLog log([&deliveries](const LibraryLine& line) { deliveries.Read(line); });
-    RequireBus(log);
+    const BusConnection connection = RequireBus();
 
     DADBusManager::GetInstance()->DeliverPushMessage(
         options.service.c_str(), options.data.c_str(), options.message.c_str(), options.time);

@@ -1,3 +1,4 @@
+#include "Bus.h"
 #include "CallRecord.h"
 #include "Verbs.h"
 
@@ -8,6 +9,7 @@
 
 Exit RunServices(const ServicesOptions& options, const Command& command)
 {
+    RequireBus();
     kiv::StopSignals signals;
     const kiv::BoardDaemon board(options.serial.empty() ? kiv::BoardDaemon::DeviceSerial() : options.serial);
     const kiv::ServiceManager manager([form = command.form](const kiv::BusCall& call) { PrintLine(CallRecord(call), form); });

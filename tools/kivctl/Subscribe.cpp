@@ -1,3 +1,4 @@
+#include "Bus.h"
 #include "CallRecord.h"
 #include "StoreOutcome.h"
 #include "Verbs.h"
@@ -104,6 +105,7 @@ std::vector<std::pair<std::string, std::string>> Wanted(const SubscribeOptions& 
 Exit Subscribe(const SubscribeOptions& options, const Command& command)
 {
     const auto wanted = Wanted(options);
+    RequireBus();
     kiv::StopSignals signals;
     kiv::BusParty party(kiv::kClientServiceXml,
         [form = command.form](const kiv::BusCall& call) -> GVariant*
