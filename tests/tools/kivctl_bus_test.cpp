@@ -231,5 +231,25 @@ TEST_F(KivctlTest, LimitsTheWaitForABusThatNeverAnswers)
     }
 }
 
+TEST_F(KivctlTest, EscapesWhatOthersWroteIntoTheStore)
+{
+    const std::string plain(12, 'p'), forged("\x1b[2J\n\xe2\x80\xae\xff\xc2\x85\"");
+    for (const std::string& event : {"push " + plain, std::string("auth all")})
+        ASSERT_EQ(0, Kivctl("subscribers add " + event + " a." + plain + " /" + plain + " a." + plain).exit);
+    std::string store = Contents("subscribers.db");
+    for (size_t at = store.find(plain); at != store.npos; at = store.find(plain))
+        store.replace(at, plain.size(), forged);
+    std::ofstream("subscribers.db", std::ios::binary) << store;
+    for (const char* arguments : {"subscribers list", "subscribers list -t", "subscribers list -j", "doctor", "doctor -t",
+             "doctor -j", "notify --imsi 1 auth", "complete-words subscribers remove push ''"})
+    {
+        const Outcome outcome = Kivctl(arguments);
+        const std::string printed = outcome.out + outcome.err;
+        for (const char* part : {"\x1b", "\xff", "\xe2\x80\xae", "\xc2\x85", "2J\n"})
+            EXPECT_EQ(printed.npos, printed.find(part)) << arguments << "\n" << printed;
+        EXPECT_EQ(arguments[0] == 'c', printed.find("[2J") == printed.npos) << arguments << "\n" << printed;
+    }
+}
+
 } // namespace
 } // namespace kiv::test

@@ -124,21 +124,32 @@ TEST_F(KivctlTest, EndsWithTheDocumentedExitCode)
 
 TEST_F(KivctlTest, SaysThatTheOutputCannotBeWritten)
 {
-    for (const char* arguments : {"device", "sim", "country 450 -t", "network -j", "profiles -j", "device get runtime.flight-mode",
-             "profiles show dual", "--help", "--version", "sim --help", "completion bash", "services"})
-    {
-        const Outcome outcome("sh -c '" KIVCTL " " + std::string(arguments) + " >/dev/full'");
-        EXPECT_EQ(7, outcome.exit) << arguments;
-        EXPECT_EQ("kivctl: cannot write to standard output: No space left on device\n", outcome.err) << arguments;
-    }
     for (const char* service : {KIV_BOARD_DAEMON, KIV_SERVICE_MANAGER, KIV_SUBSCRIPTION_SERVICE})
     {
         const Outcome outcome("sh -c '" + std::string(service) + " >/dev/full'");
         EXPECT_EQ(1, outcome.exit) << service;
         EXPECT_THAT(outcome.err, HasSubstr(": cannot write to standard output: No space left on device\n"));
     }
+    const Service services(KIVCTL " services"), client(KIVCTL " subscribe --kind auth --push m");
+    Kivctl("device set -p ./followed runtime.flight-mode=false");
+    std::vector<std::string> commands{"device", "sim", "country 450 -t", "network -j", "profiles -j", "device get sim0.mcc",
+        "profiles show dual", "--version", "completion bash", "device id", "doctor -t", "notify auth",
+        "notify auth -j --to manager", "push m --data d --message m", "subscribers list", "subscribers add auth all a.b /a a.b -j",
+        "subscribe --push n", "sim wait -j", "-p ./followed watch"};
+    for (const std::string& verb : Verbs())
+        commands.push_back(verb + " --help");
+    for (const std::string& arguments : commands)
+    {
+        const Outcome outcome("sh -c '" KIVCTL " " + arguments + " >/dev/full'");
+        EXPECT_EQ(7, outcome.exit) << arguments;
+        EXPECT_EQ("kivctl: cannot write to standard output: No space left on device\n", outcome.err) << arguments;
+    }
     // A reader that closes a stream ends it without an error.
-    EXPECT_EQ(0, Outcome("bash -c 'exec 3> >(:); wait $!; " KIVCTL " subscribe --kind auth >&3'").exit);
+    const std::string closed = "env --default-signal=PIPE bash -c 'exec 3> >(:); wait $!; " KIVCTL;
+    EXPECT_EQ(0, Outcome(closed + " subscribe --kind auth >&3'").exit);
+    const Outcome ended(closed + " device >&3; exit $?'");
+    EXPECT_EQ(128 + SIGPIPE, ended.exit) << ended.err;
+    EXPECT_EQ("", ended.err);
 }
 
 /// The lines that the program prints on a terminal of that width.

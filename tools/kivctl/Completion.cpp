@@ -5,6 +5,7 @@
 #include <DASubscriberStore.h>
 #include <DeviceControl.h>
 #include <SourceControl.h>
+#include <Visible.h>
 
 #include <algorithm>
 #include <array>
@@ -89,7 +90,8 @@ Candidates Recorded(const std::vector<std::string>& operands, bool isNew)
     {
         const _SubscriberInfo& who = subscription.subscriber;
         const std::array<std::string, 5> fields{subscription.kind, subscription.key, who.busname, who.objectpath, who.interface};
-        if (index < fields.size() && std::equal(operands.begin(), operands.begin() + compared, fields.begin()))
+        const bool isOffered = index < fields.size() && std::equal(operands.begin(), operands.begin() + compared, fields.begin());
+        if (isOffered && fields.at(index) == kiv::platform::Visible(fields.at(index))) // shells print what they complete
             words.insert(fields.at(index));
     }
     Candidates candidates;

@@ -4,6 +4,8 @@
 #include <StandardOutput.h>
 #include <glib.h>
 
+#include <cerrno>
+#include <csignal>
 #include <exception>
 
 namespace
@@ -20,12 +22,16 @@ Exit Run(int argc, char** argv)
     return command.verb();
 }
 
-/// The exit code, once all output is written.
-Exit Finish(Exit exit)
+/// The exit code, once all output is written. A closed pipe ends the process as it does without GLib, which ignores the signal.
+/// @param onClosedPipe  the handler of that signal when the process began
+Exit Finish(Exit exit, void (*onClosedPipe)(int))
 {
     const int error = kiv::StandardOutput::Error();
     if (error == 0)
         return exit;
+    std::signal(SIGPIPE, onClosedPipe);
+    if (error == EPIPE)
+        std::raise(SIGPIPE);
     throw Failure(Exit::NotWritten, std::string("cannot write to standard output: ") + g_strerror(error));
 }
 
@@ -40,9 +46,11 @@ Exit Report(Exit exit, const char* text, const std::vector<std::string>& details
 int main(int argc, char** argv)
 {
     Exit exit = Exit::No;
+    const auto onClosedPipe = std::signal(SIGPIPE, SIG_DFL);
+    std::signal(SIGPIPE, onClosedPipe);
     try
     {
-        exit = Finish(Run(argc, argv));
+        exit = Finish(Run(argc, argv), onClosedPipe);
     }
     catch (const Failure& failure)
     {
