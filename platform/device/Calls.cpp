@@ -182,7 +182,7 @@ const char* NameOf(Call call)
 
 void FailCall(Call call, int code, CallNumbers which, int slot, Leavings leavings)
 {
-    // Nobody could release what a null result left behind.
+    // The caller could not release what a call with a null result leaves behind.
     if (call == Call::tel_init || call == Call::tel_get_cp_name_list || call == Call::vconf_get_str)
         leavings = Leavings::Nothing;
 

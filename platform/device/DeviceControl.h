@@ -1,6 +1,6 @@
 /// @file
-/// The remote control of the simulated device behind the platform's C interfaces on a workstation: sets the device's values, makes
-/// its services fail, records calls, and reports misused handles. For tests and tools; the product never calls it. Any thread may
+/// Controls the simulated device, which implements the platform's C interfaces on a workstation. Sets the device's values, makes
+/// its services fail, records calls, and reports misused handles. For tests and tools; the library never calls it. Any thread may
 /// call any function here.
 #ifndef KIV_DEVICE_DEVICECONTROL_H
 #define KIV_DEVICE_DEVICECONTROL_H
@@ -17,7 +17,7 @@
 namespace kiv::platform
 {
 
-/// The platform's functions but __dlog_print(), each under its own name: Call::tel_init.
+/// The platform's functions except __dlog_print(), by name: Call::tel_init.
 enum class Call
 {
 #define CALL(name) name,
@@ -46,7 +46,7 @@ using Text = std::optional<std::string>;
 struct SimSlot
 {
     std::string cpName;
-    std::vector<int> cardStatus{3}; ///< TelSimCardStatus_t for successive reads; the last one stays
+    std::vector<int> cardStatus{3}; ///< TelSimCardStatus_t for successive reads; the last one is repeated
     std::optional<int> simState;    ///< telephony_sim_state_e; if missing, follows the card status
     Text mcc, mnc, msin;            ///< reading the IMSI fails if one is missing
     Text number;                    ///< if missing, reading it succeeds and returns null
@@ -78,7 +78,7 @@ struct Device
     std::uint32_t blockSize = 4096;
     std::uint64_t blocksAvailable = 0;
     std::map<std::string, std::string> packages; ///< version by package ID
-    std::vector<BrokenCall> faults;              ///< the first that matches decides; those for a single call go first
+    std::vector<BrokenCall> faults;              ///< the first that matches decides; those for a single call come first
 
     std::map<std::string, std::string> reasons; ///< why a value is missing, if known, by "GROUP.KEY" as in a device file
 };
@@ -92,7 +92,7 @@ Device GetDevice();
 /// follows a file.
 void SetDevice(const Device& device);
 
-/// Like SetDevice(), but modifies the present device, which goes on following its file if it has one. `change` must not call the
+/// Like SetDevice(), but modifies the present device, which continues to follow its file if it has one. `change` must not call the
 /// platform or this control.
 void ChangeDevice(const std::function<void(Device&)>& change);
 
@@ -100,7 +100,7 @@ void ChangeDevice(const std::function<void(Device&)>& change);
 /// @param key  "GROUP.KEY" as in a device file
 std::string ReasonFor(const std::string& key);
 
-/// Returns what is wrong with the profile or file that KIV_PROFILE names; empty if nothing is.
+/// Returns what is wrong with the profile or file that KIV_PROFILE names; empty if it is valid.
 std::string DeviceTrouble();
 
 /// Restores the initial state: the environment's device, no registrations, faults, hooks, journal or misuses. Closes open handles.
@@ -129,7 +129,7 @@ constexpr CallNumbers Only(unsigned number)
     return {number, number};
 }
 
-/// What a call that fails on demand leaves behind.
+/// The effect of a call that fails on demand.
 enum class Leavings
 {
     Nothing,   ///< the call does nothing: out-parameters are unchanged
@@ -138,8 +138,8 @@ enum class Leavings
 
 /// Makes calls of one function return `code`. Code 0 with Leavings::Nothing is an empty success: an out-parameter that stays null,
 /// or a list without handles. A function that returns a pointer returns null and leaves nothing behind, whatever the code. Faults
-/// add up; of those that affect a call, the first one set decides. They go before Device::faults, which do not count the calls that
-/// fail here. They stay when the device is replaced.
+/// add up; of those that affect a call, the first one set decides. They take precedence over Device::faults, which do not count the
+/// calls that fail here. They remain when the device is replaced.
 void FailCall(Call call, int code, CallNumbers which = kEveryCall, int slot = kNoSlot, Leavings leavings = Leavings::Nothing);
 
 /// Removes all faults set by FailCall(), but not those of the device.

@@ -64,7 +64,7 @@ bool State::Ready()
         return trouble.empty();
 
     loaded_ = true;
-    told_ = false;
+    isReported_ = false;
     try
     {
         Origin origin = OpenEnvironment();
@@ -80,9 +80,9 @@ bool State::Ready()
     return trouble.empty();
 }
 
-std::string State::UntoldTrouble()
+std::string State::TakeTrouble()
 {
-    return std::exchange(told_, true) ? std::string() : trouble;
+    return std::exchange(isReported_, true) ? std::string() : trouble;
 }
 
 Changes State::Replace(Device next)
@@ -159,7 +159,7 @@ std::string DeviceTrouble()
 {
     const Locked state(TheState());
     state->Ready();
-    state->UntoldTrouble(); // the caller reports it
+    state->TakeTrouble(); // the caller reports it
     return state->trouble;
 }
 

@@ -30,8 +30,8 @@ struct State
     /// Whether there is a device. The first call reads the one that the environment names.
     bool Ready();
 
-    /// Returns the trouble on the first call; empty afterwards.
-    std::string UntoldTrouble();
+    /// Returns the trouble on the first call, and an empty text afterwards.
+    std::string TakeTrouble();
 
     /// Replaces the device. The caller delivers the changes after it releases the lock.
     Changes Replace(Device next);
@@ -53,7 +53,7 @@ struct State
 private:
     friend void ResetDevice();
     bool loaded_ = false;
-    bool told_ = false; ///< the trouble, to somebody
+    bool isReported_ = false; ///< TakeTrouble() has returned the trouble
 };
 
 /// Returns the state, which is never destroyed, since threads may outlive main().

@@ -24,7 +24,7 @@ using Sink = std::function<void(const LogLine&)>;
 
 constexpr int kNobody = DLOG_FATAL + 1;
 
-/// Lines with a lower priority than this number are not even formatted, since nobody wants them.
+/// Lines with a lower priority than this number are not formatted, because they are not needed.
 constexpr int kNotSettled = -1;
 std::atomic<int> wantedFrom{kNotSettled};
 

@@ -211,7 +211,7 @@ GVariant* SubscriptionService::List(const char* sender)
 }
 
 /// A bus never uses a unique name twice, but every bus starts with the same ones. So subscriptions with unique names of another bus
-/// belong to nobody any more.
+/// have no owner any more.
 void SubscriptionService::Sweep()
 {
     if (!isSweepDue_)

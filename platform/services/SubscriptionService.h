@@ -13,8 +13,8 @@ namespace kiv
 
 /// Writes to the subscriber store for client services, which call it as dbus/org.kiv.Subscriptions1.xml describes.
 ///
-/// Nobody can subscribe for others: the bus identifies the caller and the owner of a name. All state that must survive a kill is in
-/// the store and in the NameBook next to it, so a new process has nothing to restore.
+/// A caller can subscribe only itself: the bus identifies the caller and the owner of a name. All state that must survive a kill is
+/// in the store and in the NameBook next to it, so a new process has nothing to restore.
 class SubscriptionService : public BusParty
 {
 public:

@@ -76,7 +76,7 @@ private:
         for (std::size_t other = 0; other < slot; ++other)
             if (slots[other].cpName == sim.cpName)
                 Fail(name_, group, "cp-name",
-                    "\"" + sim.cpName + "\" is the name of sim" + std::to_string(other) + "; every slot needs a name of its own");
+                    "\"" + sim.cpName + "\" is the name of sim" + std::to_string(other) + "; every slot needs a different name");
         if (sim.mcc.has_value() != sim.mnc.has_value() || sim.mcc.has_value() != sim.msin.has_value())
             Fail(name_, group, !sim.mcc ? "mcc" : !sim.mnc ? "mnc" : "msin", "missing; expected all of mcc, mnc and msin, or none");
         if (sim.mcc && sim.mcc->size() + sim.mnc->size() + sim.msin->size() > 15)

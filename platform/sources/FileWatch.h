@@ -1,5 +1,5 @@
 /// @file
-/// Reports changes of one file, however it is written and through whatever symbolic links it is reached.
+/// Reports changes of one file, whether it is written in place or replaced, also through symbolic links.
 #ifndef KIV_SOURCES_FILEWATCH_H
 #define KIV_SOURCES_FILEWATCH_H
 

@@ -14,7 +14,7 @@
 namespace kiv::platform
 {
 
-/// Follows the file on a thread of its own while it is in use and there is a listener for changes.
+/// Follows the file on a separate thread while it is in use and there is a listener for changes.
 class FollowedFile : public Source, public std::enable_shared_from_this<FollowedFile>
 {
 public:

@@ -22,7 +22,7 @@ std::shared_ptr<LoopThread> LoopThread::Start(Work work)
                 g_main_context_iteration(loop->context_.get(), TRUE);
             }
             work.tearDown();
-            while (g_main_context_iteration(loop->context_.get(), FALSE)) // what was cancelled comes to its end
+            while (g_main_context_iteration(loop->context_.get(), FALSE)) // lets cancelled operations end
                 continue;
             g_main_context_pop_thread_default(loop->context_.get());
         });
@@ -33,12 +33,12 @@ void LoopThread::End()
 {
     if (!IsHere())
     {
-        new std::thread(std::move(thread_)); // which nobody can wait for
+        new std::thread(std::move(thread_)); // never deleted, because this process has no such thread to wait for
         return;
     }
     ended_ = true;
     g_main_context_wakeup(context_.get());
-    if (Notifier::IsDelivering()) // perhaps on that very thread
+    if (Notifier::IsDelivering()) // perhaps on the same thread
         thread_.detach();
     else
         thread_.join();

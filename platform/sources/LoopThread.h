@@ -1,5 +1,5 @@
 /// @file
-/// A thread with a main context of its own, for sources that wait for events.
+/// A thread with a separate main context, for sources that wait for events.
 #ifndef KIV_SOURCES_LOOPTHREAD_H
 #define KIV_SOURCES_LOOPTHREAD_H
 

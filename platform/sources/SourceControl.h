@@ -1,6 +1,6 @@
 /// @file
 /// The sources of the device's state: profiles, which are part of the library, device files, and the machine itself. For tests and
-/// tools; the product never calls these functions. Any thread may call them.
+/// tools; the library never calls these functions. Any thread may call them.
 #ifndef KIV_SOURCES_SOURCECONTROL_H
 #define KIV_SOURCES_SOURCECONTROL_H
 
@@ -38,7 +38,7 @@ struct FieldInfo
     std::string group; ///< "sim0" for the groups of all slots
     std::string key;
     std::string values;   ///< the possible values
-    std::string fallback; ///< the value without the key; "none" for a missing value, "required" when the key must be there
+    std::string fallback; ///< the value without the key; "none" for a missing value, "required" if a file must have the key
     std::string meaning;
     std::vector<std::string> words; ///< the values that are words
 };

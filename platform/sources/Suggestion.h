@@ -11,7 +11,8 @@
 namespace kiv::platform
 {
 
-/// A question about the nearest of the words, to follow an error message: ` (did you mean "single"?)`; empty when none is near.
+/// Returns a suggestion of the most similar word, to append to an error message: ` (did you mean "single"?)`; empty when no word
+/// is similar.
 std::string DidYouMean(const std::string& typed, const std::vector<std::string>& words);
 
 } // namespace kiv::platform
