@@ -115,7 +115,7 @@ int Work(Call call, int (*work)(void*, State&), void* context)
             const std::optional<int> code = Break(call, state->device.faults);
             return code ? *code : work(context, *state);
         }
-        trouble = state->UntoldTrouble();
+        trouble = state->TakeTrouble();
     }
     if (!trouble.empty())
         Report(trouble);

@@ -224,7 +224,7 @@ TEST_F(Notification, ToTheServiceManagerReturnsWhetherItWasAnswered)
     }
 }
 
-TEST_F(BusTest, RequestsTheSerialNumberAnewOnEachCall)
+TEST_F(BusTest, RequestsTheSerialNumberOnEachCall)
 {
     const auto sent = [](const char* message) { return Line(message, "E", "SendDbusMethodNReceiveDID"); };
     const Lines refused = {

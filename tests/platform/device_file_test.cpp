@@ -63,7 +63,7 @@ struct Changes : testing::Test
     const std::string good = Contents(path);
 };
 
-TEST_F(Changes, OfAFileAreFollowedHoweverItIsWritten)
+TEST_F(Changes, OfAFileAreFollowedWhenItIsWrittenOrReplaced)
 {
     static std::atomic<bool> isOn, isOver;
     const auto follow = [](runtime_info_key_e key, void*)
@@ -132,7 +132,7 @@ TEST_F(Changes, ThatCannotBeUsedAreReportedOnce)
     Write(good);
 }
 
-TEST_F(Changes, OfFaultsComeIntoForceAndCountOn)
+TEST_F(Changes, OfFaultsTakeEffectAndContinueToCount)
 {
     EXPECT_EQ(0, runtime_info_set_changed_cb(kKey, kIgnore, nullptr));
     const auto read = []

@@ -80,7 +80,7 @@ TEST(SubscriptionService, LosesNoCallWhenItEndsIdle)
     EXPECT_LT(2U, processes.size());
 }
 
-TEST(SubscriptionService, LeavesTheStoreRightWheneverItIsKilled)
+TEST(SubscriptionService, KeepsTheStoreCorrectWheneverItIsKilled)
 {
     OnDemand on("60");
     Client stays(on.bus);

@@ -181,7 +181,7 @@ TEST_F(Subscriptions, DoNotChangeWhenTheNameGetsANewOwnerMeanwhile)
     }
 }
 
-TEST_F(Subscriptions, OfEverybodyAreListedAndRemovedByAnAdministrator)
+TEST_F(Subscriptions, OfAllUsersAreListedAndRemovedByAnAdministrator)
 {
     Start(60, {getuid()});
     Client administrator(bus), other(bus);

@@ -100,7 +100,7 @@ constexpr char kUsable[] = "nnnynnnnnnnnnnn";
 constexpr char kPolled[] = "nnwywwnwwwwnwnw";
 constexpr char kWaiting[] = "nnynyynyyyynynn";
 
-TEST_F(Slots, AreJudgedThreeWaysByTheStatusOfTheirCard)
+TEST_F(Slots, AreUsableWaitedForOrSkippedByCardStatus)
 {
     for (int value = -1; value <= 256; ++value)
     {
@@ -118,7 +118,7 @@ TEST_F(Slots, AreJudgedThreeWaysByTheStatusOfTheirCard)
     }
 }
 
-TEST_F(Slots, ArePolledOnceASecondUntilTheCardIsDecidedWhicheverCallFails)
+TEST_F(Slots, ArePolledOncePerSecondUntilTheCardStatusIsFinal)
 {
     const std::string place = " DASimManager.cpp IsAvaliableSimStateOnPolling > ", current = 'I' + place + "current SIM Status",
                       end = 'I' + place + "slotNum[1], result";

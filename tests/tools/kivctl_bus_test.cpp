@@ -163,7 +163,7 @@ TEST_F(KivctlTest, WatchNamesEachChange)
     EXPECT_EQ(out.find(repeated), out.rfind(repeated));
 }
 
-TEST_F(KivctlTest, SubscribesByTheServiceAsInTheFile)
+TEST_F(KivctlTest, SubscribesOverTheBusAsInTheFile)
 {
     Service service("env KIV_SUBSCRIBERS=" + directory + "/served.db " KIV_SUBSCRIPTION_SERVICE);
     EXPECT_THAT(Steady(Kivctl("doctor").out), HasSubstr("subscription service yes org.kiv.Subscriptions runs"));

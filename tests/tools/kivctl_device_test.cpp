@@ -59,7 +59,7 @@ TEST_F(KivctlTest, NamesTheProfileThatANewDeviceFileStartsFrom)
     EXPECT_EQ("kivctl: created ./z from the profile dual\n", fromHost.err);
 }
 
-TEST_F(KivctlTest, DoctorListsRecordsThatReachNobody)
+TEST_F(KivctlTest, DoctorListsRecordsWithoutAReachableService)
 {
     const auto examine = [] { return Kivctl("doctor -t --fields finding,remedy").out; };
     EXPECT_THAT(examine(), HasSubstr("\nnone:\n"));

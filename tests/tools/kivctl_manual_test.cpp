@@ -102,7 +102,7 @@ TEST_F(KivctlTest, PagesAndCompletionCoverTheWholeHelp)
     }
 }
 
-TEST_F(KivctlTest, CompletesByTheWordsBefore)
+TEST_F(KivctlTest, CompletesAWordFromTheWordsBeforeIt)
 {
     for (const char* record : {"status 7 org.a.B /x a.b", "auth all org.c.D /y c.d", "push mail org.a.B /x a.b"})
         Kivctl(std::string("subscribers add ") + record);

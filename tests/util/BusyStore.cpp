@@ -286,7 +286,7 @@ TEST_F(BusyStore, CanBeReadWhenItCannotBeWritten)
     }
 }
 
-TEST_F(BusyStore, ReadsALogOfVersion1UntilTheFirstChangeFoldsIt)
+TEST_F(BusyStore, ReadsALogOfVersion1UntilTheFirstChangeMergesIt)
 {
     for (int round = 0; round < 8; ++round)
     {
