@@ -1,4 +1,4 @@
-// The library's reaction to answers of GIO that no real bus gives on demand. Doubles replace three functions of GIO.
+// The library's reaction to answers of GIO that a real bus does not give on demand. Doubles replace three functions of GIO.
 #include "bus/BusTest.h"
 
 namespace
@@ -9,7 +9,7 @@ struct
     int code = 0;                          // of the error
     const char* refusal = nullptr;         // its message; null: no error is set
     GDBusConnection* connection = nullptr; // the shared one; null: there is none
-    bool closesAtOnce = false;             // before anybody gets it
+    bool closesAtOnce = false;             // before the caller receives it
 } gio;
 
 } // namespace

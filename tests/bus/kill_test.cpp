@@ -99,7 +99,7 @@ TEST_F(Kill, AtAnyMomentDoesNotEndTheProcess)
 
 TEST_F(Kill, HasNoEffectOnceTheBusIsBack)
 {
-    g_autoptr(GMainContext) gone = g_main_context_new(); // nobody iterates it before the end
+    g_autoptr(GMainContext) gone = g_main_context_new(); // not iterated before the end
     for (GMainContext* const maker : {static_cast<GMainContext*>(nullptr), gone})
     {
         SCOPED_TRACE(maker == nullptr ? "made in the main loop's context" : "made in a context that is gone");

@@ -212,7 +212,7 @@ TEST_F(Notification, ContinuesOnANewBus)
 
 TEST_F(Notification, ToTheServiceManagerReturnsWhetherItWasAnswered)
 {
-    // The content of an answer does not matter. When it should leave a second time, it is not there, and is not started either.
+    // The content of an answer does not matter. In the last case the service has already left the bus, and is not started.
     const std::tuple<Peer::Answer, int, const char*> cases[] = {{Peer::Reply("('no', 13)"), 0, ""},
         {Peer::Refuse(), 2, "not today"}, {serviceManager.Leave(), 2, ""}, {serviceManager.Leave(), 2, "DO_NOT_AUTO_START"}};
     for (const auto& [answer, code, reason] : cases)

@@ -56,7 +56,7 @@ inline Column ByCallingCode(const Column& ofMcc)
     return found;
 }
 
-/// Of two countries that share an MCC, the last is the answer.
+/// If two countries share an MCC, the last one is the answer.
 inline const Column kLastAlpha2 = Find(Rows(kCountry.rbegin(), kCountry.rend()), 0, 1);
 
 #define TEXT(name) #name, Text(&DASystem::name)

@@ -16,7 +16,7 @@ TEST(TheListedRows, AreAsManyAsTheTablesHold)
         (std::vector<std::size_t>{236, 134, 237, 48}), (std::vector{kCountry.size(), kService.size(), kCodes.size(), kMo.size()}));
 }
 
-/// Every key and answer of every lookup, and texts that hardly differ from them.
+/// Every key and answer of every lookup, and texts that differ only slightly from them.
 std::set<std::string> ManyKeys()
 {
     std::set<std::string> keys;

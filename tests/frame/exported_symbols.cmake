@@ -1,5 +1,5 @@
 # cmake -DNM=... -DLIBRARY=... -DSYMBOLS=... -P exported_symbols.cmake
-# The library exports exactly the symbols of the list, and its classes have no virtual members but their destructors.
+# The library exports exactly the symbols of the list, and its classes have no virtual members except their destructors.
 cmake_minimum_required(VERSION 3.21)
 execute_process(COMMAND ${NM} --dynamic --defined-only --print-size --demangle ${LIBRARY} OUTPUT_VARIABLE output COMMAND_ERROR_IS_FATAL ANY)
 string(REGEX REPLACE "[0-9a-f]+ ([0-9a-f]+ )?[A-Z] ([^\n]*)" "\\2" exported "${output}")

@@ -1,5 +1,5 @@
-// A line with a method of the subscription service and, behind a blank, arguments of any type in GVariant's text form; as many
-// lines as are wanted. Where the text is no tuple, it is the content of one.
+// Lines with a method of the subscription service and, after a blank, arguments of any type in GVariant's text form. If the text is
+// not a tuple, it is the content of one.
 #include "Fuzz.h"
 #include "services/Client.h"
 
@@ -12,7 +12,7 @@ using namespace kiv::test;
 namespace
 {
 
-/// The service in a thread of its own, for as long as the process lives.
+/// The service in a separate thread, for as long as the process lives.
 void Serve()
 {
     std::promise<void> ready;
@@ -60,7 +60,7 @@ void Try(std::string_view input)
             continue;
         const std::string answer = client->Call(method.c_str(), arguments);
         if (g_dbus_connection_is_closed(client->Bus()) != FALSE)
-            client = std::make_unique<Client>(bus); // the bus does not deliver what is no D-Bus type, and disconnects who sends it
+            client = std::make_unique<Client>(bus); // the bus disconnects a client that sends a type unknown to D-Bus
         Require(answer != "NoReply" && answer != "ServiceUnknown", "the service is there");
         Feed(1);
     }
@@ -69,5 +69,5 @@ void Try(std::string_view input)
     std::string reason;
     DASubscriberStore().List(records, reason);
     for (const DASubscription& record : records)
-        Require(record.subscriber.busname == client->UniqueName(), "nobody subscribes for someone else");
+        Require(record.subscriber.busname == client->UniqueName(), "a client subscribes only itself");
 }

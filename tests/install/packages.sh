@@ -23,7 +23,7 @@ mkdir -p "$root"/var/lib/dpkg/{info,updates,triggers}
 cp "${KIV_SYSROOT-}/var/lib/dpkg/status" "$root/var/lib/dpkg/status"
 arch=$(dpkg-deb --field ./kivctl*.deb Architecture)
 echo "$arch" >"$root/var/lib/dpkg/arch"
-# dpkg counts what is for all architectures to its own, where the device's counts it to the device's.
+# dpkg treats packages for all architectures as packages of this machine. On the device it treats them as packages of the device.
 if [[ $arch != "$(dpkg --print-architecture)" ]]; then
     for package in ./*_all.deb; do
         dpkg-deb --raw-extract "$package" "$scratch/all"

@@ -19,7 +19,7 @@ namespace
 
 constexpr auto kKey = RUNTIME_INFO_KEY_FLIGHT_MODE_ENABLED;
 
-/// What is printed on standard error meanwhile.
+/// Captures the text that the process prints on standard error.
 class StandardError
 {
 public:
@@ -45,7 +45,7 @@ private:
     const std::string path_;
 };
 
-/// A device file, at first as the profile "dual" has it, that the device follows; nothing else may stay beside it.
+/// A device file that the device follows, at first with the values of the profile "dual". No other file may remain beside it.
 struct Changes : testing::Test
 {
     Changes() { EXPECT_EQ("", UseProfile(path)); }
@@ -75,7 +75,7 @@ TEST_F(Changes, OfAFileAreFollowedWhenItIsWrittenOrReplaced)
     EXPECT_EQ(0, runtime_info_set_changed_cb(kKey, follow, nullptr));
     Write(good + "[runtime]\nflight-mode=true\n");
     IterateUntil([] { return isOn.load(); }); // a file renamed over the other
-    EXPECT_EQ(1U, GetDevice().slots[0].cardReads) << "the card's script does not begin anew";
+    EXPECT_EQ(1U, GetDevice().slots[0].cardReads) << "the card's script does not start again";
     std::ofstream(path) << good;
     IterateUntil([] { return isOver.load(); }); // one written in place
 }
@@ -84,7 +84,7 @@ constexpr auto kIgnore = [](runtime_info_key_e, void*) {};
 
 TEST_F(Changes, OfATargetOfSymbolicLinksAreFollowed)
 {
-    // Of two releases one is the current one, as a link to its directory has it.
+    // There are two releases, and a link to a directory selects the current one.
     for (const char* release : {"one", "two"})
         std::filesystem::create_directory(directory + "/" + release);
     std::filesystem::create_directory_symlink("one", directory + "/current");

@@ -150,7 +150,7 @@ TEST_F(Push, LetsNoConnectionEndTheProcessWhileItConnects)
         return g_dbus_connection_get_exit_on_close(other.get()) != FALSE;
     };
     Deliver();
-    EXPECT_TRUE(staysDeadly()) << "where there is nobody to connect for";
+    EXPECT_TRUE(staysDeadly()) << "without subscribers";
     Subscribe(client);
     Deliver();
     EXPECT_FALSE(staysDeadly());

@@ -24,7 +24,7 @@ bool IsLong()
 /// Writes the files of a bus that starts the service on demand. @return its configuration
 std::string Configure(const fs::path& folder, const std::string& idleSeconds)
 {
-    // The service inherits the bus's output, a pipe that nobody reads.
+    // The service inherits the bus's output, a pipe that is not read.
     std::ofstream(folder / "org.kiv.Subscriptions.service")
         << "[D-BUS Service]\nName=org.kiv.Subscriptions\nExec=/bin/sh -c 'exec " KIV_SUBSCRIPTION_SERVICE " --idle " << idleSeconds
         << " >/dev/null'\n";

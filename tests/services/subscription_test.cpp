@@ -14,7 +14,7 @@ namespace
 using testing::HasSubstr;
 using testing::IsEmpty;
 
-/// The service in a thread of its own, run like its program.
+/// The service in a separate thread, run like its program.
 class Running
 {
 public:

@@ -114,5 +114,5 @@ wait "${pids[1]}" || fail "the client service does not end"
 
 # The bus starts a client service that has the example's .service file.
 (be $agent "$kivctl" subscribers add auth all org.example.Mail /org/kiv/ClientService org.kiv.ClientService)
-expect "each is on the bus, or is started by it" be $agent "$kivctl" doctor
+expect "each one is on the bus, or the bus can start it" be $agent "$kivctl" doctor
 expect "sent subscribers=1 delivered=1" be $agent "$kivctl" notify auth-success

@@ -24,8 +24,8 @@ struct Failing
 enum class Kind
 {
     Single,  ///< fails exactly when one of its calls fails
-    Walk,    ///< goes on after a failed call
-    Bus,     ///< calls somebody on the bus
+    Walk,    ///< continues after a failed call
+    Bus,     ///< calls a service on the bus
     Push,    ///< the same, and continues in a main loop of the thread
     Listener ///< runs in the one thread that delivers changes
 };

@@ -36,8 +36,8 @@ struct Sweep : testing::Test
         const Operation& operation, const std::function<void()>& arm = [] {},
         const std::function<void()>& disarm = platform::ClearFaults);
 
-    /// Whether an operation that goes on after a failure may come to this: to one of its failures, or to an answer made of nothing
-    /// but what it says untouched and what the SIMs hold, in lines that are all its own.
+    /// Whether `story` is possible for an operation that continues after a failure. Its result must be one of the operation's
+    /// failures, or consist only of words of the untouched result and of the SIMs. Its log lines must be lines of the operation.
     testing::AssertionResult MayBe(const Operation& operation, const Story& story, const Story& untouched) const;
 
     platform::Device device;

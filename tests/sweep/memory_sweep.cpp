@@ -1,4 +1,4 @@
-// Every operation on every profile, with each allocation of the library failing in turn: alone, and with all that follow. These are
+// Every operation on every profile. Each allocation of the library fails in turn: only that one, and with all later ones. These are
 // the allocations of the library and its support library, also in code of the standard library. GLib ends the process when there is
 // no memory, so its allocations succeed. Making a named lock counts as an allocation. LeakSanitizer reports lost memory.
 #include "sweep/Sweep.h"

@@ -1,4 +1,4 @@
-// Every operation on every profile, with each of its platform calls failing in turn: alone, and with all that follow.
+// Every operation on every profile. Each of its platform calls fails in turn: only that one, and with all later ones.
 #include "sweep/Sweep.h"
 
 #include <iostream>
@@ -17,8 +17,8 @@ bool Contains(const Calls& calls, Call call)
     return std::find(calls.begin(), calls.end(), call) != calls.end();
 }
 
-/// What a failed call leaves behind. A failed call that opens must not open anything, since nobody could close it. A failed call
-/// that closes must close, since nobody would try again.
+/// The effect of a failed call. A failed call that opens must not open anything, since the caller could not close it. A failed call
+/// that closes must close, since the caller does not try again.
 Leavings Possible(Call call, Leavings wanted)
 {
     const Calls opening{Call::telephony_init, Call::tel_init, Call::package_info_create, Call::connection_create};

@@ -64,13 +64,14 @@ TEST_F(KivctlTest, DoctorListsRecordsWithoutAReachableService)
     const auto examine = [] { return Kivctl("doctor -t --fields finding,remedy").out; };
     EXPECT_THAT(examine(), HasSubstr("\nnone:\n"));
     const Service client(KIVCTL " subscribe --name a.b --kind auth");
-    EXPECT_THAT(examine(), HasSubstr("\neach is on the bus, or is started by it:\n"));
+    EXPECT_THAT(examine(), HasSubstr("\neach one is on the bus, or the bus can start it:\n"));
     for (const char* record : {"status 7 org.gone.Away /a a.b", "push 'two words' :1.999 /a a.b"})
         ASSERT_EQ(0, Kivctl(std::string("subscribers add ") + record).exit);
-    EXPECT_THAT(examine(),
-        AllOf(HasSubstr("\nstatus 7\\: nobody owns org.gone.Away, and nothing starts it:start the service, or remove its record\\: "
-                        "kivctl subscribers remove status 7 org.gone.Away /a a.b\n"),
-            HasSubstr("remove push 'two words' \\:1.999 /a a.b\n"), testing::Not(HasSubstr("nobody owns a.b"))));
+    EXPECT_THAT(
+        examine(), AllOf(HasSubstr("\nstatus 7\\: no program owns org.gone.Away, and the bus cannot start one:start the service, "
+                                   "or remove its record\\: "
+                                   "kivctl subscribers remove status 7 org.gone.Away /a a.b\n"),
+                       HasSubstr("remove push 'two words' \\:1.999 /a a.b\n"), testing::Not(HasSubstr("no program owns a.b"))));
     EXPECT_EQ(1, Kivctl("doctor").exit);
 }
 

@@ -77,6 +77,7 @@ TEST_F(KivctlTest, PagesAndCompletionCoverTheWholeHelp)
         const std::string whole = Kivctl(verb + " --help").out, help = whole.substr(0, whole.find("Options of every"));
         Words words = All("\n  ([a-z]+)  ", help);
         words.merge(All(inHelp, help));
+        EXPECT_EQ(help.find("Options of every verb"), help.rfind("Options of every verb")) << verb;
         words.insert(everywhere.begin(), everywhere.end());
         EXPECT_THAT(All("([^\t\n]+)(?:\t[^\n]*)?\n", Complete(verb + " ''") + Complete(verb + " -")), testing::IsSupersetOf(words))
             << verb;

@@ -1,5 +1,5 @@
 /// @file
-/// A subscriber store in a directory of its own.
+/// A subscriber store in a new directory.
 #ifndef KIV_TESTS_STORETEST_H
 #define KIV_TESTS_STORETEST_H
 

@@ -118,9 +118,9 @@ void AddDescriptions(CLI::App& app, Command& command, const CLI::Formatter& form
             return Exit::Done;
         };
     };
-    CLI::App* completion = app.add_subcommand("completion", "Print the completion script of a shell")->group("Verbs");
+    CLI::App* completion = app.add_subcommand("completion", "Print the completion script for a shell")->group("Verbs");
     const auto shell = std::make_shared<std::string>();
-    Restrict(completion->add_option("SHELL", *shell, "Shell to complete in")->required(), CompletionShells());
+    Restrict(completion->add_option("SHELL", *shell, "Name of the shell")->required(), CompletionShells());
     completion->callback([print, shell] { print(CompletionScript(*shell)); });
     app.add_subcommand("print-man-page")
         ->group("")

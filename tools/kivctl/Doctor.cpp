@@ -21,7 +21,7 @@
 namespace
 {
 
-/// The result of a check, and what to do about it; no remedy when all is well.
+/// The result of a check, and what to do about it; no remedy when the check succeeds.
 struct Finding
 {
     std::string text;
@@ -59,7 +59,7 @@ GVariant* AskBus(GDBusConnection* connection, const char* method, GVariant* argu
         arguments, nullptr, G_DBUS_CALL_FLAGS_NONE, kPatienceMs, nullptr, error);
 }
 
-/// Whether the bus lets this user own a name that nobody owns. The only way to find out is to own it for a moment.
+/// Whether the bus lets this user own a name that has no owner. The only way to find out is to own it for a moment.
 bool MayOwn(GDBusConnection* connection, const char* busName)
 {
     constexpr guint kDoNotQueue = 4;
@@ -200,7 +200,7 @@ Finding CheckStore(const Command&)
     return {reason.substr(0, end), reason.substr(end + 2)};
 }
 
-/// One finding for each record that reaches nobody. Nothing without a bus or a store, which have checks of their own.
+/// One finding for each record without a reachable service. None without a bus or a store, because other checks report these.
 Findings CheckSubscribers(const Command&)
 {
     std::vector<DASubscription> subscriptions;
@@ -216,11 +216,12 @@ Findings CheckSubscribers(const Command&)
     {
         const std::string& name = subscription.subscriber.busname;
         if (names.count(name) == 0)
-            findings.push_back({subscription.kind + " " + subscription.key + ": nobody owns " + name + ", and nothing starts it",
-                "start the service, or remove its record: " + RemovalOf(subscription)});
+            findings.push_back(
+                {subscription.kind + " " + subscription.key + ": no program owns " + name + ", and the bus cannot start one",
+                    "start the service, or remove its record: " + RemovalOf(subscription)});
     }
     if (findings.empty())
-        findings.push_back({subscriptions.empty() ? "none" : "each is on the bus, or is started by it"});
+        findings.push_back({subscriptions.empty() ? "none" : "each one is on the bus, or the bus can start it"});
     return findings;
 }
 

@@ -27,7 +27,7 @@ std::string Padded(const std::string& text, size_t width);
 std::vector<std::string> Wrapped(const std::string& text, size_t width, size_t indent = 0);
 
 /// Like Wrapped(), for a text that begins with a heading of `indent` columns, including its padding. The lines continue to the
-/// right of the heading. Where there is too little room for that, the heading has a line of its own.
+/// right of the heading. If there is too little space for that, the heading is on a separate line.
 std::vector<std::string> WrappedBehindHeading(const std::string& text, size_t width, size_t indent);
 
 /// Wraps each line of a help text. A description continues below its beginning.

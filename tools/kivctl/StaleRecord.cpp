@@ -43,7 +43,7 @@ std::string DeliveryTrouble(const std::string& trouble, const std::string& kind,
             busName.empty() ? trouble.find("The name " + who.busname + " ") != trouble.npos : who.busname == busName;
         if (subscription.kind != kind || (!key.empty() && subscription.key != key) || !isNamed)
             continue;
-        return "nobody on the bus owns the name, and nothing starts it; start the service, or remove its record: " +
+        return "no program owns the name, and the bus cannot start one; start the service, or remove its record: " +
                RemovalOf(subscription);
     }
     return trouble;

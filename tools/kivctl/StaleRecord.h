@@ -8,8 +8,8 @@
 /// The shell command that removes a subscription.
 std::string RemovalOf(const DASubscription& subscription);
 
-/// Says why a call to a subscriber failed. If nobody owns the bus name, includes the command that removes the subscription, which
-/// is looked up in the store.
+/// Says why a call to a subscriber failed. If no program owns the bus name, includes the command that removes the subscription,
+/// which is looked up in the store.
 /// @param trouble  as the library logs it
 /// @param kind     of the subscription
 /// @param key      of the subscription; empty for any

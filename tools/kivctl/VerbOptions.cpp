@@ -58,11 +58,11 @@ CLI::App* AddToHelp(CLI::App& app, const char* name, const char* help)
 void AddFields(CLI::App* verb, Command& command, const std::vector<std::string>& fields)
 {
     command.fields[verb] = fields;
-    verb->footer([fields, rest = verb->get_footer()]
-        { return "Fields: " + Joined(fields, ", ") + "\nOptions of every query: --terse, --fields NAME,NAME\n" + rest; });
+    // Printed above the footer of all verbs.
+    verb->footer([fields] { return "Fields: " + Joined(fields, ", ") + "\nOptions of every query: --terse, --fields NAME,NAME"; });
 }
 
-/// Adds a verb with options of its own, which live as long as the command.
+/// Adds a verb with options, which live as long as the command.
 /// @return its command line, and the options to bind it to
 template <typename Options>
 std::pair<CLI::App*, std::shared_ptr<Options>> AddVerb(CLI::App& app, Command& command, const char* name, const char* help,
@@ -132,7 +132,9 @@ void AddDevice(CLI::App& app, Command& command)
     AddShowIds(device, command, "Show serial number, IMEI and platform device ID unmasked");
     device->add_option("--package", options->package, "Also show whether this package is installed, and its version")
         ->type_name("ID");
-    device->add_option("--storage", options->storageMiB, "Check that more than this is free in the internal storage (default: 100)")
+    device
+        ->add_option("--storage", options->storageMiB,
+            "Check that more than this is free in the internal storage, in mebibytes (default: 100)")
         ->type_name("MIB")
         ->transform(Numbers(std::numeric_limits<double>::lowest(), "a number"));
     AddFields(AddVerb(*device, command, "id", "Read the device unique ID from the device daemon on the bus", ShowDeviceId), command,
@@ -184,7 +186,7 @@ void AddSim(CLI::App& app, Command& command)
         AddVerb(*sim, command, "wait", "Wait until a SIM is usable, checking once per second", WaitForSim);
     AddFields(wait, command, {"usable_slot", "waited_seconds"});
     addSlot(wait, *waitOptions);
-    wait->add_option("--timeout", waitOptions->timeout, "Maximum wait in seconds (default: as long as a SIM may become usable)")
+    wait->add_option("--timeout", waitOptions->timeout, "Maximum wait in seconds (default: until no SIM can become usable)")
         ->type_name("SECONDS")
         ->transform(Numbers(0.0, "0 or a positive number"));
 }
@@ -196,7 +198,8 @@ void AddNetwork(CLI::App& app, Command& command)
     AddFields(verb, command, {"cellular", "wifi", "bluetooth", "connected"});
     verb->add_flag("--wifi", options->countsWifi, "Also count Wi-Fi as a connection");
     verb->add_flag("--bluetooth,--bt", options->countsBluetooth, "Also count Bluetooth as a connection");
-    AddVerb(app, command, "watch", "Print changes of the network and the SIMs until Ctrl-C; reads the SIMs once a second", Watch);
+    AddVerb(
+        app, command, "watch", "Print changes of the network and the SIMs until Ctrl-C; the SIMs are read once per second", Watch);
 }
 
 void AddNotify(CLI::App& app, Command& command)
@@ -204,8 +207,9 @@ void AddNotify(CLI::App& app, Command& command)
     const auto [verb, options] =
         AddVerb(app, command, "notify", "Send an event to the subscribers or to the service manager", Notify);
     Restrict(verb->add_option("TYPE", options->types,
-                     "Event to send; on and off may be repeated, each with its --service. A kind is accepted too: status means on, "
-                     "auth means auth-success")
+                     "Event to send. Several on and off may be given, each with a --service. Kinds are accepted too: status means "
+                     "on, auth "
+                     "means auth-success")
                  ->required(),
         NotificationTypes(), {{"status", "on"}, {"auth", "auth-success"}});
     Restrict(verb->add_option("--to", options->to, "Receivers of the event (default: subscribers)"), {"subscribers", "manager"});
@@ -218,7 +222,8 @@ void AddNotify(CLI::App& app, Command& command)
             "Texts of the event; policy: status, feature, version, document URL; number_changed: any four")
         ->type_name("TEXT")
         ->expected(4);
-    verb->add_option("--timeout", options->timeout, "Maximum wait for all answers in seconds, then exit code 3 (default: no limit)")
+    verb->add_option("--timeout", options->timeout,
+            "Maximum wait for all answers in seconds; exit code 3 when it is over (default: no limit)")
         ->type_name("SECONDS")
         ->transform(Numbers(0.0, "0 or a positive number"));
 }
@@ -240,7 +245,7 @@ void AddSubscribe(CLI::App& app, Command& command)
     const auto [verb, options] =
         AddVerb(app, command, "subscribe", "Run a client service that prints each event until Ctrl-C", Subscribe);
     RestrictToKinds(verb->add_option("--kind", options->kinds,
-        "Kind of event to subscribe to; may be repeated. A TYPE of notify is accepted too, such as on for status"));
+        "Kind of event to subscribe to; may be repeated. The TYPE words of notify are accepted too: on means status"));
     verb->add_option("--key", options->key, "Service to subscribe to: a number for policy and status, a name for push")
         ->type_name("SERVICE");
     verb->add_option("--push", options->pushes, "Same as --kind push --key SERVICE")->type_name("SERVICE");
@@ -258,7 +263,7 @@ void AddSubscribers(CLI::App& app, Command& command)
     const auto addFields = [](CLI::App* verb, SubscriptionOptions& options)
     {
         RestrictToKinds(
-            verb->add_option("KIND", options.kind, "Kind of event; a TYPE of notify is accepted too, such as on for status")
+            verb->add_option("KIND", options.kind, "Kind of event; the TYPE words of notify are accepted too: on means status")
                 ->required());
         verb->add_option("KEY", options.key, "Service ID for policy and status, service name for push, or \"all\"")->required();
         verb->add_option("BUS_NAME", options.busName, "Bus name of the client service, such as org.example.Client")->required();

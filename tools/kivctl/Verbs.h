@@ -115,7 +115,7 @@ Exit Push(const PushOptions& options, const Command& command);
 /// @{
 struct ServicesOptions
 {
-    std::string serial; ///< empty for the device's own
+    std::string serial; ///< empty for that of the device in use
 };
 Exit RunServices(const ServicesOptions& options, const Command& command);
 /// @}
@@ -127,7 +127,7 @@ struct SubscribeOptions
     std::vector<std::string> kinds; ///< of DASubscriberStore::Kinds()
     std::string key;
     std::vector<std::string> pushes;
-    std::string name;  ///< empty for the connection's unique name alone
+    std::string name;  ///< empty to use only the connection's unique name
     std::string store; ///< empty to use the subscription service or, without it, the usual file
 };
 Exit Subscribe(const SubscribeOptions& options, const Command& command);

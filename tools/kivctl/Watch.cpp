@@ -50,7 +50,7 @@ private:
     std::atomic<int> wifiConnected_{-1}; ///< not reported yet
 };
 
-/// Reads the card statuses once a second, in the default main context, and prints their changes, because the platform does not
+/// Reads the card statuses once per second, in the default main context, and prints their changes, because the platform does not
 /// report them.
 class CardWatch
 {
@@ -107,7 +107,7 @@ Exit Watch(const Command& command)
         Note("a device from a profile never changes; to change one, use a device file (kivctl device set --profile FILE)");
 
     // Registered until the process ends: it may be removed only while no change is being delivered, and the device delivers on
-    // its own thread at any time.
+    // a separate thread at any time.
     static Printer* const printer = new Printer(command.form);
     kiv::StopSignals signals;
     DASystem::GetInstance()->SetConnectionEventListener(printer, nullptr);
