@@ -10,10 +10,11 @@ import tempfile
 import time
 
 KIVCTL = os.path.abspath(sys.argv[1])
-# The text typed before the tab, and the command line after it.
+# What is typed, with a tab at its end and at each "\t", and the command line after it.
 CASES = [
     ("kivctl device set runtime.flight-mode=t", "kivctl device set runtime.flight-mode=true"),
-    ("kivctl device set runtime.fl", "kivctl device set runtime.flight-mode="),
+    ("kivctl device set runtime.fl\ttr", "kivctl device set runtime.flight-mode=true"),
+    ("kivctl sim my", "kivctl sim my"),  # no file belongs there
     ("kivctl sim --profile=roa", "kivctl sim --profile=roaming"),
     ("kivctl sim --profile=my", "kivctl sim --profile=my.profile"),
     ("kivctl sim -p my", "kivctl sim -p my.profile"),
@@ -67,8 +68,9 @@ def check(shell):
     terminal.type(start + "; show ready\r")
     failures = 0 if terminal.read_until("<ready>") else 1
     for typed, expected in CASES:
-        terminal.type(typed + "\t")
-        time.sleep(0.3)  # shells ignore input while they complete
+        for part in typed.split("\t"):
+            terminal.type(part + "\t")
+            time.sleep(0.3)  # shells ignore input while they complete
         terminal.type("\x01show \r")
         words = "".join(f"<{word}>" for word in expected.split())
         if not terminal.read_until(words):

@@ -133,6 +133,15 @@ TEST_F(KivctlTest, LimitsTheWaitForAServiceThatIsStuck)
     host.Await("ModemManager          does not answer");
     for (Service* stuck : {&board, &manager, &client})
         g_subprocess_send_signal(stuck->process.get(), SIGCONT);
+
+    const auto answerLate = [](GDBusMessage* call)
+    {
+        g_usleep(100'000);
+        return g_dbus_message_new_method_reply(call);
+    };
+    const Peer late(bus, "a.late", answerLate);
+    Kivctl("subscribers add activated all a.late /a a.b");
+    EXPECT_EQ(0, Kivctl("notify activated --timeout 60").exit);
 }
 
 TEST_F(KivctlTest, WatchNamesEachChange)
