@@ -52,7 +52,7 @@ TEST_F(KivctlTest, CarriesEveryNotificationToItsReceivers)
     EXPECT_EQ("sent subscribers=2 delivered=2\n", Kivctl("notify --imsi 1 on off --service 8 --service 7").out);
     other.Await("status imsi='1' service_id=8 status='on'\n");
 
-    for (const char* what : {"status 7", "push mail"})
+    for (const char* what : {"push 7", "push other", "status 7", "push mail"}) // advice names only the record that failed
         ASSERT_EQ(0, Kivctl(std::string("subscribers add ") + what + " org.gone.Away /a a.b").exit);
     for (const std::string arguments :
         {"notify --imsi 1 on --service 7", "push mail --data '{\"a\":1}' --message 'two words' --time -5000000000"})
@@ -116,12 +116,15 @@ TEST_F(KivctlTest, EscapesTheErrorTextsOfOthers)
 
 TEST_F(KivctlTest, LimitsTheWaitForAServiceThatIsStuck)
 {
-    Service board(KIV_BOARD_DAEMON), manager(KIV_SERVICE_MANAGER), client(KIVCTL " subscribe --kind auth --name a.b");
-    for (Service* stuck : {&board, &manager, &client})
-        kill(std::stoi(g_subprocess_get_identifier(stuck->process.get())), SIGSTOP); // at once, before anybody calls it
-    const Peer modems(bus, "org.freedesktop.ModemManager1", Peer::InsteadDo([] {}));
-    const Program examined(KIVCTL " doctor --fields check,finding"); // its time limits are far below GDBus's
+    const auto stop = [](const Service& service) // at once, before anybody calls it
+    { kill(std::stoi(g_subprocess_get_identifier(service.process.get())), SIGSTOP); };
+    const Service modems(KIVCTL " subscribe --kind number_changed --name org.freedesktop.ModemManager1");
+    stop(modems);
     const Program host(KIVCTL " doctor --fields check,finding --profile host");
+    Service board(KIV_BOARD_DAEMON), manager(KIV_SERVICE_MANAGER), client(KIVCTL " subscribe --kind auth --name a.b");
+    for (const Service* stuck : {&board, &manager, &client})
+        stop(*stuck);
+    const Program examined(KIVCTL " doctor --fields check,finding"); // its time limits are far below GDBus's
     for (const auto& [receiver, trouble] : std::map<std::string, const char*>{
              {"subscribers", "kivctl: not delivered to a.b: no answer in time\n"}, {"manager", "did not answer in time"}})
     {
@@ -130,7 +133,7 @@ TEST_F(KivctlTest, LimitsTheWaitForAServiceThatIsStuck)
         EXPECT_THAT(sent.err, HasSubstr(trouble));
     }
     examined.Await("org.tizen.servicemanager.service does not answer");
-    host.Await("ModemManager          does not answer");
+    host.Await("ModemManager          does not answer: Timeout was reached");
     for (Service* stuck : {&board, &manager, &client})
         g_subprocess_send_signal(stuck->process.get(), SIGCONT);
 

@@ -130,6 +130,7 @@ TEST_F(KivctlTest, SaysThatTheOutputCannotBeWritten)
         EXPECT_EQ(1, outcome.exit) << service;
         EXPECT_THAT(outcome.err, HasSubstr(": cannot write to standard output: No space left on device\n"));
     }
+    EXPECT_EQ(7, Outcome("sh -c '" KIVCTL " services >/dev/full'").exit);
     const Service services(KIVCTL " services"), client(KIVCTL " subscribe --kind auth --push m");
     Kivctl("device set -p ./followed runtime.flight-mode=false");
     std::vector<std::string> commands{"device", "sim", "country 450 -t", "network -j", "profiles -j", "device get sim0.mcc",
@@ -213,7 +214,7 @@ TEST_F(KivctlTest, WrapsLinesAtTheWidthOfTheTerminal)
 
 TEST_F(KivctlTest, PausesBetweenTwoChecksWhileItWaitsForASim)
 {
-    Kivctl("device set -p ./slow 'sim0.card-status=2;3' sim1.card-status=1");
+    Kivctl("device set -p ./slow 'sim0.card-status=2;2;3' sim1.card-status=1");
     const Outcome waited = Kivctl("sim wait -p ./slow -t --fields usable_slot,waited_seconds --timeout 60");
     EXPECT_THAT(waited.out, testing::ContainsRegex("^0:[1-9]")) << waited.err;
 }

@@ -286,6 +286,21 @@ TEST_F(BusyStore, CanBeReadWhenItCannotBeWritten)
     }
 }
 
+TEST_F(BusyStore, SaysThatAnotherProcessKeepsItBusy)
+{
+    EXPECT_EQ(Outcome::Done, Add("push", "7", ":1.7"));
+    const Beside holder(
+        [&]
+        {
+            Execute("BEGIN EXCLUSIVE");
+            ++board->added;
+            pause();
+        });
+    while (board->added == 0)
+        usleep(100);
+    EXPECT_THAT(Find("push", "7"), HasSubstr("database is locked; try again when no other process keeps it busy\n"));
+}
+
 TEST_F(BusyStore, ReadsALogOfVersion1UntilTheFirstChangeMergesIt)
 {
     for (int round = 0; round < 8; ++round)
