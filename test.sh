@@ -10,8 +10,8 @@ usage()
 usage: ./test.sh [--all | --arch armhf | --arch arm64]
   Build in build/ and run the tests with AddressSanitizer and UBSan, with ThreadSanitizer, and plain.
   --all  the same with clang++ too, clang-format over all sources, clang-tidy over all but the tests, 30 seconds of each fuzz
-         target, and the checks of packages, a device's build, documents and country data; then plain for both ARM processors,
-         with the checks of their packages and a device's build
+         target, real modem and network daemons, and the checks of packages, a device's build, documents and country data; then
+         plain for both ARM processors, with the checks of their packages and a device's build
   --arch  builds for that processor alone, plain, and runs the tests with qemu-user-static
 TEXT
 }
@@ -120,6 +120,10 @@ fi
 
 for preset in asan tsan dev; do
     build "$preset"
-    [[ $all && $preset == dev ]] && run_tests check
+    if [[ $all && $preset == dev ]]; then
+        run_tests check
+    elif [[ $all ]]; then
+        run_tests "check-$preset"
+    fi
     run_tests "$preset"
 done

@@ -31,6 +31,12 @@ std::string SymbolOf(Function function)
 
 using Rows = std::vector<Operation>;
 
+/// What operations by modem or by slot are given.
+struct Subject
+{
+    Given modem, slot;
+};
+
 /// The row added last.
 class Row
 {
@@ -159,7 +165,7 @@ std::string OpenAndClose(Session& session)
 
 /// SIM queries by slot or modem, of the facade and of its manager.
 template <class S>
-void AddSim(Rows& rows)
+void AddSim(Rows& rows, const Subject& subject)
 {
     const Group locked{rows, "DASimManager.cpp", Kind::Single, SimLock::Whole};
     const Group lockedWalk{rows, "DASimManager.cpp", Kind::Walk, SimLock::Whole};
@@ -169,21 +175,21 @@ void AddSim(Rows& rows)
     const std::string enter = "I > Enter", reading = "I > Before telephony_sim_get_subscriber_number",
                       read = "I > After telephony_sim_get_subscriber_number";
     locked.Add<char**()>(&S::GetCpNameList, {}, {"modem0 modem1"}).Fails({kNames}, {"null"});
-    locked.Add<bool(int, bool*)>(&S::GetRoamingStatus, {"", 1}, {"true false"})
+    locked.Add<bool(int, bool*)>(&S::GetRoamingStatus, subject.slot, {"true false"})
         .Fails({kOpen[0], Call::telephony_network_get_service_state, Call::telephony_network_get_roaming_status}, {"false true"});
-    locked.Add<bool(int, Status*)>(&S::IsAvaliableState, {"", 1}, {"true 3"}).Fails({kNames, kModem, kStatus}, {"false"});
-    locked.Add<bool(int, Status*, int*)>(&S::IsAvaliableSendSMS, {"", 1}, {"true 3 6", "E > NetworkSvc[6]"})
+    locked.Add<bool(int, Status*)>(&S::IsAvaliableState, subject.slot, {"true 3"}).Fails({kNames, kModem, kStatus}, {"false"});
+    locked.Add<bool(int, Status*, int*)>(&S::IsAvaliableSendSMS, subject.slot, {"true 3 6", "E > NetworkSvc[6]"})
         .Fails({kNames, kModem, Call::tel_get_property_int}, {"false"})
         .Fails({kStatus}, {"false", "E > Not available. ret[-77]"});
-    locked.Add<bool(char*, TelNetworkDefaultSubs_t*)>(&S::GetMainSimSubscription, {"modem1"}, {"true 0"})
+    locked.Add<bool(char*, TelNetworkDefaultSubs_t*)>(&S::GetMainSimSubscription, subject.modem, {"true 0"})
         .Fails({kModem, Call::tel_get_network_default_subscription}, {"false"});
-    locked.Add<bool(char*, TelCallPreferredVoiceSubs_t*)>(&S::GetCallPreferredSubscription, {"modem1"}, {"true 1"})
+    locked.Add<bool(char*, TelCallPreferredVoiceSubs_t*)>(&S::GetCallPreferredSubscription, subject.modem, {"true 1"})
         .Fails({kModem, Call::tel_get_call_preferred_voice_subscription}, {"false"});
-    locked.Add<bool(char*, TelNetworkDefaultDataSubs_t*)>(&S::GetDefaultDataSubscription, {"modem1"}, {"true 0"})
+    locked.Add<bool(char*, TelNetworkDefaultDataSubs_t*)>(&S::GetDefaultDataSubscription, subject.modem, {"true 0"})
         .Fails({kModem, Call::tel_get_network_default_data_subscription}, {"false"});
-    locked.Add<bool(char*, int*)>(&S::CheckSmsEnabled, {"modem1"}, {"true 1"})
+    locked.Add<bool(char*, int*)>(&S::CheckSmsEnabled, subject.modem, {"true 1"})
         .Fails({kModem, Call::tel_check_sms_device_status}, {"false"});
-    locked.Add<bool(Text, std::string*, std::string*, std::string*)>(&S::GetSimInfo, {"modem1"}, {"true 262 01 9876543210"})
+    locked.Add<bool(Text, std::string*, std::string*, std::string*)>(&S::GetSimInfo, subject.modem, {"true 262 01 9876543210"})
         .Fails({kModem}, {"false before before before", "E > tel_init error"})
         .Fails({Call::tel_get_sim_imsi}, {"false before before before", "E > tel_get_sim_imsi errno [-77]"});
     locked.Add<bool(telephony_data**, char**)>(&S::GetPhoneNumber, {}, {"true +821012345678", enter, reading, read})
@@ -192,7 +198,7 @@ void AddSim(Rows& rows)
     lockedWalk.AddRun({SymbolOf<bool (S::*)(Slots*)>(&S::InitHandleList), SymbolOf<bool (S::*)(Slots*)>(&S::DeinitHandleList)},
         OpenAndClose<S>, {"true 2 true"});
     lockedWalk.Add<bool()>(&S::IsSimExist, {}, {"true"}).Fails({}, {"false", "E > SIM STATE[0] : TELEPHONY_SIM_STATE_LOCKED"});
-    walk.Add<bool(int, int, Status*)>(&S::IsAvaliableSimStateOnPolling, {"", 1},
+    walk.Add<bool(int, int, Status*)>(&S::IsAvaliableSimStateOnPolling, subject.slot,
             {"true 3", "I > current SIM Status[3]", "I > slotNum[1], result[1], status[3], time[0]"})
         .Fails({}, {"false", "E > wait tel_init[1]", "E > TapiHandle is null. fail."});
     single.Add<bool(Status)>(&S::IsWaittingSimCheck, {"", 4}, {"true"}).WithoutMemory({"false"});
@@ -322,10 +328,10 @@ void AddFacade(Rows& rows)
 }
 
 template <class Char>
-void AddReader(const Group& group, int (DASimManager::*read)(Slots, int, Char**), const Calls& reads, const std::string& good,
-    const std::string& bad, const std::string& line)
+void AddReader(const Group& group, const Given& slot, int (DASimManager::*read)(Slots, int, Char**), const Calls& reads,
+    const std::string& good, const std::string& bad, const std::string& line)
 {
-    group.Add(read, {"", 1}, {good}).Fails(kState, {bad, kNotAvailable, line}).Fails(reads, {bad, line});
+    group.Add(read, slot, {good}).Fails(kState, {bad, kNotAvailable, line}).Fails(reads, {bad, line});
 }
 
 std::string OpenAndDelete(Session&)
@@ -338,19 +344,19 @@ std::string OpenAndDelete(Session&)
 }
 
 /// The SIM manager's members without a forward in the facade.
-void AddSimManager(Rows& rows)
+void AddSimManager(Rows& rows, const Subject& subject)
 {
     using S = DASimManager;
     const Group single{rows, "DASimManager.cpp", Kind::Single, SimLock::AroundReads};
     const Group locked{rows, "DASimManager.cpp", Kind::Single, SimLock::Whole};
     single.AddRun({SymbolOf(&S::SuccessToInitTelephonyHandle), SymbolOf(&S::DeleteTelephonyHandle)}, OpenAndDelete, {"true 2"})
         .Fails(kOpen, {"false 0", "E > telephony_init Failed."});
-    single.Add<bool(Slots, int)>(&S::IsSimAvailable, {"", 1}, {"true"}).Fails(kState, {"false", "E > Sim is not available"});
-    AddReader<const char>(single, &S::GetMCCFromSim, kImsi, "0 262", "4 null", "E > fail to get MCC");
-    AddReader<char>(single, &S::GetMNCFromSim, kImsi, "0 01", "4 null", "E > fail to get MNC");
-    AddReader<char>(single, &S::GetIMSIFromSim, kImsi, "0 262019876543210", "4 null", "E > fail to get imsi");
-    AddReader<char>(
-        single, &S::GetPhoneNumberFromSim, kNumber, "0 +4915112345678", "-39841791 null", "E > fail to get phoneNumber");
+    single.Add<bool(Slots, int)>(&S::IsSimAvailable, subject.slot, {"true"}).Fails(kState, {"false", "E > Sim is not available"});
+    AddReader<const char>(single, subject.slot, &S::GetMCCFromSim, kImsi, "0 262", "4 null", "E > fail to get MCC");
+    AddReader<char>(single, subject.slot, &S::GetMNCFromSim, kImsi, "0 01", "4 null", "E > fail to get MNC");
+    AddReader<char>(single, subject.slot, &S::GetIMSIFromSim, kImsi, "0 262019876543210", "4 null", "E > fail to get imsi");
+    AddReader<char>(single, subject.slot, &S::GetPhoneNumberFromSim, kNumber, "0 +4915112345678", "-39841791 null",
+        "E > fail to get phoneNumber");
     locked.Add<bool(telephony_data**, telephony_sim_state_e*)>(&S::GetSimState, {}, {"true 2"}).Fails(kState, {"false"});
 }
 
@@ -393,10 +399,11 @@ void AddInstance(Rows& rows, const char* file, const std::string& failure)
 
 } // namespace
 
-const std::vector<Operation>& Operations()
+const std::vector<Operation>& Operations(const char* modem, int slot)
 {
-    static const std::vector<Operation> operations = []
+    static const std::vector<Operation> operations = [modem, slot]
     {
+        const Subject subject{{modem}, {"", static_cast<double>(slot)}};
         Rows all;
         AddInstance<DASystem>(all, "DASystem.cpp", "CoreSystem()");
         AddInstance<DASimManager>(all, "DASimManager.cpp", "SimManager()");
@@ -404,12 +411,12 @@ const std::vector<Operation>& Operations()
         AddInstance<DAConnectionManager>(all, "DAConnectionManager.cpp", "ConnectionManager()");
         AddConnection<DASystem>(all);
         AddConnection<DAConnectionManager>(all);
-        AddSim<DASystem>(all);
-        AddSim<DASimManager>(all);
+        AddSim<DASystem>(all, subject);
+        AddSim<DASimManager>(all, subject);
         AddCountry<DASystem>(all);
         AddCountry<DASimManager>(all);
         AddFacade(all);
-        AddSimManager(all);
+        AddSimManager(all, subject);
         AddBusManager(all);
         return all;
     }();

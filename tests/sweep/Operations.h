@@ -52,8 +52,8 @@ struct Operation
     bool IsLockedAt(Call call) const;
 };
 
-/// Every public member of the facade and the managers.
-const std::vector<Operation>& Operations();
+/// Every public member of the facade and the managers. The first call decides which modem and slot they are asked about.
+const std::vector<Operation>& Operations(const char* modem = "modem1", int slot = 1);
 
 } // namespace kiv::test
 
