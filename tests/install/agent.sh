@@ -30,6 +30,7 @@ CMAKE
     run_agent "$scratch/with-cmake/agent"
 }
 
+# Checks that the agent prints what the README shows.
 # KIV_EMULATOR is the command that runs programs of a cross build, word by word; otherwise it is empty.
 run_agent() # agent
 {
@@ -38,5 +39,5 @@ run_agent() # agent
     single=$(KIV_PROFILE=single ${KIV_EMULATOR-} "$1")
     none=$(KIV_PROFILE=no-telephony ${KIV_EMULATOR-} "$1") && exit 1
     printf '%s\n%s\n' "$single" "$none"
-    [[ $single == "SIM of "*", network "* && $none == "no SIM answers" ]]
+    grep --quiet --line-regexp --fixed-strings "$single" "$readme" && grep --quiet --line-regexp --fixed-strings "$none" "$readme"
 }

@@ -152,8 +152,8 @@ void AddDevice(CLI::App& app, Command& command)
     const auto [get, value] =
         AddVerb(*device, command, "get", "Show the device's values under the keys of a device file", ShowDeviceValues);
     AddFields(get, command, {"key", "value"});
-    get->add_option("GROUP.KEY", value->key, "Print only this value");
-    AddShowIds(get, command, "Also show values unmasked that identify a person or a device, as with GROUP.KEY");
+    get->add_option("GROUP.KEY", value->key, "Print only this value, unmasked");
+    AddShowIds(get, command, "Show values unmasked that identify a person or a device");
     AddFields(AddVerb(*device, command, "keys", "List the keys of a device file", ShowDeviceKeys, DeviceUse::Leaves), command,
         {"key", "values", "default", "meaning"});
 
@@ -186,7 +186,8 @@ void AddSim(CLI::App& app, Command& command)
         AddVerb(*sim, command, "wait", "Wait until a SIM is usable, checking once per second", WaitForSim);
     AddFields(wait, command, {"usable_slot", "waited_seconds"});
     addSlot(wait, *waitOptions);
-    wait->add_option("--timeout", waitOptions->timeout, "Maximum wait in seconds (default: until no SIM can become usable)")
+    wait->add_option(
+            "--timeout", waitOptions->timeout, "Maximum wait in seconds (default: no limit while a SIM can still become usable)")
         ->type_name("SECONDS")
         ->transform(Numbers(0.0, "0 or a positive number"));
 }
