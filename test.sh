@@ -1,6 +1,6 @@
 #!/bin/bash
-# Installs missing packages, then builds and runs the tests: plain and with sanitizers. Ends with CTest's summary of the plain
-# run.
+# Installs missing packages, then builds and runs the tests with and without sanitizers. Ends with CTest's summary of the plain
+# build.
 set -euo pipefail
 cd "$(dirname "$(readlink -f "$0")")"
 
@@ -8,11 +8,11 @@ usage()
 {
     cat <<'TEXT'
 usage: ./test.sh [--all | --arch armhf | --arch arm64]
-  Build in build/ and run the tests with AddressSanitizer and UBSan, with ThreadSanitizer, and plain.
-  --all  the same with clang++ too, clang-format over all sources, clang-tidy over all but the tests, 30 seconds of each fuzz
-         target, real modem and network daemons, and the checks of packages, a device's build, documents and country data; then
-         plain for both ARM processors, with the checks of their packages and a device's build
-  --arch  builds for that processor alone, plain, and runs the tests with qemu-user-static
+  Build in build/, and run the tests three times: with AddressSanitizer and UBSan, with ThreadSanitizer, and in a plain build.
+  --all   Also build with clang++; check the format of all sources; run clang-tidy on all sources except the tests; run each fuzz
+          target for 30 seconds; use real modem and network daemons; check packages, a device's build, documents and country data;
+          and test plain builds for both ARM processors, with their packages
+  --arch  Only build for this processor, without sanitizers, and run the tests with qemu-user-static
 TEXT
 }
 
@@ -32,7 +32,7 @@ say()
     printf '\n== %s\n' "$*"
 }
 
-# Runs a command whose output matters only when it fails.
+# Runs a command. Prints its output only if it fails.
 quietly() # command...
 {
     local log

@@ -1,5 +1,5 @@
-# Uses a device's own libraries instead of platform/ and lib/kiv_util, by their pkg-config names. Every name is a cache variable; of
-# several names, the first one found is used.
+# Uses a device's own libraries instead of platform/ and lib/kiv_util, by their pkg-config names. Every name is a cache variable. If a
+# variable has several names, the first one found is used.
 add_library(kiv_platform INTERFACE)
 add_library(kiv_util INTERFACE)
 set_target_properties(kiv_platform PROPERTIES EXPORT_NAME platform)
