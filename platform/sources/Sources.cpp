@@ -90,24 +90,20 @@ public:
     {
         const std::unique_ptr<char, decltype(&g_free)> directory(g_path_get_dirname(path.c_str()), g_free);
         descriptor_ = open(directory.get(), O_RDONLY | O_DIRECTORY | O_CLOEXEC);
-        if (descriptor_ < 0 || TEMP_FAILURE_RETRY(flock(descriptor_, LOCK_EX)) != 0)
+        if (descriptor_ < 0)
+            throw DeviceFileError(path + ": its directory cannot be opened: " + g_strerror(errno));
+        if (TEMP_FAILURE_RETRY(flock(descriptor_, LOCK_EX)) != 0)
         {
             const std::string reason = g_strerror(errno);
-            Close();
+            close(descriptor_);
             throw DeviceFileError(path + ": its directory cannot be locked: " + reason);
         }
     }
     DirectoryLock(const DirectoryLock&) = delete;
     DirectoryLock& operator=(const DirectoryLock&) = delete;
-    ~DirectoryLock() { Close(); }
+    ~DirectoryLock() { close(descriptor_); }
 
 private:
-    void Close() const
-    {
-        if (descriptor_ >= 0)
-            close(descriptor_);
-    }
-
     int descriptor_ = -1;
 };
 

@@ -52,16 +52,17 @@ TEST_F(KivctlTest, CarriesEveryNotificationToItsReceivers)
     EXPECT_EQ("sent subscribers=2 delivered=2\n", Kivctl("notify --imsi 1 on off --service 8 --service 7").out);
     other.Await("status imsi='1' service_id=8 status='on'\n");
 
-    for (const char* what : {"push 7", "push other", "status 7", "push mail"}) // advice names only the record that failed
+    for (const char* what :
+        {"push 7", "push other", "status 7", "status 9", "push mail"}) // advice names only the record that failed
         ASSERT_EQ(0, Kivctl(std::string("subscribers add ") + what + " org.gone.Away /a a.b").exit);
-    for (const std::string arguments :
-        {"notify --imsi 1 on --service 7", "push mail --data '{\"a\":1}' --message 'two words' --time -5000000000"})
+    for (const std::string arguments : {"notify --imsi 1 on off --service 8 --service 9", "notify --imsi 1 on --service 7",
+             "push mail --data '{\"a\":1}' --message 'two words' --time -5000000000"})
     {
         const Outcome sent = Kivctl(arguments);
         EXPECT_EQ(1, sent.exit) << arguments;
         EXPECT_EQ("sent subscribers=2 delivered=1\n", sent.out) << arguments;
-        const std::string kind = arguments[0] == 'p' ? "push mail" : "status 7";
-        EXPECT_THAT(sent.err, HasSubstr("remove its record: kivctl subscribers remove " + kind + " org.gone.Away /a a.b\n"));
+        const std::string event = arguments[0] == 'p' ? "push mail" : std::string("status ") + arguments.back();
+        EXPECT_THAT(sent.err, HasSubstr("remove its record: kivctl subscribers remove " + event + " org.gone.Away /a a.b\n"));
     }
     all.Await("push service_id='mail' data='{\"a\":1}' message='two words' time=-5000000000\n");
     Kivctl("push mail --data d --message now\xe2\x80\xa8");
@@ -112,6 +113,25 @@ TEST_F(KivctlTest, EscapesTheErrorTextsOfOthers)
         EXPECT_THAT(
             sent.err, AllOf(HasSubstr("\\x1b[31m\\nforged"), testing::Not(HasSubstr("\x1b")), testing::Not(HasSubstr("\nforged"))));
     }
+}
+
+TEST_F(KivctlTest, SaysInPlainWordsWhyACallFailed)
+{
+    for (const char* record : {"auth all", "push m"})
+        Kivctl(std::string("subscribers add ") + record + " a.b /a a.b");
+    for (const auto& [name, reason] :
+        std::map<std::string, const char*>{{"org.freedesktop.DBus.Error.AccessDenied", "this user is not allowed to call it\n"},
+            {"org.freedesktop.DBus.Error.NoReply", "it left the bus without an answer\n"},
+            {"a.b.Error", "it answered with the error a.b.Error: (a reason)\n"}})
+    {
+        const auto fail = [error = name](GDBusMessage* call)
+        { return g_dbus_message_new_method_error_literal(call, error.c_str(), "(a reason)"); };
+        const Peer manager(bus, "org.tizen.servicemanager.service", fail), client(bus, "a.b", fail),
+            board(bus, "org.tizen.system.deviced", fail);
+        for (const char* arguments : {"notify auth --to manager", "notify auth", "push m --data d --message m", "device id"})
+            EXPECT_THAT(Kivctl(arguments).err, HasSubstr(reason)) << arguments;
+    }
+    EXPECT_THAT(Kivctl("notify auth --to manager").err, HasSubstr("\n  no program owns the name\n"));
 }
 
 TEST_F(KivctlTest, LimitsTheWaitForAServiceThatIsStuck)

@@ -118,6 +118,7 @@ TEST_F(KivctlTest, CompletesAWordFromTheWordsBeforeIt)
         {"profiles show roa", "roaming\tone slot, its SIM roaming, with data allowed\n"},
         {"network --profile=ro", "--profile=roaming\tone slot, its SIM roaming, with data allowed\n:files\n"},
         {"-p nothing", ":files\n"},
+        {"subscribe --store=s", ":files\n"},
         {"notify on --to ''", "subscribers\nmanager\n"},
         {"notify on --service 7 po", "policy\n"},
         {"--color=a", "--color=auto\n--color=always\n"},

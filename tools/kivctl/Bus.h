@@ -30,4 +30,11 @@ using BusConnection = std::unique_ptr<GDBusConnection, BusRelease>;
 /// @return the process's shared connection, which the library's calls use while it is kept
 BusConnection RequireBus();
 
+/// The reason when a bus name has no owner and is not started.
+inline constexpr char kNoOwner[] = "no program owns the name, and the bus cannot start one";
+
+/// The reason why a call on the bus failed, in plain words.
+/// @param logged  the library's line about it
+std::string ReasonOf(const std::string& logged);
+
 #endif

@@ -166,12 +166,13 @@ Candidates ValuesOf(const OptionManual& option, const VerbManual& verb, const st
         candidates = Profiles();
         const kiv::platform::Profile host = kiv::platform::HostProfile();
         candidates.push_back({host.name, host.description});
-        candidates.push_back({kFiles});
     }
     if (option.names.back() == "--from" || option.names.back() == "PROFILE")
         return Profiles();
     for (const std::string& word : option.words)
         candidates.push_back({word});
+    if (option.value.find("FILE") != option.value.npos)
+        candidates.push_back({kFiles});
     return candidates;
 }
 

@@ -41,8 +41,10 @@ Finding CheckBus(const Command&)
 {
     if (Bus().code == KIV_RESULT_SUCCESS)
         return {Bus().address};
+    const bool isStuck = Bus().code == KIV_RESULT_BUS_TIMED_OUT;
     return {Bus().address + ": " + MeaningOf(Bus().code) + ": " + Bus().trouble,
-        "start dbus-daemon, and set DBUS_SYSTEM_BUS_ADDRESS to its address"};
+        isStuck ? "restart the bus, or set DBUS_SYSTEM_BUS_ADDRESS to the address of another one"
+                : "start dbus-daemon, and set DBUS_SYSTEM_BUS_ADDRESS to its address"};
 }
 
 /// A new reference to the shared connection; null when the bus does not answer.

@@ -1,5 +1,6 @@
 #include "Kivctl.h"
 
+#include "Bus.h"
 #include "Layout.h"
 
 #include <DeviceControl.h>
@@ -49,7 +50,9 @@ void RequireSuccess(int code, const std::vector<std::string>& log)
     if (code == KIV_RESULT_SUCCESS)
         return;
     const CodeMeaning meaning = Find(code);
-    throw Failure(meaning.exit, std::string(meaning.meaning) + "; " + meaning.remedy, log);
+    std::vector<std::string> reasons(log.size());
+    std::transform(log.begin(), log.end(), reasons.begin(), ReasonOf);
+    throw Failure(meaning.exit, std::string(meaning.meaning) + "; " + meaning.remedy, reasons);
 }
 
 std::string MeaningOf(int code)

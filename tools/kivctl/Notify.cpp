@@ -45,13 +45,6 @@ bool IsSwitch(const std::string& word)
     return std::string("status") == TypeOf(word).kind;
 }
 
-/// The key of the subscriptions that receive the event; empty for several events, whose keys differ.
-std::string KeyOf(const NotifyOptions& options)
-{
-    const size_t services = options.services.size();
-    return services == 0 ? "all" : services == 1 ? std::to_string(options.services.front()) : "";
-}
-
 bool TakesTexts(const std::string& type)
 {
     return type == "policy" || type == "number_changed";
@@ -82,11 +75,12 @@ void CheckOptions(const NotifyOptions& options)
 struct Delivery
 {
     std::string busName;
+    size_t event;        ///< which of the events, counted from 0
     std::string trouble; ///< empty when it was answered
 };
 
-/// Follows the library's walk over the subscribers by the lines that it logs: first a record's bus name, then an error line if the
-/// call failed. Error lines before the first record say why there was no walk.
+/// Follows the library's walks over the subscribers, one per event, by the lines that it logs: "begin", then a record's bus name,
+/// then an error line if the call failed. Error lines before the first record say why there was no walk.
 class Walk
 {
 public:
@@ -94,8 +88,10 @@ public:
     {
         static const std::string kBusName = "busname: ";
         const bool isError = line.level == LibraryLine::Level::Error;
-        if (!isError && line.message.rfind(kBusName, 0) == 0)
-            deliveries_.push_back({line.message.substr(kBusName.size()), ""});
+        if (!isError && line.message == "begin")
+            ++begun_;
+        else if (!isError && line.message.rfind(kBusName, 0) == 0)
+            deliveries_.push_back({line.message.substr(kBusName.size()), begun_ - 1, ""});
         else if (isError && deliveries_.empty())
             refusals_.push_back(line.message);
         else if (isError && line.message.rfind(' ', 0) != 0) // the lines that begin with a blank repeat the record
@@ -106,6 +102,7 @@ public:
     const std::vector<std::string>& Refusals() const { return refusals_; }
 
 private:
+    size_t begun_ = 0;
     std::vector<Delivery> deliveries_;
     std::vector<std::string> refusals_;
 };
@@ -120,7 +117,8 @@ std::string Explained(const Delivery& delivery, const NotifyOptions& options, bo
 {
     if (wasMissed && IsClosed(delivery.trouble))
         return "no answer in time";
-    return DeliveryTrouble(delivery.trouble, TypeOf(options.types.front()).kind, KeyOf(options), delivery.busName);
+    const std::string key = options.services.empty() ? "all" : std::to_string(options.services.at(delivery.event));
+    return DeliveryTrouble(delivery.trouble, TypeOf(options.types.front()).kind, key, delivery.busName);
 }
 
 /// Sends the notifications through the facade. @return its result code

@@ -1,5 +1,7 @@
 #include "StaleRecord.h"
 
+#include "Bus.h"
+
 #include <glib.h>
 
 #include <vector>
@@ -30,9 +32,9 @@ std::string RemovalOf(const DASubscription& subscription)
 
 std::string DeliveryTrouble(const std::string& trouble, const std::string& kind, const std::string& key, const std::string& busName)
 {
-    if (trouble.find("org.freedesktop.DBus.Error.ServiceUnknown") == trouble.npos &&
-        trouble.find("org.freedesktop.DBus.Error.NameHasNoOwner") == trouble.npos)
-        return trouble;
+    const std::string why = ReasonOf(trouble);
+    if (why != kNoOwner)
+        return why;
     std::vector<DASubscription> subscriptions;
     std::string reason;
     DASubscriberStore().List(subscriptions, reason);
@@ -41,10 +43,9 @@ std::string DeliveryTrouble(const std::string& trouble, const std::string& kind,
         const _SubscriberInfo& who = subscription.subscriber;
         const bool isNamed =
             busName.empty() ? trouble.find("The name " + who.busname + " ") != trouble.npos : who.busname == busName;
-        if (subscription.kind != kind || (!key.empty() && subscription.key != key) || !isNamed)
+        if (subscription.kind != kind || subscription.key != key || !isNamed)
             continue;
-        return "no program owns the name, and the bus cannot start one; start the service, or remove its record: " +
-               RemovalOf(subscription);
+        return why + "; start the service, or remove its record: " + RemovalOf(subscription);
     }
-    return trouble;
+    return why;
 }

@@ -12,7 +12,7 @@ std::string RemovalOf(const DASubscription& subscription);
 /// which is looked up in the store.
 /// @param trouble  as the library logs it
 /// @param kind     of the subscription
-/// @param key      of the subscription; empty for any
+/// @param key      of the subscription
 /// @param busName  of the subscriber; empty where only `trouble` names it
 std::string DeliveryTrouble(
     const std::string& trouble, const std::string& kind, const std::string& key, const std::string& busName);

@@ -302,15 +302,17 @@ void Restrict(CLI::Option* option, const std::vector<std::string>& words, std::m
     {
         const auto same = [](char one, char other)
         { return one == other || (one == '-' && other == '_') || (one == '_' && other == '-'); };
+        std::vector<std::string> accepted;
         for (const auto& [word, meaning] : meanings)
         {
+            accepted.push_back(word);
             if (std::equal(typed.begin(), typed.end(), word.begin(), word.end(), same))
             {
                 typed = meaning;
                 return "";
             }
         }
-        return '"' + typed + "\" is invalid" + DidYouMean(typed, words) + "; expected one of " + Joined(words, ", ");
+        return '"' + typed + "\" is invalid" + DidYouMean(typed, accepted) + "; expected one of " + Joined(words, ", ");
     };
     option->type_name(Joined(words, kOr))->transform(CLI::Validator(check, ""));
 }
