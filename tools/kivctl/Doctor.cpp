@@ -90,7 +90,7 @@ Finding CheckService(const Service& service)
 {
     g_autoptr(GDBusConnection) connection = Connection();
     if (!connection)
-        return {"not asked without a bus", "start the bus first"};
+        return {"not checked without a bus", "start the bus first"};
     const std::string name = service.busName;
     g_autoptr(GError) error = nullptr;
     g_autoptr(GVariant) reply = g_dbus_connection_call_sync(connection, service.busName, service.path, service.interface,
@@ -142,7 +142,7 @@ Finding CheckSubscriptionService(const Command&)
 {
     g_autoptr(GDBusConnection) connection = Connection();
     if (!connection)
-        return {"not asked without a bus", "start the bus first"};
+        return {"not checked without a bus", "start the bus first"};
     const std::string name = kiv::SubscriptionService::kBusName;
     std::set<std::string> running, startable;
     if (!AddNames(connection, "ListNames", running) || !AddNames(connection, "ListActivatableNames", startable))
@@ -159,7 +159,7 @@ Finding CheckHostDaemon(const char* name, const std::string& unit, const char* i
 {
     g_autoptr(GDBusConnection) connection = Connection();
     if (!connection)
-        return {"not asked without a bus", "start the bus first"};
+        return {"not checked without a bus", "start the bus first"};
     g_autoptr(GError) error = nullptr;
     g_autoptr(GVariant) reply = g_dbus_connection_call_sync(connection, interface, path, "org.freedesktop.DBus.Properties", "Get",
         g_variant_new("(ss)", interface, "Version"), G_VARIANT_TYPE("(v)"), G_DBUS_CALL_FLAGS_NO_AUTO_START, kPatienceMs, nullptr,
