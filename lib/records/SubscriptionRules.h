@@ -18,9 +18,9 @@ inline bool IsKind(const std::string& text)
 
 inline std::string KindWanted()
 {
-    std::string wanted = "one of these is needed:";
+    std::string wanted = "is invalid; expected one of";
     for (const char* const kind : kKinds)
-        wanted.append(" ").append(kind);
+        wanted.append(kind == kKinds[0] ? " " : ", ").append(kind);
     return wanted;
 }
 
@@ -51,14 +51,14 @@ inline bool IsServiceId(const std::string& text)
            (digits.front() != '0' || text == "0");
 }
 
-/// Returns what a valid key would be; null if the key is valid.
+/// Returns what is wrong with a key and what is expected; null if the key is valid.
 inline const char* WantedKey(const std::string& kind, const std::string& key)
 {
     if (key.empty() || key.size() > 255 || g_utf8_validate(key.data(), static_cast<gssize>(key.size()), nullptr) == FALSE ||
         !IsPlain(key))
-        return "1 to 255 bytes of UTF-8 without control or invisible characters are needed, such as 7 or all";
+        return "is invalid; expected 1 to 255 bytes of UTF-8 without control or invisible characters, such as 7 or all";
     if ((kind == "policy" || kind == "status") && !IsServiceId(key))
-        return "a service ID is needed: a decimal number, of which the first nine characters count, such as 7";
+        return "is invalid; expected a service ID, a decimal number of at most nine characters, such as 7";
     return nullptr;
 }
 
@@ -67,24 +67,24 @@ inline constexpr std::size_t kMostPathBytes = 1024;
 inline std::string Refusal(const char* field, const std::string& value, const std::string& wanted)
 {
     const g_autofree char* shown = g_strescape(value.c_str(), nullptr);
-    return std::string(field) + " \"" + shown + "\": " + wanted;
+    return std::string(field) + " \"" + shown + "\" " + wanted;
 }
 
 /// Returns why a subscription is invalid; empty when it is valid.
 inline std::string ObjectionTo(const std::string& kind, const std::string& key, const std::string& busName,
     const std::string& objectPath, const std::string& interface)
 {
-    constexpr const char* kName = "two or more elements joined by dots are needed, such as org.example.Client";
+    constexpr const char* kName = "is invalid; expected two or more elements joined by dots, such as org.example.Client";
     constexpr const char* kPath =
-        "elements of letters, digits and underscores, a slash before each, are needed, such as /org/example/Client";
-    constexpr const char* kReserved = "the bus reserves names that begin like this and disconnects their callers";
+        "is invalid; expected a slash before each element of letters, digits and underscores, such as /org/example/Client";
+    constexpr const char* kReserved = "is reserved, like all names with this beginning; the bus disconnects their callers";
 
     if (!IsKind(kind))
         return Refusal("kind", kind, KindWanted());
     if (const char* const wanted = WantedKey(kind, key))
         return Refusal("key", key, wanted);
     if (objectPath.size() > kMostPathBytes)
-        return Refusal("object path", objectPath, "at most " + std::to_string(kMostPathBytes) + " bytes are possible");
+        return Refusal("object path", objectPath, "is too long; expected at most " + std::to_string(kMostPathBytes) + " bytes");
 
     switch (FlawOf(busName, objectPath, interface))
     {

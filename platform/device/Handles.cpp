@@ -118,7 +118,8 @@ void Handles::NoteMisuse(HandleKind kind, const void* handle, Call user, const c
     if (last != nullptr && handle != nullptr)
         misuses_.push_back(start + whenClosed + ": " + platform::Describe(last->kind, last->slot, last->opening));
     else
-        misuses_.push_back(start + "needs a " + wanted + ", got " + (handle != nullptr ? "what never was a handle" : "null"));
+        misuses_.push_back(
+            start + "needs a " + wanted + ", got " + (handle != nullptr ? "a pointer that was never a handle" : "null"));
 }
 
 } // namespace kiv::platform

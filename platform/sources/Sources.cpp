@@ -191,7 +191,7 @@ std::string MakeDeviceFile(const std::string& path, const std::string& profile, 
             if (found == nullptr)
                 FailUnknown(profile, "not a profile");
             if (Exists(path))
-                throw DeviceFileError(path + ": exists already; expected the name of a new file");
+                throw DeviceFileError(path + ": already exists; expected the name of a new file");
             return ChangeText(found->text, path, assignments);
         });
 }

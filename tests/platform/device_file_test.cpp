@@ -217,7 +217,7 @@ TEST_F(Changes, StartFromTheProfileThatIsNamedOrInUse)
     EXPECT_EQ("", SetInDeviceFile(other, {}, &madeFrom));
     EXPECT_EQ("roaming", madeFrom);
     EXPECT_EQ(kiv::test::Contents(other), *TextOfProfile("roaming"));
-    EXPECT_EQ(other + ": exists already; expected the name of a new file", MakeDeviceFile(other, "none", {}));
+    EXPECT_EQ(other + ": already exists; expected the name of a new file", MakeDeviceFile(other, "none", {}));
     EXPECT_EQ("", SetInDeviceFile(other, {}, &madeFrom));
     EXPECT_EQ("", madeFrom);
     std::filesystem::remove(other);

@@ -13,7 +13,7 @@ TEST_F(KivctlTest, ShowsAndChangesTheValuesOfADeviceFile)
         {"-p ./x device set --from roaming runtime.wifi-status=2", 0, "", ""},
         {"-p ./x device get runtime.wifi-status", 0, "connected\n", ""},
         {"-p ./x device get profile.description -t", 0, "profile.description:one slot, its SIM roaming, with data allowed\n", ""},
-        {"-p ./x device set --from single", 10, "", "./x: exists already; "},
+        {"-p ./x device set --from single", 10, "", "./x: already exists; "},
         {"-p ./x device unset runtime.wifi-status runtime.nothing", 10, "", "[runtime] nothing: not in the file"},
         {"-p ./x device get runtime.wifi-status", 0, "connected\n", ""},
         {"-p ./x device unset runtime.wifi-status sim0.number", 0, "", ""},

@@ -18,7 +18,7 @@ constexpr int kPatienceMs = 5000; // maximum wait for other processes that use t
 constexpr const char* kPermit = "allow this user to read and write the file and its directory";
 constexpr const char* kTryAgain = "try again when no other process keeps it busy";
 constexpr const char* kNameAnother = "set KIV_SUBSCRIBERS to another file";
-constexpr const char* kMakeRoom = "make room on the disk";
+constexpr const char* kMakeRoom = "free space on the disk";
 
 constexpr const char* kSchema =
     "BEGIN;"
@@ -85,7 +85,7 @@ void MakeFile(const std::string& path)
     if (file >= 0)
         close(file);
     else if (errno != EEXIST)
-        throw StoreTrouble(path, std::string("the file cannot be made: ") + g_strerror(errno), Advice(errno));
+        throw StoreTrouble(path, std::string("the file cannot be created: ") + g_strerror(errno), Advice(errno));
 }
 
 } // namespace
@@ -130,7 +130,7 @@ StoreConnection::StoreConnection(std::string path, Use use) : path_(std::move(pa
 {
     const g_autofree char* directory = g_path_get_dirname(path_.c_str());
     if (use == Use::Make && g_mkdir_with_parents(directory, 0700) != 0)
-        throw StoreTrouble(directory, std::string("the directory cannot be made: ") + g_strerror(errno), Advice(errno));
+        throw StoreTrouble(directory, std::string("the directory cannot be created: ") + g_strerror(errno), Advice(errno));
     if (use == Use::Change || use == Use::Make)
         lock_ = std::make_unique<DirectoryLock>(directory);
     if (use == Use::Make)
