@@ -70,7 +70,7 @@ bool Exists(const std::string& path)
 Origin Open(const std::string& nameOrPath)
 {
     if (nameOrPath == kHost)
-        return Host::Open();
+        return OpenHost();
 
     if (const EmbeddedProfile* const profile = Find(nameOrPath))
         return {ReadDevice(profile->text, "profile " + nameOrPath), std::make_shared<EmbeddedSource>(*profile)};

@@ -2,7 +2,7 @@
 
 #include <HostFiles.h>
 #include <ITapiSim.h>
-#include <Reports.h>
+#include <Services.h>
 #include <net_connection.h>
 #include <telephony.h>
 #include <wifi.h>
@@ -12,30 +12,29 @@ using namespace kiv::platform;
 namespace
 {
 
-/// Objects in GVariant's text form, "a{oa{sa{sv}}}".
-Objects Parse(const std::string& text)
+/// Adds objects in the text form of GVariant's dictionary entries "{oa{sa{sv}}}".
+void Read(const std::string& text, Reports& reports)
 {
     g_autoptr(GError) error = nullptr;
-    g_autoptr(GVariant) all = g_variant_parse(G_VARIANT_TYPE("a{oa{sa{sv}}}"), text.c_str(), nullptr, nullptr, &error);
-    EXPECT_NE(nullptr, all) << text << ": " << (error != nullptr ? error->message : "");
-    Objects objects;
-    GVariantIter paths;
+    g_autoptr(GVariant) all =
+        g_variant_parse(G_VARIANT_TYPE("a{oa{sa{sv}}}"), ("{" + text + "}").c_str(), nullptr, nullptr, &error);
+    ASSERT_NE(nullptr, all) << text << ": " << error->message;
+    GVariantIter objects;
     const char* path = nullptr;
-    GVariantIter* interfaces = nullptr;
-    for (g_variant_iter_init(&paths, all); g_variant_iter_loop(&paths, "{&oa{sa{sv}}}", &path, &interfaces) != FALSE;)
-    {
-        const char* interface = nullptr;
-        GVariantIter* properties = nullptr;
-        while (g_variant_iter_loop(interfaces, "{&sa{sv}}", &interface, &properties) != FALSE)
-        {
-            const char* name = nullptr;
-            GVariant* value = nullptr;
-            objects[path][interface];
-            while (g_variant_iter_next(properties, "{&sv}", &name, &value) != FALSE)
-                objects[path][interface][name] = Variant(value, g_variant_unref);
-        }
-    }
-    return objects;
+    GVariant* interfaces = nullptr;
+    for (g_variant_iter_init(&objects, all); g_variant_iter_loop(&objects, "{&o@a{sa{sv}}}", &path, &interfaces) != FALSE;)
+        ReadObject(path, interfaces, reports);
+}
+
+/// What services report that are there if they have objects.
+Reports Present(const std::string& modems, const std::string& network = "", const std::string& bluetooth = "")
+{
+    Reports reports;
+    reports.modemManager = modems.empty() ? Presence::Absent : Presence::Present;
+    reports.networkManager = network.empty() ? Presence::Absent : Presence::Present;
+    for (const std::string& objects : {modems, network, bluetooth})
+        Read(objects, reports);
+    return reports;
 }
 
 constexpr char kSims[] =
@@ -67,11 +66,6 @@ std::string Switches(bool wifi, bool wwan, const std::string& more = "")
            "'WwanHardwareEnabled': <true>, 'WirelessEnabled': " + word(wifi) + ", 'WwanEnabled': " + word(wwan) + more + "}}";
 }
 
-ServiceReport Present(const std::string& objects)
-{
-    return {Presence::Present, Parse("{" + objects + "}")};
-}
-
 Device Described(const Reports& reports)
 {
     Device device;
@@ -81,7 +75,7 @@ Device Described(const Reports& reports)
 
 SimSlot OnlySlot(const std::string& properties, const std::string& interfaces = "")
 {
-    const Device device = Described({Present(kSims + (", " + Modem("/modem", properties, interfaces))), {}, {}});
+    const Device device = Described(Present(kSims + (", " + Modem("/modem", properties, interfaces))));
     EXPECT_EQ(1U, device.slots.size());
     return device.slots.empty() ? SimSlot() : device.slots[0];
 }
@@ -114,10 +108,12 @@ TEST(Modem, WithoutACardOrWithOneThatIsNotReadYetIsNotReady)
     {
         const std::string modem =
             "'/modem': {'org.freedesktop.ModemManager1.Modem': {'State': <8>, 'Sim': <objectpath '" + sim + "'>}}";
-        return Described({Present(modem), {}, {}}).slots.at(0).cardStatus.at(0);
+        return Described(Present(modem)).slots.at(0).cardStatus.at(0);
     };
     EXPECT_EQ(TAPI_SIM_STATUS_CARD_NOT_PRESENT, card("/"));
     EXPECT_EQ(TAPI_SIM_STATUS_SIM_INITIALIZING, card("/sim"));
+    const std::string empty = "'/modem': {'org.freedesktop.ModemManager1.Modem': {'Sim': <objectpath '/'>}}";
+    EXPECT_TRUE(SimsOf(Present(empty)).empty()) << "nothing to read";
 }
 
 TEST(Modem, RegistrationGivesServiceRoamingAndReadinessForTexts)
@@ -146,8 +142,7 @@ TEST(Modem, RegistrationGivesServiceRoamingAndReadinessForTexts)
     {
         const auto& row = kRows[state];
         const std::string interfaces = Registered(state) + ", 'org.freedesktop.ModemManager1.Modem.Messaging': @a{sv} {}";
-        const Device device =
-            Described({Present(Modem("/modem", "'State': <8>, 'AccessTechnologies': <uint32 16384>", interfaces)), {}, {}});
+        const Device device = Described(Present(Modem("/modem", "'State': <8>, 'AccessTechnologies': <uint32 16384>", interfaces)));
         const SimSlot& slot = device.slots.at(0);
         EXPECT_EQ(std::tie(row.serviceState, row.roaming, row.serviceType, row.cellular),
             std::tie(slot.serviceState, slot.roaming, slot.serviceType, device.cellularState))
@@ -192,7 +187,7 @@ TEST(Modem, OperatorCodeSplitsTheImsiAndNothingElseDoes)
                                 "'>, 'OperatorIdentifier': <'" + row.ofSim + "'>}}";
         const std::string network =
             std::string(", 'org.freedesktop.ModemManager1.Modem.Modem3gpp': {'OperatorCode': <'") + row.ofNetwork + "'>}";
-        const Device device = Described({Present(sim + ", " + Modem("/modem", "'State': <8>", network)), {}, {}});
+        const Device device = Described(Present(sim + ", " + Modem("/modem", "'State': <8>", network)));
         const SimSlot& slot = device.slots.at(0);
         EXPECT_EQ(row.record, slot.mcc ? *slot.mcc + " " + *slot.mnc + " " + *slot.msin : "missing") << row.imsi;
         EXPECT_EQ(slot.mcc ? 0U : 1U, device.reasons.count("sim0.mcc"));
@@ -207,14 +202,21 @@ TEST(Modems, AreSlotsInTheNaturalOrderOfDeviceAndPort)
                                "'>, 'OwnNumbers': <['+1', '+2']>, " + "'EquipmentIdentifier': <'356938035643809'>");
     };
     const Device device = Described(
-        {Present(modem("/0", "/usb10", "tty1") + ", " + modem("/1", "/usb2", "tty10") + ", " + modem("/2", "/usb2", "tty9")), {},
-            {}});
+        Present(modem("/0", "/usb10", "tty1") + ", " + modem("/1", "/usb2", "tty10") + ", " + modem("/2", "/usb2", "tty9")));
     std::vector<std::string> names;
     for (const SimSlot& slot : device.slots)
         names.push_back(slot.cpName + " " + slot.number.value_or("") + " " + slot.imei.value_or(""));
     EXPECT_THAT(names, testing::ElementsAre("tty9 +1 356938035643809", "tty10 +1 356938035643809", "tty1 +1 356938035643809"));
     EXPECT_EQ(-1, device.defaultNetwork) << "of several nobody knows";
-    EXPECT_EQ(0, Described({Present(modem("/0", "/usb", "tty")), {}, {}}).defaultData) << "the only one";
+    EXPECT_EQ(0, Described(Present(modem("/0", "/usb", "tty"))).defaultData) << "the only one";
+}
+
+TEST(Modem, PropertiesOfAnotherTypeCountAsMissing)
+{
+    const SimSlot slot =
+        OnlySlot("'State': <'8'>, 'OwnNumbers': <uint32 1>, 'EquipmentIdentifier': <@as []>, 'PrimaryPort': <(1, 2)>");
+    EXPECT_EQ(std::vector<int>{TAPI_SIM_STATUS_UNKNOWN}, slot.cardStatus);
+    EXPECT_EQ(std::make_tuple(Text(), Text(), std::string()), std::tie(slot.number, slot.imei, slot.cpName));
 }
 
 TEST(Network, StateOfAWifiDeviceGivesItsConnection)
@@ -224,12 +226,12 @@ TEST(Network, StateOfAWifiDeviceGivesItsConnection)
     for (const auto& [state, expected] : kRows)
     {
         const auto& [connection, wifi] = expected;
-        const Device device = Described({{}, Present(Switches(true, true) + ", " + NetworkDevice("/1", 2, state)), {}});
+        const Device device = Described(Present("", Switches(true, true) + ", " + NetworkDevice("/1", 2, state)));
         EXPECT_EQ(std::make_pair(connection, wifi), std::make_pair(device.wifiConnectionState, device.wifiState)) << state;
         EXPECT_EQ(std::make_pair(1, wifi), std::make_pair(device.wifiDeviceState, device.wifiStatus)) << state;
     }
-    const Device two = Described(
-        {{}, Present(Switches(true, true) + ", " + NetworkDevice("/1", 2, 120) + ", " + NetworkDevice("/2", 2, 100)), {}});
+    const Device two =
+        Described(Present("", Switches(true, true) + ", " + NetworkDevice("/1", 2, 120) + ", " + NetworkDevice("/2", 2, 100)));
     EXPECT_EQ(WIFI_CONNECTION_STATE_CONNECTED, two.wifiConnectionState) << "the one that is furthest";
 }
 
@@ -239,6 +241,8 @@ TEST(Network, SwitchesGiveFlightModeAndMobileData)
     const std::string wifi = ", " + NetworkDevice("/1", 2, 30);
     const std::string off = "'/hci0': {'org.bluez.Adapter1': {'Powered': <false>}}";
     const std::string on = "'/hci0': {'org.bluez.Adapter1': {'Powered': <true>}}";
+    const std::string blocked = // by switches of the hardware
+        "'/org/freedesktop/NetworkManager': {'org.freedesktop.NetworkManager': {'WirelessEnabled': <true>, 'WwanEnabled': <true>}}";
     const struct
     {
         std::string modems, network, bluetooth;
@@ -250,13 +254,14 @@ TEST(Network, SwitchesGiveFlightModeAndMobileData)
         {modem, Switches(false, false) + wifi, off, true, false, 1, 0, 0},
         {modem, Switches(false, false) + wifi, on, false, false, 4, 0, 1},
         {modem, Switches(false, true) + wifi, off, false, true, 4, 0, 0},
+        {modem, blocked + wifi, off, true, false, 1, 0, 0},
         {"", Switches(false, false), "", false, false, 0, 0, 0}, // no radio at all
         {"", Switches(true, true), off, true, false, 1, 0, 0},   // the only radio
         {"", Switches(true, true) + ", " + NetworkDevice("/5", 5, 100), on, false, false, 0, 0, 2},
     };
     for (const auto& row : kRows)
     {
-        const Device device = Described({Present(row.modems), Present(row.network), Present(row.bluetooth)});
+        const Device device = Described(Present(row.modems, row.network, row.bluetooth));
         EXPECT_EQ(std::tie(row.flightMode, row.mobileData, row.mobileData, row.cellular, row.wifi, row.bluetoothState),
             std::tie(device.flightMode, device.mobileData, device.packetData, device.cellularState, device.wifiState,
                 device.bluetoothState))
@@ -268,10 +273,7 @@ TEST(Network, DecidesWhetherAModemIsConnectedWhereItKnowsIt)
 {
     const std::string connected = Modem("/modem", "'State': <11>", Registered(1));
     const auto cellular = [&](const std::string& network)
-    {
-        return Described({Present(connected), network.empty() ? ServiceReport() : Present(Switches(true, true) + network), {}})
-            .cellularState;
-    };
+    { return Described(Present(connected, network.empty() ? "" : Switches(true, true) + network)).cellularState; };
     const std::string udi = ", 'Udi': <'/modem'>";
     EXPECT_EQ(CONNECTION_CELLULAR_STATE_CONNECTED, cellular(""));
     EXPECT_EQ(CONNECTION_CELLULAR_STATE_AVAILABLE, cellular(", " + NetworkDevice("/1", 8, 30, udi)));
@@ -287,29 +289,36 @@ TEST(Network, ConnectionOfAModemGivesDataRoaming)
         NetworkDevice(
             "/1", 8, 100, ", 'ActiveConnection': <objectpath '/active'>, 'AvailableConnections': <[objectpath '/other']>") +
         ", '/active': {'org.freedesktop.NetworkManager.Connection.Active': {'Connection': <objectpath '/mine'>}}";
-    EXPECT_THAT(DetailsOfNetwork(Parse("{" + network + "}")), testing::ElementsAre(testing::Key("/mine")));
-    EXPECT_THAT(
-        DetailsOfNetwork(Parse("{" + NetworkDevice("/1", 8, 30, ", 'AvailableConnections': <[objectpath '/other']>") + "}")),
-        testing::ElementsAre(testing::Key("/other")));
+    EXPECT_THAT(ConnectionsOf(Present("", network)), testing::ElementsAre("/mine"));
+    EXPECT_THAT(ConnectionsOf(Present("", NetworkDevice("/1", 8, 30, ", 'AvailableConnections': <[objectpath '/other']>"))),
+        testing::ElementsAre("/other"));
+    const std::string wifi = NetworkDevice("/1", 2, 100, ", 'AvailableConnections': <[objectpath '/wifi']>");
+    EXPECT_TRUE(ConnectionsOf(Present("", wifi + ", " + NetworkDevice("/2", 8, 30))).empty());
     for (const auto& [settings, roaming] : {std::pair("@a{sv} {}", true), std::pair("{'home-only': <true>}", false)})
     {
         const std::string connection = std::string(", '/mine': {'gsm': ") + settings + "}";
-        EXPECT_EQ(roaming, Described({{}, Present(network + connection), {}}).dataRoaming) << settings;
+        EXPECT_EQ(roaming, Described(Present("", network + connection)).dataRoaming) << settings;
     }
-    EXPECT_FALSE(Described({{}, Present(network), {}}).dataRoaming) << "not read";
+    EXPECT_FALSE(Described(Present("", network)).dataRoaming) << "not read";
 }
 
 TEST(Reasons, SayWhichDaemonIsMissingOrRefuses)
 {
-    const auto reason = [](const Reports& reports, const char* key) { return Described(reports).reasons[key]; };
-    const ServiceReport absent, denied{Presence::Denied, {}}, present{Presence::Present, {}};
-    EXPECT_EQ("ModemManager does not run", reason({absent, present, {}}, "telephony.available"));
-    EXPECT_EQ("not permitted", reason({denied, present, {}}, "network.cellular"));
-    EXPECT_EQ("no modem", reason({present, present, {}}, "settings.mobile-data"));
-    EXPECT_EQ("NetworkManager does not run", reason({present, absent, {}}, "network.wifi"));
-    EXPECT_EQ("not permitted", reason({present, denied, {}}, "runtime.flight-mode"));
+    const auto reason = [](Presence modems, Presence network, const char* key)
+    {
+        Reports reports;
+        reports.modemManager = modems;
+        reports.networkManager = network;
+        return Described(reports).reasons[key];
+    };
+    constexpr Presence kAbsent = Presence::Absent, kDenied = Presence::Denied, kPresent = Presence::Present;
+    EXPECT_EQ("ModemManager does not run", reason(kAbsent, kPresent, "telephony.available"));
+    EXPECT_EQ("not permitted", reason(kDenied, kPresent, "network.cellular"));
+    EXPECT_EQ("no modem", reason(kPresent, kPresent, "settings.mobile-data"));
+    EXPECT_EQ("NetworkManager does not run", reason(kPresent, kAbsent, "network.wifi"));
+    EXPECT_EQ("not permitted", reason(kPresent, kDenied, "runtime.flight-mode"));
     const std::string wired = Switches(true, true, ", 'PrimaryConnectionType': <'802-3-ethernet'>");
-    EXPECT_EQ("a wired connection carries the traffic, and does not count here", reason({present, Present(wired), {}}, "network"));
+    EXPECT_EQ("a wired connection carries the traffic, and does not count here", Described(Present("", wired)).reasons["network"]);
 }
 
 /// Files of a machine, below a folder of the test's.
@@ -324,7 +333,7 @@ struct Files : testing::Test
     }
 
     const std::string root = mkdtemp((std::filesystem::temp_directory_path() / "kiv-host-XXXXXX").string().data());
-    const HostFiles files{root};
+    HostFiles files{root};
 };
 
 TEST_F(Files, TellNamesModelPlatformAndLanguage)
@@ -356,7 +365,7 @@ TEST_F(Files, TellNamesModelPlatformAndLanguage)
         Write(row.path, row.contents);
         Device device;
         device.*row.text = "before";
-        files.Read(device, row.text);
+        files.Refresh(device, row.text);
         EXPECT_EQ(row.expected, (device.*row.text).value_or("missing")) << row.path;
         EXPECT_EQ(device.*row.text ? 0U : 1U, device.reasons.size()) << row.path;
     }
@@ -366,7 +375,7 @@ TEST_F(Files, ThatAreMissingLeaveTextsMissingWithAReason)
 {
     g_setenv("LANG", "fr_FR.UTF-8", TRUE);
     Device device;
-    files.Read(device);
+    files.ReadAll(device);
     EXPECT_EQ("fr_FR", device.language) << "the environment's";
     EXPECT_FALSE(device.deviceName || device.modelName || device.platformName || device.platformVersion || device.tizenId ||
                  device.serial || device.salesCode || device.fontSize);
@@ -376,7 +385,7 @@ TEST_F(Files, ThatAreMissingLeaveTextsMissingWithAReason)
     {
         Write("/sys/class/dmi/id/product_serial", "S1");
         std::filesystem::permissions(root + "/sys/class/dmi/id/product_serial", std::filesystem::perms::none);
-        files.Read(device, &Device::serial);
+        files.Refresh(device, &Device::serial);
         EXPECT_EQ("not permitted", device.reasons["device.serial"]);
     }
 }
@@ -384,12 +393,13 @@ TEST_F(Files, ThatAreMissingLeaveTextsMissingWithAReason)
 TEST_F(Files, OfDpkgTellWhichPackagesAreInstalled)
 {
     Device device;
-    EXPECT_FALSE(files.ReadPackage(device, "one")) << "no dpkg";
+    EXPECT_FALSE(files.RefreshPackage(device, "one")) << "no dpkg";
     Write("/var/lib/dpkg/status", "Package: one\nStatus: install ok installed\nVersion: 1:2.3-4\n\n"
                                   "Package: two\nStatus: deinstall ok config-files\nVersion: 1\n\n"
-                                  "Package: three\nStatus: install ok installed\nDescription: see\n Package: four\nVersion: 3\n");
+                                  "Package: three\nDescription: see\n Package: four\nStatus: install ok installed\nVersion: 3\n");
+    device.packages["two"] = "0";
     for (const char* id : {"one", "two", "three", "four", "on"})
-        EXPECT_TRUE(files.ReadPackage(device, id));
+        EXPECT_TRUE(files.RefreshPackage(device, id));
     EXPECT_EQ((std::map<std::string, std::string>{{"one", "1:2.3-4"}, {"three", "3"}}), device.packages);
 }
 
@@ -397,7 +407,7 @@ TEST_F(Files, OfTheUsersShareTheirFreeSpace)
 {
     Device device;
     device.blocksAvailable = 0;
-    files.ReadStorage(device);
+    files.RefreshStorage(device);
     EXPECT_NE(0U, device.blocksAvailable);
     EXPECT_GE(device.blockSize, 512U);
 }

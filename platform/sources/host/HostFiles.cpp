@@ -1,8 +1,7 @@
 #include "HostFiles.h"
 
-#include <cerrno>
 #include <glib.h>
-#include <memory>
+#include <iterator>
 #include <string_view>
 #include <sys/statvfs.h>
 
@@ -12,166 +11,106 @@ namespace kiv::platform
 namespace
 {
 
-using Owned = std::unique_ptr<char, decltype(&g_free)>;
-
-// A text, or why there is none.
-struct Fact
-{
-    Text text;
-    const char* reason = "not available on this machine";
-};
-
-// The text of a file without the blanks around it, and without the NUL at the end of a device tree's file. An empty file has none.
-Fact ReadFile(const std::string& path)
-{
-    char* contents = nullptr;
-    g_autoptr(GError) error = nullptr;
-    if (g_file_get_contents(path.c_str(), &contents, nullptr, &error) == FALSE)
-        return {std::nullopt, g_error_matches(error, G_FILE_ERROR, G_FILE_ERROR_ACCES) ? "not permitted" : Fact().reason};
-    const Owned owner(contents, g_free);
-    g_strstrip(contents);
-    return *contents == '\0' ? Fact() : Fact{contents};
-}
-
-// The text of the first file that has one. If none has, the reason of the first.
-template <class... Paths>
-Fact FirstFile(const std::string& root, const char* path, Paths... others)
-{
-    Fact fact = ReadFile(root + path);
-    if constexpr (sizeof...(others) > 0)
-        if (!fact.text)
-            if (Fact other = FirstFile(root, others...); other.text)
-                return other;
-    return fact;
-}
-
-// The value of a key in a file of shell assignments, as os-release(5), machine-info(5) and locale.conf(5) are.
-Fact Assigned(const Fact& file, const std::string& key)
-{
-    const std::unique_ptr<char*, decltype(&g_strfreev)> lines(g_strsplit(file.text.value_or("").c_str(), "\n", -1), g_strfreev);
-    for (char** line = lines.get(); *line != nullptr; ++line)
-    {
-        if (g_str_has_prefix(*line, (key + "=").c_str()) == FALSE)
-            continue;
-        const Owned value(g_shell_unquote(*line + key.size() + 1, nullptr), g_free);
-        if (value != nullptr && *value != '\0')
-            return {value.get()};
-    }
-    return {};
-}
-
-Fact DeviceName(const std::string& root)
-{
-    const Fact pretty = Assigned(ReadFile(root + "/etc/machine-info"), "PRETTY_HOSTNAME");
-    return pretty.text ? pretty : ReadFile(root + "/proc/sys/kernel/hostname");
-}
-
-Fact Model(const std::string& root)
-{
-    return FirstFile(root, "/sys/class/dmi/id/product_name", "/sys/firmware/devicetree/base/model");
-}
-
-Fact Serial(const std::string& root)
-{
-    return FirstFile(root, "/sys/class/dmi/id/product_serial", "/sys/firmware/devicetree/base/serial-number");
-}
-
-Fact PlatformName(const std::string& root)
-{
-    return Assigned(FirstFile(root, "/etc/os-release", "/usr/lib/os-release"), "NAME");
-}
-
-Fact PlatformVersion(const std::string& root)
-{
-    return Assigned(FirstFile(root, "/etc/os-release", "/usr/lib/os-release"), "VERSION_ID");
-}
+constexpr char kMissing[] = "not available on this machine";
 
 // machine-id(5) asks programs to publish only a keyed hash of the ID.
-Fact PlatformId(const std::string& root)
+std::string PlatformId(const std::string& machineId)
 {
-    constexpr char kPurpose[] = "org.kiv.platform-id";
-    Fact id = ReadFile(root + "/etc/machine-id");
-    if (!id.text)
-        return id;
-    const std::string key = *id.text;
-    const auto* const bytes = reinterpret_cast<const guchar*>(key.data());
-    const Owned hash(g_compute_hmac_for_string(G_CHECKSUM_SHA256, bytes, key.size(), kPurpose, -1), g_free);
-    id.text = std::string(hash.get(), 32);
-    return id;
+    const auto* const key = reinterpret_cast<const guchar*>(machineId.data());
+    g_autofree char* hash = g_compute_hmac_for_string(G_CHECKSUM_SHA256, key, machineId.size(), "org.kiv.platform-id", -1);
+    return machineId.empty() ? "" : std::string(hash, 32);
 }
 
-// "de_AT" of "de_AT.UTF-8@euro".
-Fact Language(const std::string& root)
+// "de_AT" of "de_AT.UTF-8@euro". If no file has it, that of the environment.
+std::string Language(const std::string& locale)
 {
-    Fact locale = Assigned(ReadFile(root + "/etc/locale.conf"), "LANG");
-    if (!locale.text)
-        locale = Assigned(ReadFile(root + "/etc/default/locale"), "LANG");
-    if (const char* const variable = g_getenv("LANG"); !locale.text && variable != nullptr)
-        locale.text = variable;
-    if (locale.text)
-        locale.text->resize(
-            locale.text->find_first_of(".@") == std::string::npos ? locale.text->size() : locale.text->find_first_of(".@"));
-    const std::string name = locale.text.value_or("");
-    return name.empty() || name == "C" || name == "POSIX" ? Fact() : locale;
+    const char* const variable = locale.empty() ? g_getenv("LANG") : locale.c_str();
+    const std::string name = variable == nullptr ? "" : std::string(variable, strcspn(variable, ".@"));
+    return name == "C" || name == "POSIX" ? "" : name;
 }
 
-Fact SalesCode(const std::string& /*root*/)
+// A file, or a variable in one of shell assignments, as machine-info(5), locale.conf(5) and os-release(5) are.
+struct Place
 {
-    return {};
-}
+    const char* path = "";
+    const char* variable = nullptr;
+};
 
 constexpr struct
 {
     Text Device::*text;
     const char* key; // of the reason
-    Fact (*read)(const std::string& root);
+    Place places[2]; // the first that has a text decides
+    std::string (*convert)(const std::string& text) = nullptr;
 } kFacts[] = {
-    {&Device::deviceName, "settings.device-name", DeviceName},
-    {&Device::language, "settings.language", Language},
-    {&Device::modelName, "device.model-name", Model},
-    {&Device::platformName, "device.platform-name", PlatformName},
-    {&Device::platformVersion, "device.platform-version", PlatformVersion},
-    {&Device::tizenId, "device.tizen-id", PlatformId},
-    {&Device::serial, "device.serial", Serial},
-    {&Device::salesCode, "device.sales-code", SalesCode},
+    {&Device::deviceName, "settings.device-name", {{"/etc/machine-info", "PRETTY_HOSTNAME"}, {"/proc/sys/kernel/hostname"}}},
+    {&Device::language, "settings.language", {{"/etc/locale.conf", "LANG"}, {"/etc/default/locale", "LANG"}}, Language},
+    {&Device::modelName, "device.model-name", {{"/sys/class/dmi/id/product_name"}, {"/sys/firmware/devicetree/base/model"}}},
+    {&Device::platformName, "device.platform-name", {{"/etc/os-release", "NAME"}}},
+    {&Device::platformVersion, "device.platform-version", {{"/etc/os-release", "VERSION_ID"}}},
+    {&Device::tizenId, "device.tizen-id", {{"/etc/machine-id"}}, PlatformId},
+    {&Device::serial, "device.serial", {{"/sys/class/dmi/id/product_serial"}, {"/sys/firmware/devicetree/base/serial-number"}}},
+    {&Device::salesCode, "device.sales-code", {}},
 };
 
-// The value of a field in a paragraph of dpkg's status file.
-std::string_view FieldOf(std::string_view paragraph, std::string_view field)
+// The rest of a line after its beginning, which includes the end of the line before.
+std::string_view FieldOf(std::string_view text, std::string_view beginning)
 {
-    const std::size_t start = paragraph.find(field);
-    if (start == std::string_view::npos)
-        return {};
-    const std::string_view rest = paragraph.substr(start + field.size());
+    const std::size_t start = text.find(beginning);
+    const std::string_view rest = start == std::string_view::npos ? "" : text.substr(start + beginning.size());
     return rest.substr(0, rest.find('\n'));
+}
+
+// The text at a place without the blanks around it; empty if there is none.
+std::string ReadAt(const std::string& root, const Place& place, const char*& reason)
+{
+    g_autofree char* contents = nullptr;
+    g_autoptr(GError) error = nullptr;
+    g_file_get_contents((root + place.path).c_str(), &contents, nullptr, &error);
+    if (g_error_matches(error, G_FILE_ERROR, G_FILE_ERROR_ACCES) != FALSE)
+        reason = "not permitted";
+    else if (contents == nullptr && g_str_has_prefix(place.path, "/etc/") != FALSE) // then that of the vendor
+        g_file_get_contents((root + "/usr/lib" + (place.path + 4)).c_str(), &contents, nullptr, nullptr);
+    if (contents == nullptr || place.variable == nullptr)
+        return contents == nullptr ? "" : g_strstrip(contents);
+
+    const std::string lines = std::string("\n") + contents;
+    const std::string value(FieldOf(lines, std::string("\n") + place.variable + "="));
+    g_autofree char* unquoted = g_shell_unquote(value.c_str(), nullptr);
+    return unquoted == nullptr ? "" : unquoted;
 }
 
 } // namespace
 
-void HostFiles::Read(Device& device) const
+void HostFiles::ReadAll(Device& device)
 {
-    for (const auto& row : kFacts)
-        Read(device, row.text);
+    for (const auto& fact : kFacts)
+        Refresh(device, fact.text);
     device.fontSize.reset();
-    device.reasons["settings.font-size"] = Fact().reason;
-    ReadStorage(device);
+    device.reasons["settings.font-size"] = kMissing;
+    RefreshStorage(device);
 }
 
-void HostFiles::Read(Device& device, Text Device::*text) const
+void HostFiles::Refresh(Device& device, Text Device::*text)
 {
-    for (const auto& row : kFacts)
+    for (const auto& fact : kFacts)
     {
-        if (row.text != text)
+        if (fact.text != text)
             continue;
-        const Fact fact = row.read(root_);
-        device.*text = fact.text;
-        device.reasons.erase(row.key);
-        if (!fact.text)
-            device.reasons[row.key] = fact.reason;
+        const char* reason = kMissing;
+        std::string found;
+        for (auto place = std::begin(fact.places); found.empty() && place != std::end(fact.places); ++place)
+            found = ReadAt(root_, *place, reason);
+        if (fact.convert != nullptr)
+            found = fact.convert(found);
+        device.*text = found.empty() ? Text() : Text(found);
+        device.reasons.erase(fact.key);
+        if (found.empty())
+            device.reasons[fact.key] = reason;
     }
 }
 
-void HostFiles::ReadStorage(Device& device) const
+void HostFiles::RefreshStorage(Device& device)
 {
     struct statvfs storage
     {
@@ -182,14 +121,13 @@ void HostFiles::ReadStorage(Device& device) const
     device.blocksAvailable = storage.f_bavail;
 }
 
-bool HostFiles::ReadPackage(Device& device, const std::string& id) const
+bool HostFiles::RefreshPackage(Device& device, const std::string& id)
 {
-    using Mapped = std::unique_ptr<GMappedFile, decltype(&g_mapped_file_unref)>;
-    const Mapped file(g_mapped_file_new((root_ + "/var/lib/dpkg/status").c_str(), FALSE, nullptr), g_mapped_file_unref);
+    g_autoptr(GMappedFile) file = g_mapped_file_new((root_ + "/var/lib/dpkg/status").c_str(), FALSE, nullptr);
     if (file == nullptr)
         return false;
 
-    const std::string_view status(g_mapped_file_get_contents(file.get()), g_mapped_file_get_length(file.get()));
+    const std::string_view status(g_mapped_file_get_contents(file), g_mapped_file_get_length(file));
     const std::string heading = "Package: " + id + "\n";
     device.packages.erase(id);
     for (std::size_t at = status.find(heading); at != std::string_view::npos; at = status.find(heading, at + 1))

@@ -4,29 +4,17 @@
 #define KIV_SOURCES_REPORTTABLES_H
 
 #include "ITapiSim.h"
+#include "Reports.h"
 #include "net_connection.h"
 #include "telephony.h"
 #include "wifi.h"
 
 #include <algorithm>
-#include <cstddef>
 #include <utility>
+#include <variant>
 
 namespace kiv::platform
 {
-
-constexpr char kModem[] = "org.freedesktop.ModemManager1.Modem";
-constexpr char kModem3gpp[] = "org.freedesktop.ModemManager1.Modem.Modem3gpp";
-constexpr char kMessaging[] = "org.freedesktop.ModemManager1.Modem.Messaging";
-constexpr char kSim[] = "org.freedesktop.ModemManager1.Sim";
-constexpr char kNetwork[] = "org.freedesktop.NetworkManager";
-constexpr char kNetworkPath[] = "/org/freedesktop/NetworkManager";
-constexpr char kNetworkDevice[] = "org.freedesktop.NetworkManager.Device";
-constexpr char kActive[] = "org.freedesktop.NetworkManager.Connection.Active";
-constexpr char kSettings[] = "org.freedesktop.NetworkManager.Settings.Connection";
-constexpr char kMobileSettings[] = "gsm"; // a group of a connection's settings
-constexpr char kAdapter[] = "org.bluez.Adapter1";
-constexpr char kNone[] = "/"; // path of an object that is not there
 
 template <std::size_t count>
 int Lookup(const std::pair<int, int> (&table)[count], int key, int fallback)
@@ -35,8 +23,66 @@ int Lookup(const std::pair<int, int> (&table)[count], int key, int fallback)
     return found == table + count ? fallback : found->second;
 }
 
-// Enumerations of ModemManager and NetworkManager are those of their D-Bus interfaces, which never change a number.
 // clang-format off
+constexpr char kModemManager[] = "org.freedesktop.ModemManager1";
+constexpr char kNetworkManager[] = "org.freedesktop.NetworkManager";
+constexpr char kBluez[] = "org.bluez";
+constexpr char kNetworkPath[] = "/org/freedesktop/NetworkManager"; // of the object for the whole network
+
+// A property that is read, and the member that it sets. Of a list, the first element counts.
+struct Property
+{
+    const char* name;
+    std::variant<int Object::*, std::string Object::*> member;
+};
+
+// The interfaces whose objects are kept. "gsm" is a group of a connection's settings, which has the form of an interface.
+constexpr struct Interface
+{
+    const char* service;
+    const char* name;
+    Objects Reports::*objects;
+    Property properties[10];
+} kInterfaces[] = {
+    {kModemManager, "org.freedesktop.ModemManager1.Modem", &Reports::modems, {
+        {"State",                   &Object::state},
+        {"StateFailedReason",       &Object::failure},
+        {"PowerState",              &Object::power},
+        {"UnlockRequired",          &Object::lock},
+        {"AccessTechnologies",      &Object::technologies},
+        {"Device",                  &Object::device},
+        {"PrimaryPort",             &Object::port},
+        {"OwnNumbers",              &Object::number},
+        {"EquipmentIdentifier",     &Object::imei},
+        {"Sim",                     &Object::sim}}},
+    {kModemManager, "org.freedesktop.ModemManager1.Modem.Modem3gpp", &Reports::registrations, {
+        {"RegistrationState",       &Object::registration},
+        {"OperatorCode",            &Object::operatorCode}}},
+    {kModemManager, "org.freedesktop.ModemManager1.Modem.Messaging", &Reports::messaging, {}},
+    {kModemManager, "org.freedesktop.ModemManager1.Sim", &Reports::sims, {
+        {"Imsi",                    &Object::imsi},
+        {"OperatorIdentifier",      &Object::operatorCode}}},
+    {kNetworkManager, "org.freedesktop.NetworkManager", &Reports::network, {
+        {"WirelessEnabled",         &Object::wifiEnabled},
+        {"WirelessHardwareEnabled", &Object::wifiAllowed},
+        {"WwanEnabled",             &Object::wwanEnabled},
+        {"WwanHardwareEnabled",     &Object::wwanAllowed},
+        {"PrimaryConnectionType",   &Object::carrier}}},
+    {kNetworkManager, "org.freedesktop.NetworkManager.Device", &Reports::devices, {
+        {"DeviceType",              &Object::type},
+        {"State",                   &Object::state},
+        {"Udi",                     &Object::modem},
+        {"ActiveConnection",        &Object::active},
+        {"AvailableConnections",    &Object::available}}},
+    {kNetworkManager, "org.freedesktop.NetworkManager.Connection.Active", &Reports::activeConnections, {
+        {"Connection",              &Object::connection}}},
+    {kNetworkManager, "gsm", &Reports::settings, {
+        {"home-only",               &Object::homeOnly}}},
+    {kBluez, "org.bluez.Adapter1", &Reports::adapters, {
+        {"Powered",                 &Object::powered}}},
+};
+
+// Enumerations of ModemManager and NetworkManager are those of their D-Bus interfaces, which never change a number.
 
 // MMModemState, except "failed" and "locked", which depend on more.
 constexpr std::pair<int, int> kCardOfState[] = {

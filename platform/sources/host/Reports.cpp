@@ -1,17 +1,9 @@
 #include "Reports.h"
 
-#include "ITapiSim.h"
 #include "ReportTables.h"
-#include "Reported.h"
-#include "net_connection.h"
 #include "runtime_info.h"
-#include "telephony.h"
-#include "wifi.h"
 
-#include <algorithm>
 #include <cstring>
-#include <utility>
-#include <vector>
 
 namespace kiv::platform
 {
@@ -19,48 +11,30 @@ namespace kiv::platform
 namespace
 {
 
-// An empty part of a report is a missing text.
-Text Given(const std::string& text)
+const Object& Find(const Objects& objects, const std::string& path)
 {
-    return text.empty() ? Text() : Text(text);
+    static const Object kNothing;
+    const auto found = objects.find(path);
+    return found == objects.end() ? kNothing : found->second;
 }
 
-// Paths of the objects that have the interface; those of modems in the order of the slots.
-std::vector<std::string> PathsWith(const Objects& objects, const char* interface)
+const Registration& RegistrationOf(const Reports& reports, const std::string& modem)
 {
-    std::vector<std::string> paths;
-    for (const auto& [path, interfaces] : objects)
-        if (interfaces.count(interface) != 0)
-            paths.push_back(path);
-    std::stable_sort(paths.begin(), paths.end(),
-        [&](const std::string& one, const std::string& other)
-        {
-            const auto compare = [&](const char* property)
-            {
-                return strverscmp(Reported(objects, one, interface).Text(property).c_str(),
-                    Reported(objects, other, interface).Text(property).c_str());
-            };
-            const int device = compare("Device");
-            return device != 0 ? device < 0 : compare("PrimaryPort") < 0;
-        });
-    return paths;
+    const auto state = static_cast<std::size_t>(Find(reports.registrations, modem).registration);
+    return kRegistrations[state < std::size(kRegistrations) ? state : kUnregistered];
 }
 
-int CardStatusOf(const Objects& objects, const Reported& modem)
+int CardStatusOf(const Object& modem, const Objects& sims)
 {
-    const int state = modem.Number("State");
-    const std::string sim = modem.Text("Sim");
-    if (state == kFailed)
-        return Lookup(kCardOfFailure, modem.Number("StateFailedReason"), TAPI_SIM_STATUS_CARD_ERROR);
-    if (modem.Number("PowerState") == kPowerOff)
+    if (modem.state == kFailed)
+        return Lookup(kCardOfFailure, modem.failure, TAPI_SIM_STATUS_CARD_ERROR);
+    if (modem.power == kPowerOff)
         return TAPI_SIM_STATUS_CARD_POWEROFF;
-    const int card = state == kLocked ? Lookup(kCardOfLock, modem.Number("UnlockRequired"), TAPI_SIM_STATUS_SIM_LOCK_REQUIRED)
-                                      : Lookup(kCardOfState, state, TAPI_SIM_STATUS_UNKNOWN);
-    if (card != TAPI_SIM_STATUS_SIM_INIT_COMPLETED)
+    const int card = modem.state == kLocked ? Lookup(kCardOfLock, modem.lock, TAPI_SIM_STATUS_SIM_LOCK_REQUIRED)
+                                            : Lookup(kCardOfState, modem.state, TAPI_SIM_STATUS_UNKNOWN);
+    if (card != TAPI_SIM_STATUS_SIM_INIT_COMPLETED || sims.count(modem.sim) != 0) // ready is a card whose record is here
         return card;
-    if (sim.empty() || sim == kNone)
-        return TAPI_SIM_STATUS_CARD_NOT_PRESENT;
-    return objects.count(sim) != 0 ? card : TAPI_SIM_STATUS_SIM_INITIALIZING; // ready is a card whose record is here
+    return modem.sim.empty() ? TAPI_SIM_STATUS_CARD_NOT_PRESENT : TAPI_SIM_STATUS_SIM_INITIALIZING;
 }
 
 // No rule says how many digits of an IMSI are the MNC. The operator's code does.
@@ -78,248 +52,175 @@ bool SplitImsi(const std::string& imsi, const std::string& operatorCode, SimSlot
     return true;
 }
 
-const Registration& RegistrationOf(const Objects& objects, const std::string& path)
+SimSlot SlotOf(const Reports& reports, const std::string& path)
 {
-    const int state = Reported(objects, path, kModem3gpp).Number("RegistrationState", kUnregistered);
-    return kRegistrations[state >= 0 && state < static_cast<int>(std::size(kRegistrations)) ? state : kUnregistered];
-}
-
-SimSlot DescribeSlot(const Objects& objects, const std::string& path)
-{
-    const Reported modem(objects, path, kModem);
-    const Reported network(objects, path, kModem3gpp);
-    const Reported sim(objects, modem.Text("Sim"), kSim);
-    const Registration& registration = RegistrationOf(objects, path);
+    const Object& modem = Find(reports.modems, path);
+    const Object& sim = Find(reports.sims, modem.sim);
+    const Registration& registration = RegistrationOf(reports, path);
+    const auto isOf = [technologies = static_cast<std::uint32_t>(modem.technologies)](const Generation& generation)
+    { return (generation.technologies & technologies) != 0; };
     SimSlot slot;
-    slot.cpName = modem.Text("PrimaryPort");
-    slot.cardStatus = {CardStatusOf(objects, modem)};
-    if (!SplitImsi(sim.Text("Imsi"), sim.Text("OperatorIdentifier"), slot))
-        SplitImsi(sim.Text("Imsi"), network.Text("OperatorCode"), slot);
-    slot.number = Given(modem.Text("OwnNumbers"));
-    slot.imei = Given(modem.Text("EquipmentIdentifier"));
+    slot.cpName = modem.port;
+    slot.cardStatus = {CardStatusOf(modem, reports.sims)};
+    if (!SplitImsi(sim.imsi, sim.operatorCode, slot))
+        SplitImsi(sim.imsi, Find(reports.registrations, path).operatorCode, slot);
+    if (!modem.number.empty())
+        slot.number = modem.number;
+    if (!modem.imei.empty())
+        slot.imei = modem.imei;
     slot.serviceState = registration.service;
     slot.roaming = registration.isRoaming;
     slot.serviceType = registration.type;
-    const auto technologies = static_cast<std::uint32_t>(modem.Number("AccessTechnologies"));
     if (slot.serviceType == 0)
-        slot.serviceType = std::find_if(std::begin(kGenerations), std::end(kGenerations) - 1,
-            [technologies](const Generation& generation) {
-                return (generation.technologies & technologies) != 0;
-            })->type;
+        slot.serviceType = std::find_if(std::begin(kGenerations), std::end(kGenerations) - 1, isOf)->type;
     const bool isRegistered = registration.service == TELEPHONY_NETWORK_SERVICE_STATE_IN_SERVICE;
-    slot.smsStatus = Reported(objects, path, kMessaging) && isRegistered ? 1 : 0;
+    slot.smsStatus = isRegistered && reports.messaging.count(path) != 0 ? 1 : 0;
     return slot;
 }
 
-void DescribeModems(const Objects& modems, Device& device)
+void DescribeSlots(const Reports& reports, Device& device)
 {
-    for (const std::string& path : PathsWith(modems, kModem))
+    const auto isBefore = [](const std::string& one, const std::string& other)
+    { return strverscmp(one.c_str(), other.c_str()) < 0; };
+    std::map<std::string, std::string, decltype(isBefore)> paths(isBefore); // by device and port
+    for (const auto& [path, modem] : reports.modems)
+        paths[modem.device + " " + modem.port + " " + path] = path;
+    for (const auto& [place, path] : paths)
     {
         const std::string group = "sim" + std::to_string(device.slots.size());
-        device.slots.push_back(DescribeSlot(modems, path));
-        if (!device.slots.back().mcc)
+        const SimSlot& slot = device.slots.emplace_back(SlotOf(reports, path));
+        if (!slot.mcc)
             device.reasons[group + ".mcc"] = "the SIM does not tell which network issued it";
-        if (!device.slots.back().number)
+        if (!slot.number)
             device.reasons[group + ".number"] = "the SIM holds none";
     }
-    const int defaultSlot = device.slots.size() == 1 ? 0 : kNoSlot;
-    device.defaultNetwork = device.preferredVoice = device.defaultData = defaultSlot;
+    device.defaultNetwork = device.preferredVoice = device.defaultData = device.slots.size() == 1 ? 0 : kNoSlot;
 }
 
-// The state of a modem's device in NetworkManager; unmanaged if NetworkManager does not know it.
-int NetworkStateOf(const Objects& network, const std::string& modemPath)
-{
-    for (const std::string& path : PathsWith(network, kNetworkDevice))
-        if (const Reported device(network, path, kNetworkDevice); device.Text("Udi") == modemPath)
-            return device.Number("State");
-    return kUnmanaged;
-}
-
-int CellularStateOf(const Reports& reports, const std::string& modem)
-{
-    const int state = NetworkStateOf(reports.network.objects, modem);
-    const bool isManaged = state > kUnmanaged;
-    const bool isConnected =
-        isManaged ? state == kActivated : Reported(reports.modems.objects, modem, kModem).Number("State") == kConnected;
-    return isConnected ? CONNECTION_CELLULAR_STATE_CONNECTED : RegistrationOf(reports.modems.objects, modem).cellular;
-}
-
-// The best of the modems' states.
-int CellularState(const Reports& reports)
+// The best of the modems' states. ModemManager says "connected" although no data flows: NetworkManager decides where it can.
+int CellularStateOf(const Reports& reports)
 {
     constexpr int kBestFirst[] = {CONNECTION_CELLULAR_STATE_CONNECTED, CONNECTION_CELLULAR_STATE_AVAILABLE,
-        CONNECTION_CELLULAR_STATE_ROAMING, CONNECTION_CELLULAR_STATE_CALL_ONLY_AVAILABLE};
-    std::vector<int> states;
-    for (const std::string& modem : PathsWith(reports.modems.objects, kModem))
-        states.push_back(CellularStateOf(reports, modem));
-    for (const int state : kBestFirst)
-        if (std::find(states.begin(), states.end(), state) != states.end())
-            return state;
-    return CONNECTION_CELLULAR_STATE_OUT_OF_SERVICE;
+        CONNECTION_CELLULAR_STATE_ROAMING, CONNECTION_CELLULAR_STATE_CALL_ONLY_AVAILABLE, CONNECTION_CELLULAR_STATE_OUT_OF_SERVICE};
+    const int* best = std::end(kBestFirst) - 1;
+    for (const auto& [path, modem] : reports.modems)
+    {
+        bool isConnected = modem.state == kConnected;
+        for (const auto& [devicePath, device] : reports.devices)
+            if (device.modem == path && device.state > kUnmanaged)
+                isConnected = device.state == kActivated;
+        const int state = isConnected ? CONNECTION_CELLULAR_STATE_CONNECTED : RegistrationOf(reports, path).cellular;
+        best = std::find(std::begin(kBestFirst), best, state);
+    }
+    return *best;
 }
 
-// The devices of one type: whether there are any, and how far their connections are.
-struct Kind
+// The radios of one type, and the connection of the device that is furthest.
+struct Radio
 {
-    Kind(const Objects& network, int type)
+    Radio(const Objects& devices, int type)
     {
-        for (const std::string& path : PathsWith(network, kNetworkDevice))
+        for (const auto& [path, device] : devices)
         {
-            const Reported device(network, path, kNetworkDevice);
-            if (device.Number("DeviceType") != type)
+            if (device.type != type)
                 continue;
-            const int state = device.Number("State");
             exists = true;
-            isUsable = isUsable || state > kUnavailable;
-            const int its = Lookup(kWifiConnections, state, WIFI_CONNECTION_STATE_DISCONNECTED);
+            isOn = isOn || device.state > kUnavailable;
+            const int its = Lookup(kWifiConnections, device.state, WIFI_CONNECTION_STATE_DISCONNECTED);
             connection = connection == WIFI_CONNECTION_STATE_DISCONNECTED ? its : std::max(connection, its);
         }
     }
 
-    bool exists = false;
-    bool isUsable = false;
-    int connection = WIFI_CONNECTION_STATE_DISCONNECTED; ///< of the device that is furthest
+    bool exists = false, isOn = false;
+    int connection = WIFI_CONNECTION_STATE_DISCONNECTED;
 };
-
-// The state of the radios of one kind.
-struct Radio
-{
-    bool exists;
-    bool isOn;
-};
-
-Radio WwanRadio(const Reports& reports)
-{
-    const std::vector<std::string> modems = PathsWith(reports.modems.objects, kModem);
-    const Reported network(reports.network.objects, kNetworkPath, kNetwork);
-    const bool exists = !modems.empty() || Kind(reports.network.objects, kModemDevice).exists;
-    if (network)
-        return {exists, exists && network.Flag("WwanEnabled") && network.Flag("WwanHardwareEnabled")};
-    const auto isPowered = [&](const std::string& modem)
-    {
-        const int power = Reported(reports.modems.objects, modem, kModem).Number("PowerState");
-        return power != kPowerOff && power != kPowerLow;
-    };
-    return {exists, std::any_of(modems.begin(), modems.end(), isPowered)};
-}
-
-Radio WifiRadio(const Objects& objects, const Kind& wifi)
-{
-    const Reported network(objects, kNetworkPath, kNetwork);
-    return {wifi.exists, wifi.exists && network.Flag("WirelessEnabled") && network.Flag("WirelessHardwareEnabled")};
-}
-
-Radio BluetoothRadio(const Objects& adapters, const Kind& bluetooth)
-{
-    const std::vector<std::string> paths = PathsWith(adapters, kAdapter);
-    const bool isPowered = std::any_of(
-        paths.begin(), paths.end(), [&](const std::string& path) { return Reported(adapters, path, kAdapter).Flag("Powered"); });
-    return {!paths.empty() || bluetooth.exists, isPowered || bluetooth.isUsable};
-}
 
 // Off, on without a connection, or connected: the same numbers in all three enumerations.
 static_assert(
     CONNECTION_WIFI_STATE_CONNECTED == 2 && CONNECTION_BT_STATE_CONNECTED == 2 && RUNTIME_INFO_WIFI_STATUS_CONNECTED == 2);
-int StateOf(const Radio& radio, const Kind& kind)
+int StateOf(const Radio& radio)
 {
-    if (!radio.isOn)
-        return CONNECTION_WIFI_STATE_DEACTIVATED;
-    return kind.connection == WIFI_CONNECTION_STATE_CONNECTED ? CONNECTION_WIFI_STATE_CONNECTED
-                                                              : CONNECTION_WIFI_STATE_DISCONNECTED;
+    const bool isConnected = radio.connection == WIFI_CONNECTION_STATE_CONNECTED;
+    const int whenOn = isConnected ? CONNECTION_WIFI_STATE_CONNECTED : CONNECTION_WIFI_STATE_DISCONNECTED;
+    return radio.isOn ? whenOn : CONNECTION_WIFI_STATE_DEACTIVATED;
 }
 
 void DescribeNetwork(const Reports& reports, Device& device)
 {
-    const Objects& objects = reports.network.objects;
-    const Kind wifi(objects, kWifiDevice);
-    const Kind bluetooth(objects, kBluetoothDevice);
-    const Radio wwanRadio = WwanRadio(reports);
-    const Radio wifiRadio = WifiRadio(objects, wifi);
-    const Radio bluetoothRadio = BluetoothRadio(reports.bluetooth.objects, bluetooth);
+    const Object& network = Find(reports.network, kNetworkPath);
+    Radio wwan(reports.devices, kModemDevice), wifi(reports.devices, kWifiDevice), bluetooth(reports.devices, kBluetoothDevice);
+    wwan.exists = wwan.exists || !reports.modems.empty();
+    const bool mayUseModems = wwan.exists && network.wwanEnabled != FALSE && network.wwanAllowed != FALSE;
+    wwan.isOn = mayUseModems;
+    for (const auto& [path, modem] : reports.modems)
+        if (reports.network.empty() && modem.power != kPowerOff && modem.power != kPowerLow)
+            wwan.isOn = true;
+    wifi.isOn = wifi.exists && network.wifiEnabled != FALSE && network.wifiAllowed != FALSE;
+    bluetooth.exists = bluetooth.exists || !reports.adapters.empty();
+    for (const auto& [path, adapter] : reports.adapters)
+        bluetooth.isOn = bluetooth.isOn || adapter.powered != FALSE;
 
-    const bool anyExists = wwanRadio.exists || wifiRadio.exists || bluetoothRadio.exists;
-    device.flightMode = anyExists && !wwanRadio.isOn && !wifiRadio.isOn && !bluetoothRadio.isOn;
-    device.mobileData = device.packetData = wwanRadio.isOn && !objects.empty();
-    device.cellularState = device.flightMode ? CONNECTION_CELLULAR_STATE_FLIGHT_MODE : CellularState(reports);
-    device.wifiState = device.wifiStatus = StateOf(wifiRadio, wifi);
-    device.wifiDeviceState = wifiRadio.isOn ? WIFI_DEVICE_STATE_ACTIVATED : WIFI_DEVICE_STATE_DEACTIVATED;
+    const bool anyExists = wwan.exists || wifi.exists || bluetooth.exists;
+    device.flightMode = anyExists && !wwan.isOn && !wifi.isOn && !bluetooth.isOn;
+    device.mobileData = device.packetData = mayUseModems;
+    device.cellularState = device.flightMode ? CONNECTION_CELLULAR_STATE_FLIGHT_MODE : CellularStateOf(reports);
+    device.wifiState = device.wifiStatus = StateOf(wifi);
+    device.wifiDeviceState = wifi.isOn ? WIFI_DEVICE_STATE_ACTIVATED : WIFI_DEVICE_STATE_DEACTIVATED;
     device.wifiConnectionState = wifi.connection;
-    device.bluetoothState = StateOf(bluetoothRadio, bluetooth);
-
-    device.dataRoaming = false;
-    for (const auto& [path, call] : DetailsOfNetwork(objects))
-        if (const Reported connection(objects, path, kMobileSettings); connection)
-            device.dataRoaming = device.dataRoaming || !connection.Flag("home-only");
-}
-
-// Why a service reports nothing; null if it reports.
-const char* Silence(Presence presence, const char* whenAbsent)
-{
-    if (presence == Presence::Present)
-        return nullptr;
-    return presence == Presence::Denied ? "not permitted" : whenAbsent;
+    device.bluetoothState = StateOf(bluetooth);
+    device.dataRoaming = std::any_of(reports.settings.begin(), reports.settings.end(),
+        [](const auto& connection) { return connection.second.homeOnly == FALSE; });
 }
 
 void GiveReasons(const Reports& reports, Device& device)
 {
-    const char* const noModems = Silence(reports.modems.presence, "ModemManager does not run");
-    const char* const noNetwork = Silence(reports.network.presence, "NetworkManager does not run");
-    const char* const modem = noModems != nullptr ? noModems : device.slots.empty() ? "no modem" : nullptr;
+    const auto silence = [](Presence presence, const char* absent, const char* present) {
+        return presence == Presence::Absent ? absent : presence == Presence::Denied ? "not permitted" : present;
+    };
+    const char* const network = silence(reports.networkManager, "NetworkManager does not run", nullptr);
+    const char* const modem =
+        silence(reports.modemManager, "ModemManager does not run", device.slots.empty() ? "no modem" : nullptr);
+    const bool isWired = Find(reports.network, kNetworkPath).carrier == "802-3-ethernet";
     const std::pair<const char*, const char*> reasons[] = {
         {"telephony.available", modem},
         {"network.cellular", modem},
-        {"settings.mobile-data", noNetwork != nullptr ? noNetwork : modem},
-        {"runtime.data-roaming", noNetwork != nullptr ? noNetwork : modem},
-        {"runtime.flight-mode", noNetwork},
-        {"network.wifi", noNetwork},
-        {"network.bluetooth", noNetwork},
+        {"settings.mobile-data", network != nullptr ? network : modem},
+        {"runtime.data-roaming", network != nullptr ? network : modem},
+        {"runtime.flight-mode", network},
+        {"network.wifi", network},
+        {"network.bluetooth", network},
+        {"network", isWired ? "a wired connection carries the traffic, and does not count here" : nullptr},
     };
     for (const auto& [key, reason] : reasons)
         if (reason != nullptr)
             device.reasons[key] = reason;
-
-    const std::string carrier = Reported(reports.network.objects, kNetworkPath, kNetwork).Text("PrimaryConnectionType");
-    if (carrier == "802-3-ethernet")
-        device.reasons["network"] = "a wired connection carries the traffic, and does not count here";
 }
 
 } // namespace
 
-const char* const kUsedProperties[] = {"AccessTechnologies", "ActiveConnection", "AvailableConnections", "Connection", "Device",
-    "DeviceType", "EquipmentIdentifier", "Imsi", "OperatorCode", "OperatorIdentifier", "OwnNumbers", "PowerState", "Powered",
-    "PrimaryConnectionType", "PrimaryPort", "RegistrationState", "Sim", "State", "StateFailedReason", "Udi", "UnlockRequired",
-    "WirelessEnabled", "WirelessHardwareEnabled", "WwanEnabled", "WwanHardwareEnabled", "home-only", nullptr};
-
-std::map<std::string, DetailCall> DetailsOfModems(const Objects& modems)
+std::set<std::string> SimsOf(const Reports& reports)
 {
-    std::map<std::string, DetailCall> calls;
-    for (const std::string& path : PathsWith(modems, kModem))
-        if (const std::string sim = Reported(modems, path, kModem).Text("Sim"); !sim.empty() && sim != kNone)
-            calls[sim] = {"org.freedesktop.DBus.Properties", "GetAll", kSim};
-    return calls;
+    std::set<std::string> sims;
+    for (const auto& [path, modem] : reports.modems)
+        sims.insert(modem.sim);
+    sims.erase("");
+    return sims;
 }
 
-std::map<std::string, DetailCall> DetailsOfNetwork(const Objects& network)
+std::set<std::string> ConnectionsOf(const Reports& reports)
 {
-    std::map<std::string, DetailCall> calls;
-    for (const std::string& path : PathsWith(network, kNetworkDevice))
-    {
-        const Reported device(network, path, kNetworkDevice);
-        if (device.Number("DeviceType") != kModemDevice)
-            continue;
-        std::string connection = Reported(network, device.Text("ActiveConnection"), kActive).Text("Connection");
-        if (connection.empty())
-            connection = device.Text("AvailableConnections");
-        if (!connection.empty())
-            calls[connection] = {kSettings, "GetSettings", nullptr};
-    }
-    return calls;
+    std::set<std::string> connections;
+    for (const auto& [path, device] : reports.devices)
+        if (const std::string& active = Find(reports.activeConnections, device.active).connection; device.type == kModemDevice)
+            connections.insert(active.empty() ? device.available : active);
+    connections.erase("");
+    return connections;
 }
 
 void Describe(const Reports& reports, Device& device)
 {
-    device.telephony = reports.modems.presence == Presence::Present;
-    DescribeModems(reports.modems.objects, device);
+    device.telephony = reports.modemManager == Presence::Present;
+    DescribeSlots(reports, device);
     DescribeNetwork(reports, device);
     GiveReasons(reports, device);
 }

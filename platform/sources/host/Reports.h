@@ -1,22 +1,27 @@
 /// @file
-/// Translates the reports of the services on the bus into values of the device.
+/// What the services on the bus report, and what it means for the device.
 #ifndef KIV_SOURCES_REPORTS_H
 #define KIV_SOURCES_REPORTS_H
 
 #include "DeviceControl.h"
 
-#include <gio/gio.h>
+#include <glib.h>
 #include <map>
-#include <memory>
+#include <set>
 #include <string>
 
 namespace kiv::platform
 {
 
-using Variant = std::shared_ptr<GVariant>;
-using Properties = std::map<std::string, Variant>;
-using Interfaces = std::map<std::string, Properties>;
-using Objects = std::map<std::string, Interfaces>; ///< by object path
+/// What is reported about one object under one interface. What is not reported is as in a new object.
+struct Object
+{
+    int state = 0, failure = 0, power = 0, lock = 0, technologies = 0, registration = 4, type = 0;
+    gboolean wifiEnabled = FALSE, wifiAllowed = FALSE, wwanEnabled = FALSE, wwanAllowed = FALSE, homeOnly = FALSE, powered = FALSE;
+    std::string device, port, number, imei, imsi, operatorCode, carrier;
+    std::string sim, modem, active, available, connection; ///< paths of other objects
+};
+using Objects = std::map<std::string, Object>; ///< by path
 
 enum class Presence
 {
@@ -25,33 +30,19 @@ enum class Presence
     Present
 };
 
-struct ServiceReport
-{
-    Presence presence = Presence::Absent;
-    Objects objects;
-};
-
 struct Reports
 {
-    ServiceReport modems, network, bluetooth; ///< of ModemManager, NetworkManager, BlueZ
+    Presence modemManager = Presence::Absent, networkManager = Presence::Absent, bluez = Presence::Absent;
+    Objects modems, registrations, messaging, sims;        ///< of ModemManager
+    Objects network, devices, activeConnections, settings; ///< of NetworkManager
+    Objects adapters;                                      ///< of BlueZ
 };
 
-/// Names of the properties that are read here, with a null at the end. Others need not be kept.
-extern const char* const kUsedProperties[];
+/// Paths of the modems' SIMs.
+std::set<std::string> SimsOf(const Reports& reports);
 
-/// A method call that reads an object.
-struct DetailCall
-{
-    const char* interface;
-    const char* method;
-    const char* argument; ///< null when the method takes none
-};
-
-/// The SIMs of the modems, which the object manager does not list.
-std::map<std::string, DetailCall> DetailsOfModems(const Objects& modems);
-
-/// The connections that the modems use, or would use.
-std::map<std::string, DetailCall> DetailsOfNetwork(const Objects& network);
+/// Paths of the connections that the modems use, or would use.
+std::set<std::string> ConnectionsOf(const Reports& reports);
 
 /// Sets every value of the device that comes from the services, or the reason why it is missing.
 void Describe(const Reports& reports, Device& device);
