@@ -16,11 +16,7 @@ std::shared_ptr<LoopThread> LoopThread::Start(Work work)
             g_main_context_push_thread_default(loop->context_.get());
             work.setUp();
             while (!loop->ended_)
-            {
-                if (loop->poked_.exchange(false))
-                    work.poked();
                 g_main_context_iteration(loop->context_.get(), TRUE);
-            }
             work.tearDown();
             while (g_main_context_iteration(loop->context_.get(), FALSE)) // lets cancelled operations end
                 continue;
@@ -42,12 +38,6 @@ void LoopThread::End()
         thread_.detach();
     else
         thread_.join();
-}
-
-void LoopThread::Poke()
-{
-    poked_ = true;
-    g_main_context_wakeup(context_.get());
 }
 
 } // namespace kiv::platform

@@ -16,21 +16,17 @@ namespace kiv::platform
 class LoopThread
 {
 public:
-    /// What the thread does besides iterating its context, which is its thread-default one. The thread owns the functions until it
-    /// ends.
+    /// What the thread does before and after iterating its context, which is its thread-default one. The thread owns the functions
+    /// until it ends.
     struct Work
     {
         std::function<void()> setUp;
         std::function<void()> tearDown;
-        std::function<void()> poked = [] {}; ///< once or more after each Poke()
     };
     static std::shared_ptr<LoopThread> Start(Work work);
 
     /// Ends the thread and waits for its end. Within a callback of the device it does not wait. Must be the last call.
     void End();
-
-    /// Makes the thread run `poked` soon. Any thread.
-    void Poke();
 
     /// False in a child of fork(), which has no copy of the thread.
     bool IsHere() const { return getpid() == process_; }
@@ -38,7 +34,7 @@ public:
 private:
     const std::unique_ptr<GMainContext, decltype(&g_main_context_unref)> context_{g_main_context_new(), g_main_context_unref};
     const pid_t process_ = getpid();
-    std::atomic<bool> ended_{false}, poked_{false};
+    std::atomic<bool> ended_{false};
     std::thread thread_;
 };
 
