@@ -23,6 +23,8 @@ DAEMONS = ("ModemManager", "NetworkManager")
 
 # What depends on the daemons: the answers while all are at work and the modem has a certain card; and what may be answered besides
 # while a daemon is missing, starts or reads the modem. "|" separates answers. Any other query always has the same answer.
+# A query makes several calls, between which a modem may come or go. Then the default SIM is unknown (-1), or a card that is being
+# read (2) already has service (4, 7).
 ANSWERS = {
     "GetCpNameList": ("abstract:one", "null|"),
     "GetIMSIFromSim": ("0 {mcc}{mnc}{msin}|before {mcc}{mnc}{msin} 1", "4 before|before 0|4 null"),
@@ -38,11 +40,11 @@ ANSWERS = {
     "InitHandleList": ("true 1 true", "true 0 true|false 0 true"),
     "SuccessToInitTelephonyHandle": ("true 1", "false 0"),
     "IsAvaliableState": ("true 3", "false"),
-    "IsAvaliableSendSMS": ("true 3 7", "false|true 3 4"),
+    "IsAvaliableSendSMS": ("true 3 7", "false|true 3 4|true 2 4|true 2 7"),
     "CheckSmsEnabled": ("true 1", "true 0|false"),
-    "GetMainSimSubscription": ("true 0", "false"),
-    "GetCallPreferredSubscription": ("true 0", "false"),
-    "GetDefaultDataSubscription": ("true 0", "false"),
+    "GetMainSimSubscription": ("true 0", "false|true -1"),
+    "GetCallPreferredSubscription": ("true 0", "false|true -1"),
+    "GetDefaultDataSubscription": ("true 0", "false|true -1"),
     "GetRoamingStatus": ("true {roaming}", "false true"),
     "GetCellularNetworkState": ("{cellular}", "0"),
     "IsMobileData": ("true", "false"),
