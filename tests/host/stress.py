@@ -115,11 +115,15 @@ class Stress(Daemons):
         def is_at_work():
             path = self.index_of(modem)
             report = json.loads((path and run("mmcli", "-m", path, "-J").stdout) or "{}").get("modem", {}).get("generic", {})
-            if report.get("state") == "disabled":  # as NetworkManager leaves it when a radio is on again too early
+            devices = run("nmcli", "-t", "-f", "TYPE,STATE", "device").stdout
+            seen[:] = [f"{name}={report.get(name)}" for name in ("state", "state-failed-reason", "power-state")] + devices.split()
+            if report.get("state") == "disabled":  # as NetworkManager leaves it when a radio is on, or itself killed, too early
+                run("nmcli", "radio", "wwan", "on")
                 run("mmcli", "-m", path, "-e")
             return (report.get("state") == "registered" and report["access-technologies"] == ["umts"]
-                    and "gsm:disconnected" in run("nmcli", "-t", "-f", "TYPE,STATE", "device").stdout)
-        until(is_at_work, "the modem is registered", 20)
+                    and "gsm:disconnected" in devices)
+        seen = []
+        until(is_at_work, seen, 30)
 
     def disturb(self, what, modem, cards, chance):
         """Switches the radio off and on, or kills and restarts a daemon, or the bus and all daemons. If ModemManager is among them,
