@@ -230,8 +230,8 @@ TEST(Network, StateOfAWifiDeviceGivesItsConnection)
         EXPECT_EQ(std::make_pair(connection, wifi), std::make_pair(device.wifiConnectionState, device.wifiState)) << state;
         EXPECT_EQ(std::make_pair(1, wifi), std::make_pair(device.wifiDeviceState, device.wifiStatus)) << state;
     }
-    const Device two =
-        Described(Present("", Switches(true, true) + ", " + NetworkDevice("/1", 2, 120) + ", " + NetworkDevice("/2", 2, 100)));
+    const Device two = Described(Present("", Switches(true, true) + ", " + NetworkDevice("/1", 2, 120) + ", " +
+                                                 NetworkDevice("/2", 2, 100) + ", " + NetworkDevice("/3", 2, 50)));
     EXPECT_EQ(WIFI_CONNECTION_STATE_CONNECTED, two.wifiConnectionState) << "the one that is furthest";
 }
 
@@ -381,6 +381,9 @@ TEST_F(Files, ThatAreMissingLeaveTextsMissingWithAReason)
                  device.serial || device.salesCode || device.fontSize);
     EXPECT_EQ("not available on this machine", device.reasons["settings.font-size"]);
     EXPECT_EQ(8U, device.reasons.size());
+    Write("/proc/sys/kernel/hostname", "workbench");
+    files.Refresh(device, &Device::deviceName);
+    EXPECT_EQ(0U, device.reasons.count("settings.device-name")) << "there is one now";
     if (geteuid() != 0) // who may read everything
     {
         Write("/sys/class/dmi/id/product_serial", "S1");
