@@ -57,7 +57,10 @@ void BusParty::OwnName(const std::string& name)
     g_autoptr(GError) error = nullptr;
     const VariantPtr reply = CallBus("RequestName", g_variant_new("(su)", name.c_str(), kDoNotQueue), "(u)", &error);
     if (reply == nullptr)
+    {
+        g_dbus_error_strip_remote_error(error);
         throw BusError(BusError::Reason::NameRefused, "the bus refuses the name \"" + name + "\": " + error->message);
+    }
 
     guint answer = 0;
     g_variant_get(reply.get(), "(u)", &answer);

@@ -60,6 +60,8 @@ TEST_F(KivctlTest, EndsWithTheDocumentedExitCode)
         {"notify on --service 7 --to manager", 1, "", "no program owns the name"},
         {"notify auth-success --profile none", 1, "", "--imsi"},
         {"subscribe --kind status", 2, "", "--key"},
+        {"subscribe --kind auth --name :1.7", 2, "", "--name: \":1.7\" is invalid; expected elements joined by dots, such as"},
+        {"services --serial \xff", 2, "", "--serial: \"\\xff\" is invalid; expected UTF-8"},
         {"subscribers add status 7 7up /a a.b", 4, "", "7up"},
         {"subscribers remove status 7 a.b /a a.b", 1, "", "no such subscription"},
         {"sim wait --profile none", 1, "", "waiting does not make a SIM usable"},

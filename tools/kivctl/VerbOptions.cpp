@@ -5,6 +5,7 @@
 
 #include <CLI/CLI.hpp>
 #include <DASubscriberStore.h>
+#include <gio/gio.h>
 
 #include <algorithm>
 #include <charconv>
@@ -33,6 +34,17 @@ CLI::Validator Numbers(Number least, const std::string& expected)
         return "";
     };
     return CLI::Validator(check, "");
+}
+
+std::string IsUtf8(const std::string& text)
+{
+    return g_utf8_validate(text.c_str(), -1, nullptr) ? "" : '"' + text + "\" is invalid; expected UTF-8";
+}
+
+std::string IsBusName(const std::string& text)
+{
+    const bool isName = text.empty() || (g_dbus_is_name(text.c_str()) && !g_dbus_is_unique_name(text.c_str()));
+    return isName ? "" : '"' + text + "\" is invalid; expected elements joined by dots, such as org.example.Client";
 }
 
 /// Refuses options of a verb when a verb below it runs, which ignores them.
@@ -250,7 +262,9 @@ void AddSubscribe(CLI::App& app, Command& command)
     verb->add_option("--key", options->key, "Service to subscribe to: a number for policy and status, a name for push")
         ->type_name("SERVICE");
     verb->add_option("--push", options->pushes, "Same as --kind push --key SERVICE")->type_name("SERVICE");
-    verb->add_option("--name", options->name, "Bus name to own (default: the connection's unique name)")->type_name("BUS_NAME");
+    verb->add_option("--name", options->name, "Bus name to own (default: the connection's unique name)")
+        ->type_name("BUS_NAME")
+        ->check(IsBusName);
     verb->add_option("--store", options->store, "Write the subscriptions to this file instead of using the subscription service")
         ->type_name("FILE");
 }
@@ -282,7 +296,8 @@ void AddServices(CLI::App& app, Command& command)
     const auto [verb, options] = AddVerb(
         app, command, "services", "Run the device daemon and the service manager, and print each event until Ctrl-C", RunServices);
     verb->add_option(
-        "--serial", options->serial, "Serial number that the device daemon returns (default: that of the device in use)");
+            "--serial", options->serial, "Serial number that the device daemon returns (default: that of the device in use)")
+        ->check(IsUtf8);
 }
 
 void AddDoctor(CLI::App& app, Command& command)
