@@ -26,7 +26,8 @@ struct CodeMeaning
 constexpr CodeMeaning kCodeMeanings[] = {
     {KIV_RESULT_NO_BUS, Exit::NoBus, "the system bus cannot be reached",
         "set DBUS_SYSTEM_BUS_ADDRESS to the address of a running bus"},
-    {KIV_RESULT_NO_REPLY, Exit::No, "no reply from the service", "start it on this bus (kivctl services)"},
+    {KIV_RESULT_NO_REPLY, Exit::No, "no reply from the service",
+        "start it on this bus (kivctl services); if it runs, see kivctl doctor"},
     {KIV_RESULT_BUS_TIMED_OUT, Exit::BusTimedOut, "connecting to the system bus timed out",
         "set DBUS_SYSTEM_BUS_ADDRESS to the address of a bus that answers"},
     {KIV_RESULT_INVALID_ARGUMENT, Exit::Refused, "the library rejected an argument", "its log says which"},
