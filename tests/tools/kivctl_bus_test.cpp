@@ -138,10 +138,11 @@ TEST_F(KivctlTest, LimitsTheWaitForAServiceThatIsStuck)
 {
     const auto stop = [](const Service& service) // at once, before anybody calls it
     { kill(std::stoi(g_subprocess_get_identifier(service.process.get())), SIGSTOP); };
+    Service board(KIV_BOARD_DAEMON), manager(KIV_SERVICE_MANAGER), client(KIVCTL " subscribe --kind auth --name a.b");
     const Service modems(KIVCTL " subscribe --kind number_changed --name org.freedesktop.ModemManager1");
     stop(modems);
+    // Later than the services, whose names it would own for a moment.
     const Program host(KIVCTL " doctor --fields check,finding --profile host");
-    Service board(KIV_BOARD_DAEMON), manager(KIV_SERVICE_MANAGER), client(KIVCTL " subscribe --kind auth --name a.b");
     for (const Service* stuck : {&board, &manager, &client})
         stop(*stuck);
     const Program examined(KIVCTL " doctor --fields check,finding"); // its time limits are far below GDBus's
