@@ -32,7 +32,7 @@ std::string RemovalOf(const DASubscription& subscription)
 
 std::string DeliveryTrouble(const std::string& trouble, const std::string& kind, const std::string& key, const std::string& busName)
 {
-    const std::string why = ReasonOf(trouble);
+    std::string why = ReasonOf(trouble);
     if (why != kNoOwner)
         return why;
     std::vector<DASubscription> subscriptions;
