@@ -184,7 +184,7 @@ TEST_F(BusyStore, MayBeCopiedAndReplacedAtAnyTime)
                 });
         AwaitAdded(2 + round % 3);
         fs::rename(coming, store.Path());
-        const int added = board->added;
+        const int first = board->added + 2; // the one before may have been added just before the move, and not been counted
         AwaitAdded(3);
         board->isOver = true;
         writer.AwaitEnd();
@@ -195,7 +195,7 @@ TEST_F(BusyStore, MayBeCopiedAndReplacedAtAnyTime)
         const std::vector<std::string> keys = Keys();
         EXPECT_THAT(keys, Not(Contains("former")));
         EXPECT_EQ(8, std::count_if(keys.begin(), keys.end(), [](const std::string& key) { return key.size() > 250; }));
-        for (int number = added + 1; number <= board->added; ++number)
+        for (int number = first; number <= board->added; ++number)
             EXPECT_THAT(keys, Contains(std::to_string(number)));
         fs::remove(directory / "former.db");
     }
@@ -318,7 +318,9 @@ TEST_F(BusyStore, ReadsALogOfVersion1UntilTheFirstChangeMergesIt)
             });
         AwaitAdded(2);
         EXPECT_EQ(Outcome::Done, Add("push", "3", ":1.7")) << reason;
-        EXPECT_FALSE(fs::exists(store.Path() + "-wal"));
+        std::error_code missing;
+        const std::uintmax_t log = fs::file_size(store.Path() + "-wal", missing);
+        EXPECT_TRUE(missing || log == 0) << log; // SQLite lets a reader make an empty one before the merged file is marked
         EXPECT_EQ((std::vector<std::string>{"2", "3"}), Keys());
     }
 }
