@@ -21,6 +21,10 @@ struct Traffic : BusTest
     const std::vector<std::string> paths = SubscriberPaths(3);
     const Connection shared{g_bus_get_sync(G_BUS_TYPE_SYSTEM, nullptr, nullptr)}; // held, so that neither side connects
     Peer service{bus, kServiceName};
+    // GDBus adds a match rule once for all proxies that exist at the same time. This one always exists, so it does not matter how
+    // long the lives of the others overlap.
+    const std::unique_ptr<GDBusProxy, Unref> other{g_dbus_proxy_new_sync(
+        shared.get(), G_DBUS_PROXY_FLAGS_NONE, nullptr, kServiceName, "/org/example/Other", kServiceName, nullptr, nullptr)};
     BusMonitor monitor{bus, shared.get()};
 };
 
