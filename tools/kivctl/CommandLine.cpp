@@ -193,7 +193,7 @@ Place FindPlace(const CLI::App& program)
 /// The parser's message in the words of this program.
 std::string Reworded(const CLI::App& verb, const CLI::ParseError& error)
 {
-    const std::string text = error.what();
+    std::string text = error.what();
     if (dynamic_cast<const CLI::ExcludesError*>(&error) != nullptr)
         return CLI::detail::find_and_replace(text, "excludes", "cannot be used with");
     const std::string name = text.substr(0, text.find_first_of(": "));
