@@ -38,8 +38,12 @@ class Machine(Daemons):
         modem.register(ROAMING, "26201")
         self.await_slots(roaming=[True])
         self.assertEqual("roaming", self.json("network")["cellular"])
+        agent = Agent(self)
+        self.assertEqual("0 310150123456789", agent.imsi())
         self.unplug(modem)
         until(lambda: "no modem" in (run(KIVCTL, "--profile", "host", "sim").stderr), "no slot")
+        until(lambda: agent.imsi() == "4 before", "a process that runs forgets the card", 1)
+        self.assertEqual(0, agent.end())
 
     def test_modems_have_cards_that_are_locked_or_missing(self):
         self.start_modem_manager()
@@ -113,6 +117,13 @@ class Machine(Daemons):
         self.assertEqual({"ModemManager": "not permitted", "NetworkManager": "not permitted"},
                          {row["check"]: row["finding"] for row in self.json("doctor", code=1) if row["check"].endswith("Manager")})
 
+    def test_card_that_may_not_be_read_is_ready_without_an_imsi(self):
+        self.kill("bus")
+        self.start_bus(f'<deny send_destination="{MM}" send_interface="org.freedesktop.DBus.Properties" send_member="GetAll"/>')
+        self.start_modem_manager()
+        self.plug(Modem("one"))
+        self.await_slots(card=["ready"], imsi=[None], number=["+15551234567"])
+
     def test_network_manager_decides_about_radios_and_connections(self):
         self.start_network_manager()
         self.start_modem_manager()
@@ -134,8 +145,9 @@ class Machine(Daemons):
             run("nmcli", "connection", "add", "type", "gsm", "ifname", "*", "con-name", "mobile", "apn", "internet",
                 "autoconnect", "no", "gsm.home-only", answer, check=True)
             until(lambda: agent.ask("IsDataRoamingEnabled") == roaming, f"home-only is {answer}")
-        run("nmcli", "connection", "modify", "mobile", "gsm.home-only", "yes", "ipv6.method", "disabled", check=True)
-        until(lambda: agent.ask("IsDataRoamingEnabled") == "false", "home-only was changed")
+        for answer, roaming in (("yes", "false"), ("no", "true")):
+            run("nmcli", "connection", "modify", "mobile", "gsm.home-only", answer, "ipv6.method", "disabled", check=True)
+            until(lambda: agent.ask("IsDataRoamingEnabled") == roaming, f"home-only was changed to {answer}")
         run("nmcli", "connection", "up", "mobile", check=True)
         until(lambda: agent.ask("GetCellularNetworkState") == "5", "a data connection")
         self.assertTrue(self.json("network", code=0)["connected"])

@@ -135,8 +135,11 @@ private:
             return;
         --self->pending_;
         Presence& presence = self->reports_.*self->info_.presence;
-        if (g_error_matches(error, G_DBUS_ERROR, G_DBUS_ERROR_ACCESS_DENIED) != FALSE && presence == Presence::Absent)
+        const bool isDenied = g_error_matches(error, G_DBUS_ERROR, G_DBUS_ERROR_ACCESS_DENIED) != FALSE;
+        if (isDenied && presence == Presence::Absent)
             presence = Presence::Denied;
+        if (isDenied && self->info_.details == &Reports::sims && self->asked_.count(path) != 0)
+            self->reports_.sims[path] = Object(); // ready, although this user cannot learn whose it is
         if (reply != nullptr)
             self->Take(path, reply);
         self->Change();
