@@ -202,6 +202,7 @@ TEST_F(KivctlTest, WrapsLinesAtTheWidthOfTheTerminal)
     EXPECT_THAT(OnTerminal("80", "--help"), testing::Contains(std::string(28, ' ') + "(default: auto)"));
 
     EXPECT_THAT(OnTerminal("20", "push m --data d --message m"), testing::Contains("  delivered=0"));
+    EXPECT_THAT(OnTerminal("2", "country \u6f22\u5b57"), testing::IsSupersetOf({"\u6f22", "\u5b57"})); // as wide as the terminal
 
     // A word that is longer than its column begins further left; one that is longer than the line ends after a slash.
     const std::string word = "./" + std::string(35, 'w'), folder(20, 'd'), file(25, 'f');

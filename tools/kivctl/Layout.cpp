@@ -75,8 +75,8 @@ std::vector<std::string> Wrapped(const std::string& text, size_t width, size_t i
 {
     std::vector<std::string> lines;
     std::string line = text;
-    bool isSplit = false; // the line begins with the rest of a word
-    indent = std::min(indent, width / 2);
+    bool isSplit = false;                                 // the line begins with the rest of a word
+    indent = width > 2 ? std::min(indent, width / 2) : 0; // a wide character fits behind it
     while (Width(line) > width)
     {
         const size_t begin = std::min(line.find_first_not_of(' '), line.size());
