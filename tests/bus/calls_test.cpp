@@ -24,8 +24,6 @@ Function Real(Function, const char* name)
     return reinterpret_cast<Function>(dlsym(RTLD_NEXT, name));
 }
 
-constexpr int kNone = 0;
-
 } // namespace
 
 #define KIV_REAL(function) Real(&(function), #function)
@@ -33,14 +31,14 @@ constexpr int kNone = 0;
 extern "C" GDBusProxy* g_dbus_proxy_new_sync(GDBusConnection* connection, GDBusProxyFlags flags, GDBusInterfaceInfo* info,
     const gchar* name, const gchar* path, const gchar* interface, GCancellable* cancellable, GError** error)
 {
-    Note("proxy", flags, kNone);
+    Note("proxy", flags, 0);
     return KIV_REAL(g_dbus_proxy_new_sync)(connection, flags, info, name, path, interface, cancellable, error);
 }
 
 extern "C" void g_dbus_proxy_new(GDBusConnection* connection, GDBusProxyFlags flags, GDBusInterfaceInfo* info, const gchar* name,
     const gchar* path, const gchar* interface, GCancellable* cancellable, GAsyncReadyCallback callback, gpointer data)
 {
-    Note("proxy", flags, kNone);
+    Note("proxy", flags, 0);
     KIV_REAL(g_dbus_proxy_new)(connection, flags, info, name, path, interface, cancellable, callback, data);
     if (afterProxy)
         afterProxy(connection);

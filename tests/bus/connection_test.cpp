@@ -111,9 +111,9 @@ TEST_F(ConnectionTrouble, IsAvoidedByAPrivateConnection)
     EXPECT_THAT(log.TakeErrors(), testing::Contains(testing::HasSubstr("g_bus_get_sync() failed:[")));
 }
 
-TEST_F(ConnectionTrouble, DoesNotEndTheProcess)
+TEST_F(ConnectionTrouble, DoesNotEndTheProcessButThatOfAnAgentDoes)
 {
-    const Connection agents = bus.Connect();
+    const Connection agents = bus.Connect(), other = bus.Connect();
     gio.connection = agents.get();
     for (const bool closesAtOnce : {true, false})
     {
@@ -124,20 +124,12 @@ TEST_F(ConnectionTrouble, DoesNotEndTheProcess)
         EXPECT_EQ(77, error) << "unchanged on success";
         EXPECT_FALSE(g_dbus_connection_get_exit_on_close(agents.get()));
     }
-}
-
-TEST_F(ConnectionTrouble, OfAnAgentsOtherConnectionKeepsItsEffect)
-{
-    const Connection agents = bus.Connect(), other = bus.Connect();
-    gio.connection = agents.get();
-    int error = 0;
-    g_object_unref(manager.InitDbusConnection(&error));
     g_dbus_connection_set_exit_on_close(other.get(), TRUE);
     g_signal_emit_by_name(other.get(), "closed", FALSE, nullptr);
     EXPECT_TRUE(g_dbus_connection_get_exit_on_close(other.get()));
 }
 
-TEST_F(ConnectionTrouble, IsCode2WithoutARequest)
+TEST_F(ConnectionTrouble, IsCode2WithoutARequestAndCode5WithoutAProxy)
 {
     const Connection agents = bus.Connect();
     gio.connection = agents.get();
@@ -146,12 +138,7 @@ TEST_F(ConnectionTrouble, IsCode2WithoutARequest)
     EXPECT_EQ(nullptr, id);
     EXPECT_THAT(log.TakeErrors(), testing::ElementsAre(Line("g_dbus_message_new_method_call err", "E", "SendDbusMethodNReceiveDID"),
                                       Line("dbus error occured", "E", "GetDeviceUniqueID")));
-}
 
-TEST_F(ConnectionTrouble, IsCode5WithoutAProxy)
-{
-    const Connection agents = bus.Connect();
-    gio.connection = agents.get();
     for (const int code : {NotifyServiceManager(KIV_NOTI_TYPE_NUMBER_CHANGED), NotifyPolicyWithoutTexts()})
         EXPECT_EQ(5, code) << "before its type or its texts matter";
     EXPECT_EQ(std::vector<std::string>(2, Line("Unable to create proxy: no reason given")), log.TakeErrors());
