@@ -172,7 +172,7 @@ TEST_F(Subscriptions, DoNotChangeWhenTheNameGetsANewOwnerMeanwhile)
             BusMonitor monitor(bus, successor.Bus());
             const StoreLock lock;
             answer = std::async(std::launch::async, [&] { return client.Change(method, kMail); });
-            monitor.Await("GetNameOwner");
+            monitor.Until("GetNameOwner");
             successor.Own(kMail);
         }
         EXPECT_EQ("AccessDenied", answer.get());
@@ -284,10 +284,8 @@ TEST_F(Subscriptions, AcceptOnlyArgumentsOfTheRightTypes)
     Client client(bus);
     for (const char* method : {"Subscribe", "Unsubscribe", "List"})
     {
-        for (const char* body : {"(true,)", "(byte 1,)", "(int16 1,)", "(uint16 1,)", "(1,)", "(uint32 1,)", "(int64 1,)",
-                 "(uint64 1,)", "(1.5,)", "('a',)", "(objectpath '/',)", "(signature 's',)", "(<1>,)", "(['a'],)", "({'a': 'b'},)",
-                 "(('a', 'b'),)", "('auth', 'all', '', '/a', 'a.b')", "('auth', 'all', '', objectpath '/a', 'a.b', 'more')",
-                 "(b'bytes',)", "(handle 0,)", "((('auth', 'all', '', objectpath '/a', 'a.b'),),)"})
+        for (const char* body : {"(1,)", "('a',)", "(handle 0,)", "('auth', 'all', '', '/a', 'a.b')",
+                 "('auth', 'all', '', objectpath '/a', 'a.b', 'more')", "(('auth', 'all', '', objectpath '/a', 'a.b'),)"})
         {
             g_autoptr(GVariant) arguments = g_variant_parse(nullptr, body, nullptr, nullptr, nullptr);
             EXPECT_EQ("InvalidArgs", client.Call(method, arguments)) << method << body;

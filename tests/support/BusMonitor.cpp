@@ -1,6 +1,5 @@
 #include "support/BusMonitor.h"
 
-#include <algorithm>
 #include <chrono>
 #include <condition_variable>
 #include <stdexcept>
@@ -18,9 +17,19 @@ struct
 {
     std::mutex mutex;
     std::condition_variable changed;
-    bool isMarked = false;
-    std::vector<std::string> lines;
+    std::list<std::string> lines;
 } seen;
+
+/// Takes the next message, as a line.
+std::string Next()
+{
+    std::unique_lock<std::mutex> lock(seen.mutex);
+    if (!seen.changed.wait_for(lock, std::chrono::seconds(30), [] { return !seen.lines.empty(); }))
+        throw std::runtime_error("the monitor sees no more messages");
+    const std::string line = seen.lines.front();
+    seen.lines.pop_front();
+    return line;
+}
 
 std::string Line(GDBusMessage* message)
 {
@@ -65,45 +74,30 @@ GDBusMessage* BusMonitor::Filter(GDBusConnection* connection, GDBusMessage* mess
     if (incoming == FALSE || g_strcmp0(destination, g_dbus_connection_get_unique_name(connection)) == 0)
         return message;
     const std::lock_guard<std::mutex> lock(seen.mutex);
-    if (g_strcmp0(g_dbus_message_get_interface(message), kMarker) == 0)
-        seen.isMarked = true;
-    else
-        seen.lines.push_back(Line(message));
+    seen.lines.push_back(Line(message));
     seen.changed.notify_all();
     g_object_unref(message);
     return nullptr;
 }
 
-/// When the monitor sees the marker, it has seen everything sent before.
-void BusMonitor::AwaitMarker()
+std::vector<std::string> BusMonitor::Until(const std::string& text)
 {
-    g_dbus_connection_emit_signal(shared_, nullptr, "/", kMarker, "Marker", nullptr, nullptr);
-    std::unique_lock<std::mutex> lock(seen.mutex);
-    if (!seen.changed.wait_for(lock, std::chrono::seconds(30), [] { return seen.isMarked; }))
-        throw std::runtime_error("the monitor sees nothing");
-    seen.isMarked = false;
-}
-
-void BusMonitor::Await(const std::string& text)
-{
-    std::unique_lock<std::mutex> lock(seen.mutex);
-    const auto hasText = [&](const std::string& line) { return line.find(text) != std::string::npos; };
-    if (!seen.changed.wait_for(
-            lock, std::chrono::seconds(30), [&] { return std::any_of(seen.lines.begin(), seen.lines.end(), hasText); }))
-        throw std::runtime_error("the monitor does not see " + text);
+    std::vector<std::string> lines;
+    for (std::string line = Next(); line.find(text) == line.npos; line = Next())
+        lines.push_back(line);
+    return lines;
 }
 
 std::vector<std::string> BusMonitor::During(const std::function<void()>& operation)
 {
-    AwaitMarker();
+    const auto mark = [this] // when the monitor sees the marker, it has seen everything sent before
     {
-        const std::lock_guard<std::mutex> lock(seen.mutex);
-        seen.lines.clear();
-    }
+        g_dbus_connection_emit_signal(shared_, nullptr, "/", kMarker, "Marker", nullptr, nullptr);
+        return Until(kMarker);
+    };
+    mark();
     operation();
-    AwaitMarker();
-    const std::lock_guard<std::mutex> lock(seen.mutex);
-    return std::exchange(seen.lines, {});
+    return mark();
 }
 
 } // namespace kiv::test

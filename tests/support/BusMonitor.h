@@ -19,12 +19,11 @@ public:
     /// Returns the messages of an operation in the order of the bus, one per line, complete except for serials.
     std::vector<std::string> During(const std::function<void()>& operation);
 
-    /// Waits until it has seen a message with this text.
-    static void Await(const std::string& text);
+    /// Waits for a message with this text. @return the messages before it that were not returned yet
+    static std::vector<std::string> Until(const std::string& text);
 
 private:
     static GDBusMessage* Filter(GDBusConnection* connection, GDBusMessage* message, gboolean incoming, gpointer);
-    void AwaitMarker();
 
     GDBusConnection* shared_; ///< a marker sent over it shows where they end
     Connection watching_;
