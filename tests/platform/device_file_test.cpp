@@ -209,23 +209,6 @@ TEST_F(Changes, OfTextsTakeOnlyWholeEscapes)
             use(name));
 }
 
-TEST_F(Changes, StartFromTheProfileThatIsNamedOrInUse)
-{
-    std::string madeFrom;
-    const std::string other = directory + "/other";
-    EXPECT_EQ("", UseProfile("roaming"));
-    EXPECT_EQ("", SetInDeviceFile(other, {}, &madeFrom));
-    EXPECT_EQ("roaming", madeFrom);
-    EXPECT_EQ(kiv::test::Contents(other), *TextOfProfile("roaming"));
-    EXPECT_EQ(other + ": already exists; expected the name of a new file", MakeDeviceFile(other, "none", {}));
-    EXPECT_EQ("", SetInDeviceFile(other, {}, &madeFrom));
-    EXPECT_EQ("", madeFrom);
-    std::filesystem::remove(other);
-    EXPECT_EQ("", MakeDeviceFile(other, "none", {}));
-    EXPECT_EQ(kiv::test::Contents(other), *TextOfProfile("none"));
-    std::filesystem::remove(other);
-}
-
 TEST_F(Changes, AreNotDeliveredAfterAnUnregistrationReturned)
 {
     static std::atomic<int> step;

@@ -129,7 +129,6 @@ TEST_F(KivctlTest, CompletesAWordFromTheWordsBeforeIt)
         {"subscribers remove push mail ''", "org.a.B\n"},
         {"subscribers add status ''", "7\nall\n"},
         {"completion ''", "bash\nzsh\nfish\n"},
-        {"sim wait --fields ''", "usable_slot\nwaited_seconds\n"},
         {"device id --fields=d", "--fields=device_id\n"},
         {"network --fields wifi,", "wifi,cellular\nwifi,bluetooth\nwifi,connected\n"},
     };

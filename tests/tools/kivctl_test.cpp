@@ -76,7 +76,6 @@ TEST_F(KivctlTest, EndsWithTheDocumentedExitCode)
         {"network -p ./w --wifi", 0, "connected  yes", ""},
         {"device set -p ./w network.wifi=0 network.bluetooth=2 settings.device-name='a:\\\xe2\x80\xae'", 0, "", ""},
         {"network -p ./w --bt", 0, "connected  yes", ""},
-        {"network -p ./w --wifi", 1, "connected  no", ""},
         {"device -p ./w -t --fields platform_device_id,name", 0, "****:a\\:\\\\\\u202e\n", ""},
         {"device -p ./w --fields name", 0, "name  a:\\\\u202e\n", ""},
         {"device get -p ./w settings.device-name", 0, "a:\\\\u202e\n", ""},
