@@ -124,6 +124,16 @@ class Machine(Daemons):
         self.plug(Modem("one"))
         self.await_slots(card=["ready"], imsi=[None], number=["+15551234567"])
 
+    def test_answers_of_the_wrong_type_are_ignored(self):
+        self.start("ModemManager", "/usr/bin/python3", "-m", "dbusmock", "--system", MM, "/org/freedesktop/ModemManager1", MM)
+        until(lambda: self.owns(MM), "the stand-in is on the bus")
+        slot = f"{{'/modem': {{'{MM}.Modem': {{'Sim': 'no path'}}}}}}"
+        for kind, answer, expected in (("s", "'no name'", "kivctl: ModemManager does not run\n"), ("a{oa{sa{sv}}}", slot, "none\n")):
+            self.call(MM, "/org/freedesktop/ModemManager1", "org.freedesktop.DBus.Mock.AddMethod", "org.freedesktop.DBus.ObjectManager",
+                      "GetManagedObjects", "", kind, f"ret = {answer}")
+            result = run(KIVCTL, "--profile", "host", "-t", "--fields", "service", "sim")
+            self.assertEqual(expected, result.stdout + result.stderr)
+
     def test_network_manager_decides_about_radios_and_connections(self):
         self.start_network_manager()
         self.start_modem_manager()

@@ -166,7 +166,7 @@ private:
         g_autoptr(GVariant) values = nullptr;
         g_autoptr(GVariantIter) objects = nullptr;
         g_autofree const char** interfaces = nullptr;
-        if (is("(s)")) // GetNameOwner
+        if (is("(s)") && owner_.empty()) // GetNameOwner
         {
             g_variant_get(body, "(&s)", &owner);
             SetOwner(owner);
@@ -230,7 +230,7 @@ private:
             if (used.count(path) == 0)
                 (reports_.*info_.details).erase(path);
         for (const std::string& path : used)
-            if (asked_.count(path) == 0)
+            if (asked_.count(path) == 0 && g_variant_is_object_path(path.c_str()) != FALSE)
                 Ask(owner_.c_str(), path, info_.interface, info_.method, info_.argument);
         asked_ = used;
         changed_();
