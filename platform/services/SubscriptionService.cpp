@@ -193,8 +193,7 @@ GVariant* SubscriptionService::List(const char* sender)
 {
     const bool seesAll = IsAdministrator(sender);
     std::map<std::string, bool> isVisible;
-    GVariantBuilder list;
-    g_variant_builder_init(&list, G_VARIANT_TYPE("a(sssss)"));
+    g_auto(GVariantBuilder) list = G_VARIANT_BUILDER_INIT(G_VARIANT_TYPE("a(sssss)"));
     for (const DASubscription& record : ReadStore())
     {
         const _SubscriberInfo& who = record.subscriber;
