@@ -314,9 +314,10 @@ VariantPtr SubscriptionService::AskBus(const char* method, GVariant* arguments, 
 {
     g_autoptr(GError) error = nullptr;
     VariantPtr reply = CallBus(method, arguments, replyType, &error);
-    if (reply == nullptr)
-        throw CallError(G_DBUS_ERROR_FAILED, std::string("the bus does not answer ") + method + ": " + error->message);
-    return reply;
+    if (reply != nullptr)
+        return reply;
+    const g_autofree char* reason = g_strdup_printf("the bus does not answer %s: %s", method, error->message);
+    throw CallError(G_DBUS_ERROR_FAILED, reason);
 }
 
 } // namespace kiv
